@@ -1,0 +1,17 @@
+#!/usr/bin/env bash
+# Installs what is missing, builds, and runs every test: the regular build
+# (which also builds the benchmarks, never runs them), then the whole suite
+# again under AddressSanitizer + UndefinedBehaviorSanitizer, then the thread
+# tests under ThreadSanitizer.
+set -euo pipefail
+root=$(cd "$(dirname "$0")/.." && pwd)
+"$root/scripts/setup.sh"
+jobs=$(nproc)
+"$root/scripts/build.sh" build
+(cd "$root/build" && ctest --output-on-failure -j"$jobs" --timeout 300)
+"$root/scripts/build.sh" build-asan -DQN_SANITIZE=ON -DCMAKE_BUILD_TYPE=Debug
+(cd "$root/build-asan" && ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
+   ctest --output-on-failure -j"$jobs" --timeout 300)
+"$root/scripts/build.sh" build-tsan -DQN_TSAN=ON -DCMAKE_BUILD_TYPE=Debug
+(cd "$root/build-tsan" && ctest --output-on-failure -j"$jobs" --timeout 300 -L thread)
+echo "all tests passed"
