@@ -90,6 +90,9 @@ SAFEARRAY* SafeArrayCreate(VARTYPE vt, UINT cDims, const SAFEARRAYBOUND* bounds)
     for (UINT d = 0; d < cDims; ++d) {
         count *= bounds[d].cElements;
         if (count > std::numeric_limits<ULONG>::max()) return nullptr;
+        // Every element must have an index that a LONG can hold (SafeArrayGetUBound).
+        long long upper = static_cast<long long>(bounds[d].lLbound) + bounds[d].cElements - 1;
+        if (upper > std::numeric_limits<LONG>::max()) return nullptr;
     }
     unsigned long long bytes = count * size;
     if (bytes > std::numeric_limits<std::size_t>::max() / 2) return nullptr;

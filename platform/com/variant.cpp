@@ -48,6 +48,12 @@ HRESULT VarR8Round(double dblIn, int nDig, double* pdblOut) {
     if (!pdblOut || nDig < 0) return E_INVALIDARG;
     double scale = std::pow(10.0, nDig);
     double x = dblIn * scale;
+    // From 2^52 on a scaled double has no fractional part, so rounding leaves the input as
+    // it is; this also covers infinities, NaN and a scale that overflows to infinity.
+    if (!(std::fabs(x) < 0x1p52)) {
+        *pdblOut = dblIn;
+        return S_OK;
+    }
     double whole = std::trunc(x);
     double fract = x - whole;  // same sign as x
     double r;
