@@ -1,0 +1,195 @@
+// SAFEARRAY creation, bounds, typed element access, copies and ownership of
+// BSTR/VARIANT elements (leaks show up under AddressSanitizer).
+#include "platform/com/safearray.h"
+
+#include <gtest/gtest.h>
+
+#include <limits>
+#include <cstring>
+
+#include "platform/com/bstr.h"
+#include "platform/com/variant.h"
+
+namespace {
+
+using qn::com::Bstr;
+using qn::com::SafeArray;
+
+constexpr LONG kLongMin = std::numeric_limits<LONG>::min();
+constexpr LONG kLongMax = std::numeric_limits<LONG>::max();
+
+TEST(SafeArray, OneDimensionalBoundsAndTypeForEachPlainElementType) {
+    struct Case {
+        VARTYPE vt;
+        UINT size;
+    };
+    for (Case c : {Case{VT_R8, 8}, Case{VT_UI1, 1}, Case{VT_I2, 2}, Case{VT_I4, 4},
+                   Case{VT_BSTR, sizeof(BSTR)}, Case{VT_VARIANT, sizeof(VARIANT)}}) {
+        SafeArray sa = SafeArray::Vector(c.vt, 5, -2);
+        ASSERT_TRUE(sa) << c.vt;
+        LONG lo = 0, hi = 0;
+        VARTYPE vt = 0;
+        EXPECT_EQ(SafeArrayGetDim(sa.get()), 1u);
+        EXPECT_EQ(SafeArrayGetElemsize(sa.get()), c.size);
+        EXPECT_EQ(SafeArrayGetLBound(sa.get(), 1, &lo), S_OK);
+        EXPECT_EQ(SafeArrayGetUBound(sa.get(), 1, &hi), S_OK);
+        EXPECT_EQ(SafeArrayGetVartype(sa.get(), &vt), S_OK);
+        EXPECT_EQ(lo, -2);
+        EXPECT_EQ(hi, 2);
+        EXPECT_EQ(vt, c.vt);
+        EXPECT_EQ(sa.size(), 5u);
+        EXPECT_EQ(SafeArrayGetLBound(sa.get(), 2, &lo), DISP_E_BADINDEX);
+        EXPECT_EQ(SafeArrayGetUBound(sa.get(), 0, &hi), DISP_E_BADINDEX);
+    }
+}
+
+template <class T>
+void ExpectPutGetRoundTrip(VARTYPE vt, T value) {
+    SafeArray sa = SafeArray::Vector(vt, 3, 1);
+    ASSERT_TRUE(sa);
+    for (LONG i : {1, 3}) {
+        EXPECT_EQ(SafeArrayPutElement(sa.get(), &i, &value), S_OK);
+        T back{};
+        EXPECT_EQ(SafeArrayGetElement(sa.get(), &i, &back), S_OK);
+        EXPECT_EQ(back, value);
+    }
+    T zero{};
+    LONG mid = 2;
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), &mid, &zero), S_OK);
+    EXPECT_EQ(zero, T{});  // new arrays start zeroed
+    for (LONG bad : {LONG{0}, LONG{4}, kLongMin, kLongMax}) {
+        EXPECT_EQ(SafeArrayPutElement(sa.get(), &bad, &value), DISP_E_BADINDEX);
+        EXPECT_EQ(SafeArrayGetElement(sa.get(), &bad, &zero), DISP_E_BADINDEX);
+    }
+}
+
+TEST(SafeArray, PlainElementsRoundTripAndIndicesAreBoundsChecked) {
+    ExpectPutGetRoundTrip<double>(VT_R8, -1.5e300);
+    ExpectPutGetRoundTrip<BYTE>(VT_UI1, 0xA5);
+    ExpectPutGetRoundTrip<SHORT>(VT_I2, -12345);
+    ExpectPutGetRoundTrip<LONG>(VT_I4, -123456789);
+}
+
+TEST(SafeArray, TwoDimensionalLayoutHasDimensionOneFastest) {
+    SAFEARRAYBOUND b[2] = {{3, 0}, {2, 10}};  // 3 rows (dim 1) x 2 columns (dim 2) from 10
+    SafeArray sa(SafeArrayCreate(VT_I4, 2, b));
+    ASSERT_TRUE(sa);
+    EXPECT_EQ(sa.size(), 6u);
+    LONG hi = 0;
+    EXPECT_EQ(SafeArrayGetUBound(sa.get(), 2, &hi), S_OK);
+    EXPECT_EQ(hi, 11);
+    for (LONG j = 10; j <= 11; ++j)
+        for (LONG i = 0; i <= 2; ++i) {
+            LONG idx[2] = {i, j};
+            LONG v = 100 * j + i;
+            ASSERT_EQ(SafeArrayPutElement(sa.get(), idx, &v), S_OK);
+        }
+    const LONG* data = sa.data<LONG>();
+    EXPECT_EQ(data[0], 1000);
+    EXPECT_EQ(data[1], 1001);
+    EXPECT_EQ(data[3], 1100);
+    EXPECT_EQ(data[5], 1102);
+    LONG out_of_range[2] = {0, 12};
+    LONG v = 0;
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), out_of_range, &v), DISP_E_BADINDEX);
+}
+
+TEST(SafeArray, RejectsBadShapesAndOverflowingSizes) {
+    SAFEARRAYBOUND one{4, 0};
+    EXPECT_EQ(SafeArrayCreate(VT_EMPTY, 1, &one), nullptr);
+    EXPECT_EQ(SafeArrayCreate(VT_R8, 0, &one), nullptr);
+    EXPECT_EQ(SafeArrayCreate(VT_R8, 3, &one), nullptr);
+    EXPECT_EQ(SafeArrayCreate(VT_R8, 1, nullptr), nullptr);
+    SAFEARRAYBOUND huge[2] = {{0x10000, 0}, {0x10001, 0}};  // count beyond 32 bits
+    EXPECT_EQ(SafeArrayCreate(VT_R8, 2, huge), nullptr);
+    SAFEARRAYBOUND max2[2] = {{0xFFFFFFFF, 0}, {0xFFFFFFFF, 0}};
+    EXPECT_EQ(SafeArrayCreate(VT_UI1, 2, max2), nullptr);
+    // An upper bound that does not fit in a LONG cannot be described.
+    EXPECT_EQ(SafeArrayCreateVector(VT_UI1, kLongMax, 2), nullptr);
+    SafeArray last(SafeArrayCreateVector(VT_UI1, kLongMax, 1));
+    ASSERT_TRUE(last);
+    LONG hi = 0;
+    EXPECT_EQ(SafeArrayGetUBound(last.get(), 1, &hi), S_OK);
+    EXPECT_EQ(hi, kLongMax);
+}
+
+TEST(SafeArray, EmptyArrayHasNoElements) {
+    SafeArray sa = SafeArray::Vector(VT_R8, 0);
+    ASSERT_TRUE(sa);
+    LONG i = 0;
+    double v = 0;
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), &i, &v), DISP_E_BADINDEX);
+    SafeArray copy;
+    EXPECT_EQ(SafeArrayCopy(sa.get(), copy.Out()), S_OK);
+    EXPECT_EQ(copy.size(), 0u);
+}
+
+TEST(SafeArray, BstrElementsAreCopiedInAndOutAndFreedWithTheArray) {
+    SafeArray sa = SafeArray::Vector(VT_BSTR, 3);
+    Bstr text("voltage");
+    LONG i = 1;
+    ASSERT_EQ(SafeArrayPutElement(sa.get(), &i, text.get()), S_OK);
+    ASSERT_EQ(SafeArrayPutElement(sa.get(), &i, text.get()), S_OK);  // replaces, frees the old
+    EXPECT_NE(sa.data<BSTR>()[1], text.get());
+    Bstr back;
+    ASSERT_EQ(SafeArrayGetElement(sa.get(), &i, back.Out()), S_OK);
+    EXPECT_NE(back.get(), sa.data<BSTR>()[1]);
+    EXPECT_EQ(back.utf8(), "voltage");
+    LONG empty_slot = 0;
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), &empty_slot, back.Out()), S_OK);
+    EXPECT_EQ(back.get(), nullptr);
+
+    SafeArray copy;
+    ASSERT_EQ(SafeArrayCopy(sa.get(), copy.Out()), S_OK);
+    EXPECT_NE(copy.data<BSTR>()[1], sa.data<BSTR>()[1]);
+    sa.reset();
+    EXPECT_EQ(qn::com::BstrToUtf8(copy.data<BSTR>()[1]), "voltage");
+}
+
+TEST(SafeArray, VariantElementsOwnTheirContents) {
+    SafeArray sa = SafeArray::Vector(VT_VARIANT, 2);
+    qn::com::Variant s = qn::com::Variant::String("abc");
+    LONG i = 0;
+    ASSERT_EQ(SafeArrayPutElement(sa.get(), &i, &s), S_OK);
+    EXPECT_EQ(SafeArrayPutElement(sa.get(), &i, nullptr), E_INVALIDARG);
+    qn::com::Variant out;
+    VariantClear(&out);
+    ASSERT_EQ(SafeArrayGetElement(sa.get(), &i, &out), S_OK);
+    ASSERT_EQ(out.vt, VT_BSTR);
+    EXPECT_NE(out.bstrVal, s.bstrVal);
+    EXPECT_EQ(qn::com::BstrToUtf8(out.bstrVal), "abc");
+
+    SafeArray copy;
+    ASSERT_EQ(SafeArrayCopy(sa.get(), copy.Out()), S_OK);
+    EXPECT_NE(copy.data<VARIANT>()[0].bstrVal, sa.data<VARIANT>()[0].bstrVal);
+}
+
+TEST(SafeArray, LockedArrayIsNotDestroyed) {
+    SAFEARRAY* psa = SafeArrayCreateVector(VT_BSTR, 0, 1);
+    LONG i = 0;
+    Bstr text("kept");
+    ASSERT_EQ(SafeArrayPutElement(psa, &i, text.get()), S_OK);
+    void* data = nullptr;
+    ASSERT_EQ(SafeArrayAccessData(psa, &data), S_OK);
+    EXPECT_EQ(data, psa->pvData);
+    EXPECT_EQ(SafeArrayDestroy(psa), DISP_E_ARRAYISLOCKED);
+    EXPECT_EQ(SafeArrayUnaccessData(psa), S_OK);
+    EXPECT_EQ(SafeArrayUnaccessData(psa), E_UNEXPECTED);
+    EXPECT_EQ(SafeArrayDestroy(psa), S_OK);
+    EXPECT_EQ(SafeArrayDestroy(nullptr), S_OK);
+}
+
+TEST(SafeArray, NullArgumentsAreRejected) {
+    LONG i = 0, v = 0;
+    SafeArray sa = SafeArray::Vector(VT_I4, 1);
+    EXPECT_EQ(SafeArrayGetElement(nullptr, &i, &v), E_INVALIDARG);
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), nullptr, &v), E_INVALIDARG);
+    EXPECT_EQ(SafeArrayGetElement(sa.get(), &i, nullptr), E_INVALIDARG);
+    EXPECT_EQ(SafeArrayPutElement(sa.get(), &i, nullptr), E_INVALIDARG);
+    EXPECT_EQ(SafeArrayCopy(sa.get(), nullptr), E_INVALIDARG);
+    SAFEARRAY* out = reinterpret_cast<SAFEARRAY*>(1);
+    EXPECT_EQ(SafeArrayCopy(nullptr, &out), S_OK);
+    EXPECT_EQ(out, nullptr);
+}
+
+}  // namespace
