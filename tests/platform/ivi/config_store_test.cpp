@@ -1,0 +1,265 @@
+// The configuration store reader: sessions, logical names, modules, typed
+// settings, virtual names and every kind of bad input.
+#include "platform/ivi/config_store.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <string>
+#include <unistd.h>
+
+namespace {
+
+using namespace qn::ivi;
+
+const char* kStore = R"(<?xml version="1.0"?>
+<IviConfigurationStore version="1">
+  <HardwareAsset name="Bench" resourceDescriptor=" TCPIP0::192.0.2.7::INSTR "/>
+  <SoftwareModule name="Qn731XX" description="scope driver">
+    <DataComponent name="Configurable Initial Settings" type="Structure">
+      <DataComponent name=" Model " type="String" value="QDS4032A"/>
+      <DataComponent name="Points" type="Integer" value="-2147483648"/>
+      <DataComponent name="Gain" type="Real" value="2.5e-3"/>
+      <DataComponent name="Fast" type="Boolean" value="TRUE"/>
+      <DataComponent name="Nested" type="Structure">
+        <DataComponent name="Inner" type="Integer" value="1"/>
+      </DataComponent>
+      <DataComponent name="Api" type="APIReference" value="IviScope"/>
+    </DataComponent>
+  </SoftwareModule>
+  <DriverSession name="Scope1" hardwareAsset="Bench" softwareModule="Qn731XX"
+                 cache="false" interchangeCheck="1" queryInstrStatus="true"
+                 rangeCheck="0" recordCoercions="TRUE" simulate="true">
+    <DriverSetup>Model=QDS4032A, Trace=false</DriverSetup>
+    <VirtualName name="Probe" mapTo="UserChannel2"/>
+    <VirtualName name="Ch" mapTo="Channel">
+      <Range start="1" end="3" physicalStart="1"/>
+      <Range start="10" end="11" physicalStart="5"/>
+    </VirtualName>
+    <DataComponent name="Configurable Initial Settings" type="Structure">
+      <DataComponent name="Model" type="String" value="73122D"/>
+    </DataComponent>
+  </DriverSession>
+  <DriverSession name="Plain"/>
+  <LogicalName name="MyScope" session="Scope1"/>
+  <LogicalName name="Plain" session="Scope1"/>
+</IviConfigurationStore>
+)";
+
+ConfigStore LoadOk(std::string_view xml) {
+    LoadResult r = ConfigStore::Parse(xml);
+    EXPECT_TRUE(r.loaded()) << r.error;
+    return r.store;
+}
+
+TEST(ConfigStore, SessionCarriesAssetFlagsSetupAndModule) {
+    ConfigStore store = LoadOk(kStore);
+    const DriverSession* s = store.FindSession("Scope1");
+    ASSERT_NE(s, nullptr);
+    EXPECT_TRUE(s->HasHardwareAsset());
+    EXPECT_EQ(s->resource_descriptor, "TCPIP0::192.0.2.7::INSTR");
+    EXPECT_EQ(s->software_module, "Qn731XX");
+    EXPECT_EQ(s->driver_setup, "Model=QDS4032A, Trace=false");
+    EXPECT_FALSE(s->flags.cache);
+    EXPECT_TRUE(s->flags.interchange_check);
+    EXPECT_TRUE(s->flags.query_instr_status);
+    EXPECT_FALSE(s->flags.range_check);
+    EXPECT_TRUE(s->flags.record_coercions);
+    EXPECT_TRUE(s->flags.simulate);
+}
+
+TEST(ConfigStore, OmittedFlagsTakeTheDriverDefaults) {
+    ConfigStore store = LoadOk(kStore);
+    const DriverSession* plain = nullptr;
+    for (const auto& s : store.sessions())
+        if (s.name == "Plain") plain = &s;
+    ASSERT_NE(plain, nullptr);
+    EXPECT_FALSE(plain->HasHardwareAsset());
+    EXPECT_TRUE(plain->virtual_name_map.empty());
+    EXPECT_TRUE(plain->resource_descriptor.empty());
+    SessionFlags d;
+    EXPECT_EQ(plain->flags.cache, d.cache);
+    EXPECT_TRUE(plain->flags.cache);
+    EXPECT_TRUE(plain->flags.range_check);
+    EXPECT_FALSE(plain->flags.simulate || plain->flags.interchange_check ||
+                 plain->flags.query_instr_status || plain->flags.record_coercions);
+}
+
+TEST(ConfigStore, LogicalNamesResolveFirstAndNamesAreCaseSensitive) {
+    ConfigStore store = LoadOk(kStore);
+    ASSERT_NE(store.FindSession("MyScope"), nullptr);
+    EXPECT_EQ(store.FindSession("MyScope")->name, "Scope1");
+    // "Plain" is both a logical name and a session: the logical name wins.
+    EXPECT_EQ(store.FindSession("Plain")->name, "Scope1");
+    EXPECT_EQ(store.FindSession("myscope"), nullptr);
+    EXPECT_EQ(store.FindSession("TCPIP0::192.0.2.7::INSTR"), nullptr);
+    EXPECT_EQ(store.FindSession(""), nullptr);
+    EXPECT_NE(store.FindSoftwareModule("Qn731XX"), nullptr);
+    EXPECT_EQ(store.FindSoftwareModule("Other"), nullptr);
+}
+
+TEST(ConfigStore, InitialSettingsAreTypedAndIndexedFromOne) {
+    ConfigStore store = LoadOk(kStore);
+    const SoftwareModule* m = store.FindSoftwareModule("Qn731XX");
+    ASSERT_NE(m, nullptr);
+    const auto* settings = FindStructure(m->data_components, kConfigurableInitialSettings);
+    ASSERT_NE(settings, nullptr);
+    ASSERT_EQ(settings->size(), 6u);
+    EXPECT_EQ(DataComponentAt(*settings, 0), nullptr);
+    EXPECT_EQ(DataComponentAt(*settings, 7), nullptr);
+    EXPECT_EQ(DataComponentAt(*settings, -1), nullptr);
+
+    const DataComponent* model = DataComponentAt(*settings, 1);
+    EXPECT_EQ(model->name, "Model");  // attribute blanks are trimmed
+    EXPECT_EQ(std::get<std::string>(model->value), "QDS4032A");
+    EXPECT_EQ(std::get<std::int32_t>(DataComponentAt(*settings, 2)->value), INT32_MIN);
+    EXPECT_DOUBLE_EQ(std::get<double>(DataComponentAt(*settings, 3)->value), 2.5e-3);
+    EXPECT_TRUE(std::get<bool>(DataComponentAt(*settings, 4)->value));
+    const DataComponent* nested = DataComponentAt(*settings, 5);
+    EXPECT_EQ(nested->type, DataType::kStructure);
+    ASSERT_EQ(nested->children.size(), 1u);
+    EXPECT_EQ(DataComponentAt(*settings, 6)->type, DataType::kApiReference);
+    EXPECT_EQ(DataTypeName(DataComponentAt(*settings, 6)->type), "APIReference");
+
+    const DriverSession* s = store.FindSession("Scope1");
+    const auto* session_settings = FindStructure(s->data_components, kConfigurableInitialSettings);
+    ASSERT_NE(session_settings, nullptr);
+    EXPECT_EQ(std::get<std::string>(DataComponentAt(*session_settings, 1)->value), "73122D");
+    EXPECT_EQ(FindStructure(s->data_components, "Other"), nullptr);
+}
+
+TEST(ConfigStore, VirtualNamesExpandWithAndWithoutRanges) {
+    ConfigStore store = LoadOk(kStore);
+    const VirtualNameMap expected = {
+        {"probe", "UserChannel2"}, {"ch1", "Channel1"},  {"ch2", "Channel2"},
+        {"ch3", "Channel3"},       {"ch10", "Channel5"}, {"ch11", "Channel6"},
+    };
+    EXPECT_EQ(store.FindSession("Scope1")->virtual_name_map, expected);
+}
+
+TEST(ExpandVirtualNames, CollidingNamesAreAnError) {
+    VirtualNameMap map;
+    std::string error;
+    std::vector<VirtualName> names = {{"CH1", "Channel4", {}}, {"ch", "Channel", {{1, 2, 1}}}};
+    EXPECT_FALSE(ExpandVirtualNames(names, &map, &error));
+    EXPECT_NE(error.find("ch1"), std::string::npos) << error;
+}
+
+struct BadStore {
+    const char* name;
+    std::string body;       // placed inside <IviConfigurationStore>
+    const char* expected;   // part of the error text
+};
+
+const BadStore kBadStores[] = {
+    {"unknown_element", "<Session name='x'/>", "unexpected <Session>"},
+    {"misspelt_flag", "<DriverSession name='x' simualte='1'/>", "unknown attribute \"simualte\""},
+    {"bad_flag_value", "<DriverSession name='x' simulate='yes'/>", "\"simulate\" must be"},
+    {"session_without_name", "<DriverSession/>", "non-empty \"name\""},
+    {"duplicate_session", "<DriverSession name='x'/><DriverSession name='x'/>", "defined twice"},
+    {"unknown_asset", "<DriverSession name='x' hardwareAsset='none'/>", "unknown hardware asset"},
+    {"unknown_module", "<DriverSession name='x' softwareModule='none'/>", "unknown software module"},
+    {"dangling_logical_name", "<LogicalName name='a' session='none'/>", "unknown session"},
+    {"unknown_type", "<SoftwareModule name='m'><DataComponent name='a' type='Text' value='1'/></SoftwareModule>",
+     "unknown type \"Text\""},
+    {"integer_overflow", "<SoftwareModule name='m'><DataComponent name='a' type='Integer' value='2147483648'/></SoftwareModule>",
+     "not a valid Integer"},
+    {"integer_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Integer' value='12abc'/></SoftwareModule>",
+     "not a valid Integer"},
+    {"real_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Real' value='1.5V'/></SoftwareModule>",
+     "not a valid Real"},
+    {"boolean_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Boolean' value='on'/></SoftwareModule>",
+     "not a valid Boolean"},
+    {"missing_value", "<SoftwareModule name='m'><DataComponent name='a' type='String'/></SoftwareModule>",
+     "needs a \"value\""},
+    {"duplicate_component", "<SoftwareModule name='m'><DataComponent name='a' type='String' value=''/>"
+                            "<DataComponent name='a' type='String' value=''/></SoftwareModule>",
+     "defined twice"},
+    {"range_reversed", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='4' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+     "end is below"},
+    {"range_huge", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='2000000000' physicalStart='1'/></VirtualName></DriverSession>",
+     "more than 100000"},
+    {"range_negative", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='-1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+     "non-negative"},
+    {"range_physical_overflow", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='9' physicalStart='2147483645'/></VirtualName></DriverSession>",
+     "exceed"},
+    {"virtual_collision", "<DriverSession name='x'><VirtualName name='c1' mapTo='A'/><VirtualName name='C' mapTo='B'><Range start='1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+     "more than once"},
+};
+
+TEST(ConfigStore, SchemaErrorsNameTheProblemAndItsPosition) {
+    for (const BadStore& bad : kBadStores) {
+        std::string xml = "<IviConfigurationStore>\n" + bad.body + "\n</IviConfigurationStore>";
+        LoadResult r = ConfigStore::Parse(xml, "test.xml");
+        EXPECT_EQ(r.status, LoadStatus::kError) << bad.name;
+        EXPECT_NE(r.error.find(bad.expected), std::string::npos) << bad.name << ": " << r.error;
+        EXPECT_EQ(r.error.rfind("test.xml: line 2", 0), 0u) << bad.name << ": " << r.error;
+    }
+}
+
+TEST(ConfigStore, MalformedXmlCarriesTheParserMessageAndOffset) {
+    struct Case {
+        std::string xml;
+        const char* parser_text;
+    };
+    for (const Case& c : {Case{"<IviConfigurationStore><DriverSession name='x'>", "Start-end tags mismatch"},
+                          Case{"", "No document element found"},
+                          Case{"<IviConfigurationStore>\n<a b=></a></IviConfigurationStore>",
+                               "Error parsing element attribute"},
+                          Case{std::string("<Ivi\0Store/>", 12), ""},
+                          Case{"<Other/>", "expected <IviConfigurationStore>"}}) {
+        LoadResult r = ConfigStore::Parse(c.xml, "s.xml");
+        EXPECT_EQ(r.status, LoadStatus::kError);
+        EXPECT_NE(r.error.find(c.parser_text), std::string::npos) << r.error;
+        EXPECT_NE(r.error.find("offset"), std::string::npos) << r.error;
+    }
+}
+
+// A temporary file removed at the end of the test.
+class TempFile {
+public:
+    explicit TempFile(const std::string& content) {
+        char name[] = "/tmp/qn-ivi-store-XXXXXX";
+        int fd = mkstemp(name);
+        path_ = name;
+        if (fd >= 0) close(fd);
+        std::ofstream(path_) << content;
+    }
+    ~TempFile() { std::remove(path_.c_str()); }
+    const std::string& path() const { return path_; }
+
+private:
+    std::string path_;
+};
+
+TEST(ConfigStore, FilesMissingPresentOrUnreadable) {
+    EXPECT_EQ(ConfigStore::Load("/nonexistent/dir/store.xml").status, LoadStatus::kAbsent);
+    TempFile good(kStore);
+    LoadResult r = ConfigStore::Load(good.path());
+    ASSERT_TRUE(r.loaded()) << r.error;
+    EXPECT_NE(r.store.FindSession("MyScope"), nullptr);
+
+    LoadResult dir = ConfigStore::Load("/tmp");
+    EXPECT_EQ(dir.status, LoadStatus::kError);
+    EXPECT_NE(dir.error.find("/tmp"), std::string::npos);
+
+    TempFile bad("<IviConfigurationStore>");
+    LoadResult broken = ConfigStore::Load(bad.path());
+    EXPECT_EQ(broken.status, LoadStatus::kError);
+    EXPECT_EQ(broken.error.rfind(bad.path(), 0), 0u) << broken.error;
+}
+
+TEST(ConfigStore, DefaultLocationComesFromTheEnvironment) {
+    TempFile good(kStore);
+    setenv("IVI_CONFIG_STORE", good.path().c_str(), 1);
+    EXPECT_EQ(ConfigStore::ProcessDefaultLocation(), good.path());
+    EXPECT_TRUE(ConfigStore::LoadDefault().loaded());
+    setenv("IVI_CONFIG_STORE", "", 1);
+    EXPECT_EQ(ConfigStore::ProcessDefaultLocation(), "");
+    unsetenv("IVI_CONFIG_STORE");
+    EXPECT_EQ(ConfigStore::MasterLocation(), "/etc/ivi/IviConfigurationStore.xml");
+}
+
+}  // namespace
