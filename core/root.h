@@ -1,0 +1,120 @@
+// Quorlen731XX: the root object of a driver session. It implements every
+// interface of the session itself and owns the session state shared with the
+// child objects of the repeated capabilities.
+#pragma once
+
+#include <memory>
+
+#include "IviDriver.h"
+#include "core/frame.h"
+#include "core/node.h"
+
+namespace qn {
+
+class Quorlen731XX final
+    : public com::ComObject<Quorlen731XX, IIviDriver, IIviDriverOperation, IIviDriverIdentity,
+                            com::As<IIviComponentIdentity, IIviDriverIdentity>, IIviDriverUtility,
+                            ISupportErrorInfo>,
+      public CDriverNode {
+public:
+    Quorlen731XX();
+    ~Quorlen731XX() override;
+
+    std::string_view ComponentName() const override { return "Quorlen731XX"; }
+
+    // IIviDriver
+    HRESULT Initialize(BSTR ResourceName, VARIANT_BOOL IdQuery, VARIANT_BOOL Reset,
+                       BSTR OptionString) override;
+    HRESULT Close() override;
+    HRESULT get_Initialized(VARIANT_BOOL* pbInitialized) override;
+    HRESULT get_DriverOperation(IIviDriverOperation** pVal) override;
+    HRESULT get_Identity(IIviDriverIdentity** pVal) override;
+    HRESULT get_Utility(IIviDriverUtility** pVal) override;
+
+    // IIviComponentIdentity / IIviDriverIdentity
+    HRESULT get_Description(BSTR* pbstr) override;
+    HRESULT get_Revision(BSTR* pbstr) override;
+    HRESULT get_Vendor(BSTR* pbstr) override;
+    HRESULT get_GroupCapabilities(BSTR* pbstr) override;
+    HRESULT get_Identifier(BSTR* pbstr) override;
+    HRESULT get_InstrumentFirmwareRevision(BSTR* pbstr) override;
+    HRESULT get_InstrumentManufacturer(BSTR* pbstr) override;
+    HRESULT get_InstrumentModel(BSTR* pbstr) override;
+    HRESULT get_SpecificationMajorVersion(LONG* plVer) override;
+    HRESULT get_SpecificationMinorVersion(LONG* plVer) override;
+    HRESULT get_SupportedInstrumentModels(BSTR* pbstr) override;
+
+    // IIviDriverOperation
+    HRESULT get_Cache(VARIANT_BOOL* val) override;
+    HRESULT put_Cache(VARIANT_BOOL val) override;
+    HRESULT get_DriverSetup(BSTR* val) override;
+    HRESULT get_InterchangeCheck(VARIANT_BOOL* val) override;
+    HRESULT put_InterchangeCheck(VARIANT_BOOL val) override;
+    HRESULT get_IoResourceDescriptor(BSTR* val) override;
+    HRESULT get_LogicalName(BSTR* val) override;
+    HRESULT get_QueryInstrumentStatus(VARIANT_BOOL* val) override;
+    HRESULT put_QueryInstrumentStatus(VARIANT_BOOL val) override;
+    HRESULT get_RangeCheck(VARIANT_BOOL* val) override;
+    HRESULT put_RangeCheck(VARIANT_BOOL val) override;
+    HRESULT get_RecordCoercions(VARIANT_BOOL* val) override;
+    HRESULT put_RecordCoercions(VARIANT_BOOL val) override;
+    HRESULT get_Simulate(VARIANT_BOOL* val) override;
+    HRESULT put_Simulate(VARIANT_BOOL val) override;
+    HRESULT ClearInterchangeWarnings() override;
+    HRESULT GetNextCoercionRecord(BSTR* pbstrRecord) override;
+    HRESULT GetNextInterchangeWarning(BSTR* pbstrWarning) override;
+    HRESULT InvalidateAllAttributes() override;
+    HRESULT ResetInterchangeCheck() override;
+
+    // IIviDriverUtility
+    HRESULT Disable() override;
+    HRESULT ErrorQuery(LONG* ErrorCode, BSTR* ErrorMessage) override;
+    HRESULT LockObject() override;
+    HRESULT Reset() override;
+    HRESULT ResetWithDefaults() override;
+    HRESULT SelfTest(LONG* TestResult, BSTR* TestMessage) override;
+    HRESULT UnlockObject() override;
+
+    // ISupportErrorInfo
+    HRESULT InterfaceSupportsErrorInfo(REFIID riid) override;
+
+    // Model tests offered to every part of the driver; false when the
+    // session is not initialized.
+    bool IsModelSupported() const;
+    bool IsModel(std::string_view model) const;
+    bool IsModelInFamily(std::string_view family) const;
+
+private:
+    // Initialize and Close run inside their frames; these are their bodies.
+    HRESULT InitializeBody(BSTR resource, bool id_query, bool reset, BSTR options);
+    HRESULT CloseBody();
+    HRESULT ApplyConfiguration(const std::string& resource, const std::string& options);
+    // Session steps that the I/O layer and the object model provide.
+    HRESULT StartTracing();
+    void SaveTrace();
+    HRESULT OpenIo();
+    void CloseIo();
+    HRESULT StartSession();
+    void EndSession();
+    HRESULT QueryIdentity();
+    void InvalidateAll();
+    // Applies one session-flag value through the rules of its setter
+    // (used by the flag properties and ResetWithDefaults).
+    HRESULT SetFlag(int which, bool value);
+    HRESULT DisableBody();
+    HRESULT ErrorQueryBody(LONG* code, BSTR* message);
+    HRESULT ResetBody();
+    HRESULT ResetWithDefaultsBody();
+    HRESULT SelfTestBody(LONG* result, BSTR* message);
+    HRESULT NextCoercionRecord(BSTR* record);
+    void ResetChildren();
+    // Instrument traffic of the inherent operations.
+    HRESULT QueryInteger(std::string_view command, long timeout_ms, LONG* value);
+    HRESULT QueryErrorText(std::string* reply);  // "SYST:ERR?" without the status check
+    HRESULT ClearStatus();                        // "*CLS"
+
+    template <class T>
+    HRESULT Nav(T** out);
+};
+
+}  // namespace qn

@@ -1,0 +1,44 @@
+// SessionCore: the state one driver session shares between its root object
+// and every child object of its repeated capabilities: the session lock, the
+// session state and, as they arrive, the I/O provider, the tracer, the
+// feature record and the instance lists.
+//
+// The root object and every child hold it through a shared pointer, so a
+// child a client still holds after releasing the root stays a valid object
+// (its calls then find the session not initialized).
+#pragma once
+
+#include <memory>
+
+#include <map>
+#include <string>
+
+#include "core/session.h"
+#include "platform/com/lock.h"
+#include "services/coercion_log.h"
+
+namespace qn {
+
+class SessionCore {
+public:
+    // One lock per session. Every member of the root and of every child runs
+    // under it: the instrument is one byte stream, and two threads talking
+    // to it at once through different objects would interleave their
+    // commands and replies.
+    com::CriticalSection lock;
+    DriverSession session;
+    CCoercionLogManager coercions;
+    // Virtual names of the configuration store's driver session:
+    // lower-case virtual name -> physical name.
+    std::map<std::string, std::string> virtual_names;
+
+    bool Initialized() const { return session.initialized; }
+    bool Simulating() const { return session.flags.simulate; }
+    // The instrument model string (empty when not initialized).
+    const std::string& Model() const {
+        static const std::string kNone;
+        return session.initialized ? session.model : kNone;
+    }
+};
+
+}  // namespace qn

@@ -1,0 +1,10 @@
+// The subcommands of qn731xx.
+#pragma once
+
+#include <span>
+
+namespace qn::tools {
+
+int InfoCommand(std::span<char*> args);
+
+}  // namespace qn::tools

@@ -1,0 +1,41 @@
+// qn731xx: the command-line program of the Quorlen731XX driver.
+#include <cstdio>
+#include <cstring>
+#include <span>
+#include <string_view>
+
+#include "tools/commands.h"
+
+namespace {
+
+struct Command {
+    std::string_view name;
+    int (*run)(std::span<char*>);
+    std::string_view help;
+};
+
+constexpr Command kCommands[] = {
+    {"info", qn::tools::InfoCommand,
+     "open a session and print its flags, the instrument identity and the option tables"},
+};
+
+int Usage(FILE* to) {
+    std::fprintf(to, "usage: qn731xx COMMAND [options]\n\ncommands:\n");
+    for (const Command& c : kCommands)
+        std::fprintf(to, "  %-10.*s %.*s\n", int(c.name.size()), c.name.data(), int(c.help.size()),
+                     c.help.data());
+    std::fprintf(to, "\nsession options: --resource R --options S --simulate --id-query --reset --json\n");
+    return to == stdout ? 0 : 2;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    if (argc < 2) return Usage(stderr);
+    std::string_view name = argv[1];
+    if (name == "--help" || name == "-h" || name == "help") return Usage(stdout);
+    for (const Command& c : kCommands)
+        if (c.name == name) return c.run(std::span<char*>(argv + 2, argv + argc));
+    std::fprintf(stderr, "qn731xx: unknown command '%s'\n", argv[1]);
+    return Usage(stderr);
+}
