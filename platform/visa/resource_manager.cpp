@@ -1,0 +1,74 @@
+// The resource manager: parses the resource string and opens the transport
+// for its kind. Only raw sockets have a transport so far; the other kinds
+// parse and then report that the resource cannot be found.
+#include <string>
+
+#include "platform/visa/errors.h"
+#include "platform/visa/resource_name.h"
+#include "platform/visa/session.h"
+#include "platform/visa/transport.h"
+#include "platform/visa/visa.h"
+
+namespace qn::visa {
+namespace {
+
+constexpr GUID kManagerIid = iid_of<IResourceManager>;
+
+using Opener = HRESULT (*)(const ResourceName&, LONG, std::unique_ptr<Transport>*, std::string*);
+
+struct TransportKind {
+    int interface_type;
+    std::string_view resource_class;
+    Opener open;
+};
+
+constexpr TransportKind kTransports[] = {
+    {kInterfaceTcpip, "SOCKET", OpenSocketTransport},
+};
+
+class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {
+public:
+    HRESULT Open(BSTR resourceName, LONG /*accessMode*/, LONG openTimeout, BSTR /*optionString*/,
+                 IVisaSession** ppSession) override {
+        if (!ppSession) return E_POINTER;
+        *ppSession = nullptr;
+        return Guard(kManagerIid, [&] { return OpenSession(qn::com::BstrToUtf8(resourceName), openTimeout, ppSession); });
+    }
+
+private:
+    static HRESULT OpenSession(const std::string& text, LONG openTimeout,
+                               IVisaSession** ppSession) {
+        std::string error;
+        std::optional<ResourceName> name = ParseResourceName(text, &error);
+        if (!name) return Report(E_VISA_INVALID_RESOURCE_NAME, kManagerIid, "invalid resource name " + error);
+        if (openTimeout <= 0 && openTimeout != kTimeoutInfinite) openTimeout = kDefaultOpenTimeoutMs;
+        for (const TransportKind& kind : kTransports) {
+            if (kind.interface_type != name->interface_type ||
+                kind.resource_class != name->resource_class)
+                continue;
+            std::unique_ptr<Transport> transport;
+            HRESULT hr = kind.open(*name, openTimeout, &transport, &error);
+            if (FAILED(hr)) return Report(hr, kManagerIid, text + ": " + error);
+            auto session = qn::com::MakeComObject<MessageSession>(std::move(*name),
+                                                                  std::move(transport));
+            return session->QueryInterface(iid_of<IVisaSession>,
+                                           reinterpret_cast<void**>(ppSession));
+        }
+        return Report(E_VISA_RESOURCE_NOT_FOUND, kManagerIid,
+                      text + ": no transport for " + name->resource_class +
+                          " resources of this kind in this build");
+    }
+};
+
+}  // namespace
+
+HRESULT CreateResourceManager(IResourceManager** ppManager) {
+    if (!ppManager) return E_POINTER;
+    *ppManager = nullptr;
+    return Guard(kManagerIid, [&] {
+        *ppManager = qn::com::MakeComObject<ResourceManager>().Detach();
+        return S_OK;
+    });
+}
+
+}  // namespace qn::visa

@@ -1,0 +1,245 @@
+#include "platform/visa/session.h"
+
+#include <string>
+#include <vector>
+
+#include "platform/visa/errors.h"
+
+namespace qn::visa {
+namespace {
+
+constexpr GUID kIidMessage = iid_of<IMessage>;
+// ReadString reads in pieces of this size, so a large count allocates only
+// what the reply needs.
+constexpr std::size_t kStringChunk = 64 * 1024;
+
+VARIANT_BOOL Bool(bool b) { return b ? VARIANT_TRUE : VARIANT_FALSE; }
+
+}  // namespace
+
+MessageSession::MessageSession(ResourceName name, std::unique_ptr<Transport> transport)
+    : name_(std::move(name)), transport_(std::move(transport)) {}
+
+HRESULT MessageSession::Closed() const {
+    return Report(E_VISA_INVALID_OBJECT, kIidMessage, "the session is closed");
+}
+
+HRESULT MessageSession::get_HardwareInterfaceType(SHORT* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = SHORT(name_.interface_type);
+    return S_OK;
+}
+
+HRESULT MessageSession::get_HardwareInterfaceNumber(SHORT* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = SHORT(name_.board);
+    return S_OK;
+}
+
+HRESULT MessageSession::get_ResourceClass(BSTR* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = qn::com::Utf8ToBstr(name_.resource_class);
+    return *pVal ? S_OK : E_OUTOFMEMORY;
+}
+
+HRESULT MessageSession::get_ResourceName(BSTR* pVal) {
+    if (!pVal) return E_POINTER;
+    return Guard(kIidMessage, [&] {
+        *pVal = qn::com::Utf8ToBstr(name_.Canonical());
+        return *pVal ? S_OK : E_OUTOFMEMORY;
+    });
+}
+
+HRESULT MessageSession::get_Timeout(LONG* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = timeout_.load();
+    return S_OK;
+}
+
+HRESULT MessageSession::put_Timeout(LONG val) {
+    if (val < kTimeoutInfinite)
+        return Report(E_VISA_ATTRIBUTE_STATE, kIidMessage,
+                      "timeout " + std::to_string(val) + " ms: use 0 or more, or -1 for none");
+    timeout_ = val;
+    return S_OK;
+}
+
+HRESULT MessageSession::Close() {
+    std::lock_guard<std::mutex> lock(io_);
+    if (transport_) transport_->Close();
+    transport_.reset();
+    return S_OK;
+}
+
+HRESULT MessageSession::Clear() {
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        if (!transport_) return Closed();
+        std::string error;
+        HRESULT hr = transport_->Clear(Deadline::FromTimeout(timeout_), &error);
+        return FAILED(hr) ? Report(hr, kIidMessage, "device clear: " + error) : hr;
+    });
+}
+
+HRESULT MessageSession::ReadSTB(SHORT* pStatusByte) {
+    if (!pStatusByte) return E_POINTER;
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        if (!transport_) return Closed();
+        std::string error;
+        BYTE stb = 0;
+        HRESULT hr = transport_->ReadStatusByte(Deadline::FromTimeout(timeout_), &stb, &error);
+        if (FAILED(hr)) return Report(hr, kIidMessage, "read status byte: " + error);
+        *pStatusByte = stb;
+        return S_OK;
+    });
+}
+
+HRESULT MessageSession::ReadLocked(BYTE* buf, std::size_t count, DWORD flags,
+                                   const Deadline& deadline, ReadResult* result) {
+    if (!transport_) return Closed();
+    ReadRequest req;
+    req.buf = buf;
+    req.count = count;
+    req.term_char_enabled = term_enabled_ && !(flags & kReadIgnoreTermChar);
+    req.term_char = term_char_;
+    req.return_available = (flags & kReadAvailable) != 0;
+    std::string error;
+    HRESULT hr = transport_->Read(req, deadline, result, &error);
+    return FAILED(hr) ? Report(hr, kIidMessage, error) : hr;
+}
+
+HRESULT MessageSession::Read(LONG count, SAFEARRAY** pBuffer) {
+    if (!pBuffer) return E_POINTER;
+    *pBuffer = nullptr;
+    if (count < 0) return Report(E_INVALIDARG, kIidMessage, "negative read count");
+    return Guard(kIidMessage, [&] {
+        qn::com::SafeArray array = qn::com::SafeArray::Vector(VT_UI1, ULONG(count));
+        if (!array) return Report(E_OUTOFMEMORY, kIidMessage, "out of memory for the read");
+        std::lock_guard<std::mutex> lock(io_);
+        ReadResult r;
+        HRESULT hr = ReadLocked(array.data<BYTE>(), std::size_t(count), kReadDefault,
+                                Deadline::FromTimeout(timeout_), &r);
+        if (FAILED(hr)) return hr;
+        // Shrink the bound to what arrived; the allocation stays with the array.
+        array.get()->rgsabound[0].cElements = ULONG(r.bytes);
+        *pBuffer = array.Detach();
+        return S_OK;
+    });
+}
+
+HRESULT MessageSession::ReadString(LONG count, BSTR* pBuffer) {
+    if (!pBuffer) return E_POINTER;
+    *pBuffer = nullptr;
+    if (count < 0) return Report(E_INVALIDARG, kIidMessage, "negative read count");
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        const Deadline deadline = Deadline::FromTimeout(timeout_);
+        std::string text;
+        for (std::size_t left = std::size_t(count); left > 0;) {
+            std::size_t chunk = std::min(left, kStringChunk);
+            std::size_t old = text.size();
+            text.resize(old + chunk);
+            ReadResult r;
+            HRESULT hr = ReadLocked(reinterpret_cast<BYTE*>(&text[old]), chunk, kReadDefault,
+                                    deadline, &r);
+            if (FAILED(hr)) return hr;
+            text.resize(old + r.bytes);
+            left -= r.bytes;
+            if (r.end != kReadEndCount) break;
+        }
+        *pBuffer = qn::com::Utf8ToBstr(text);
+        return *pBuffer ? S_OK : E_OUTOFMEMORY;
+    });
+}
+
+HRESULT MessageSession::WriteBytes(const BYTE* data, std::size_t size, LONG* pRetCount) {
+    std::lock_guard<std::mutex> lock(io_);
+    if (!transport_) return Closed();
+    std::string error;
+    std::size_t written = 0;
+    HRESULT hr = transport_->Write(data, size, send_end_, Deadline::FromTimeout(timeout_),
+                                   &written, &error);
+    if (pRetCount) *pRetCount = LONG(written);
+    return FAILED(hr) ? Report(hr, kIidMessage, error) : hr;
+}
+
+HRESULT MessageSession::Write(SAFEARRAY** buffer, LONG count, LONG* pRetCount) {
+    if (!buffer || !*buffer || !pRetCount) return E_POINTER;
+    *pRetCount = 0;
+    SAFEARRAY* sa = *buffer;
+    if (sa->cDims != 1 || (sa->vt != VT_UI1 && sa->vt != VT_I1))
+        return Report(E_INVALIDARG, kIidMessage, "write needs a one-dimensional byte array");
+    const ULONG size = qn::com::SafeArrayCount(sa);
+    if (count == -1) count = LONG(size);
+    if (count < 0 || ULONG(count) > size)
+        return Report(E_INVALIDARG, kIidMessage, "write count outside the array");
+    return Guard(kIidMessage, [&] {
+        return WriteBytes(static_cast<const BYTE*>(sa->pvData), std::size_t(count), pRetCount);
+    });
+}
+
+HRESULT MessageSession::WriteString(BSTR buffer, LONG* pRetCount) {
+    if (!pRetCount) return E_POINTER;
+    *pRetCount = 0;
+    return Guard(kIidMessage, [&] {
+        std::string text = qn::com::BstrToUtf8(buffer);
+        return WriteBytes(reinterpret_cast<const BYTE*>(text.data()), text.size(), pRetCount);
+    });
+}
+
+HRESULT MessageSession::get_SendEndEnabled(VARIANT_BOOL* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = Bool(send_end_);
+    return S_OK;
+}
+
+HRESULT MessageSession::put_SendEndEnabled(VARIANT_BOOL val) {
+    send_end_ = val != VARIANT_FALSE;
+    return S_OK;
+}
+
+HRESULT MessageSession::get_TerminationCharacter(BYTE* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = term_char_;
+    return S_OK;
+}
+
+HRESULT MessageSession::put_TerminationCharacter(BYTE val) {
+    term_char_ = val;
+    return S_OK;
+}
+
+HRESULT MessageSession::get_TerminationCharacterEnabled(VARIANT_BOOL* pVal) {
+    if (!pVal) return E_POINTER;
+    *pVal = Bool(term_enabled_);
+    return S_OK;
+}
+
+HRESULT MessageSession::put_TerminationCharacterEnabled(VARIANT_BOOL val) {
+    term_enabled_ = val != VARIANT_FALSE;
+    return S_OK;
+}
+
+HRESULT MessageSession::ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) {
+    if (!pActual || (!buf && count > 0)) return E_POINTER;
+    *pActual = 0;
+    if (count < 0) return Report(E_INVALIDARG, kIidMessage, "negative read count");
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        ReadResult r;
+        HRESULT hr = ReadLocked(buf, std::size_t(count), flags, Deadline::FromTimeout(timeout_), &r);
+        *pActual = LONG(r.bytes);
+        if (pEnd) *pEnd = r.end;
+        return hr;
+    });
+}
+
+HRESULT MessageSession::WriteFrom(const BYTE* buf, LONG count, LONG* pActual) {
+    if (pActual) *pActual = 0;
+    if (!buf && count > 0) return E_POINTER;
+    if (count < 0) return Report(E_INVALIDARG, kIidMessage, "negative write count");
+    return Guard(kIidMessage, [&] { return WriteBytes(buf, std::size_t(count), pActual); });
+}
+
+}  // namespace qn::visa

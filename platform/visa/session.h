@@ -1,0 +1,66 @@
+// A message-based instrument session over one transport: IVisaSession and
+// IMessage with their settings, and IMessageDirect. One lock serialises the
+// I/O of the session; the settings can be read and changed at any time.
+#pragma once
+
+#include <atomic>
+#include <memory>
+#include <mutex>
+
+#include "platform/visa/resource_name.h"
+#include "platform/visa/transport.h"
+#include "platform/visa/visa.h"
+
+namespace qn::visa {
+
+class MessageSession final
+    : public qn::com::ComObject<MessageSession, IMessage, qn::com::As<IVisaSession, IMessage>,
+                                IMessageDirect> {
+public:
+    MessageSession(ResourceName name, std::unique_ptr<Transport> transport);
+
+    // IVisaSession
+    HRESULT get_HardwareInterfaceType(SHORT* pVal) override;
+    HRESULT get_HardwareInterfaceNumber(SHORT* pVal) override;
+    HRESULT get_ResourceClass(BSTR* pVal) override;
+    HRESULT get_ResourceName(BSTR* pVal) override;
+    HRESULT get_Timeout(LONG* pVal) override;
+    HRESULT put_Timeout(LONG val) override;
+    HRESULT Close() override;
+
+    // IMessage
+    HRESULT Clear() override;
+    HRESULT ReadSTB(SHORT* pStatusByte) override;
+    HRESULT Read(LONG count, SAFEARRAY** pBuffer) override;
+    HRESULT ReadString(LONG count, BSTR* pBuffer) override;
+    HRESULT Write(SAFEARRAY** buffer, LONG count, LONG* pRetCount) override;
+    HRESULT WriteString(BSTR buffer, LONG* pRetCount) override;
+    HRESULT get_SendEndEnabled(VARIANT_BOOL* pVal) override;
+    HRESULT put_SendEndEnabled(VARIANT_BOOL val) override;
+    HRESULT get_TerminationCharacter(BYTE* pVal) override;
+    HRESULT put_TerminationCharacter(BYTE val) override;
+    HRESULT get_TerminationCharacterEnabled(VARIANT_BOOL* pVal) override;
+    HRESULT put_TerminationCharacterEnabled(VARIANT_BOOL val) override;
+
+    // IMessageDirect
+    HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) override;
+    HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) override;
+
+private:
+    // One transport read with the session's settings and deadline; the
+    // caller holds io_.
+    HRESULT ReadLocked(BYTE* buf, std::size_t count, DWORD flags, const Deadline& deadline,
+                       ReadResult* result);
+    HRESULT WriteBytes(const BYTE* data, std::size_t size, LONG* pRetCount);
+    HRESULT Closed() const;
+
+    const ResourceName name_;
+    std::mutex io_;
+    std::unique_ptr<Transport> transport_;  // null once closed; guarded by io_
+    std::atomic<LONG> timeout_{kDefaultTimeoutMs};
+    std::atomic<bool> send_end_{true};
+    std::atomic<bool> term_enabled_{false};
+    std::atomic<BYTE> term_char_{'\n'};
+};
+
+}  // namespace qn::visa

@@ -1,0 +1,56 @@
+// The transport under a message-based session: one connection to one
+// instrument. Each kind of resource has its own implementation in its own
+// file; the session (session.cpp) holds the settings and the lock and calls
+// these operations. Results are HRESULTs (E_VISA_* of visa.h); failures also
+// fill *error with a description for the thread's error information.
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <string>
+
+#include "platform/visa/deadline.h"
+#include "platform/visa/visa.h"
+
+namespace qn::visa {
+
+struct ResourceName;
+
+struct ReadRequest {
+    BYTE* buf = nullptr;
+    std::size_t count = 0;
+    bool term_char_enabled = false;  // stop after term_char
+    BYTE term_char = '\n';
+    bool return_available = false;  // stop once some data came and no more waits
+};
+
+struct ReadResult {
+    std::size_t bytes = 0;        // stored in buf, also on failure
+    ReadEnd end = kReadEndCount;  // why the read stopped (on success)
+};
+
+class Transport {
+public:
+    virtual ~Transport() = default;
+
+    virtual HRESULT Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
+                         std::string* error) = 0;
+    // Writes all of data (partial count in *written on failure). send_end
+    // marks the end of the message where the bus has an END.
+    virtual HRESULT Write(const BYTE* data, std::size_t size, bool send_end,
+                          const Deadline& deadline, std::size_t* written, std::string* error) = 0;
+    // Device clear as this bus can do it.
+    virtual HRESULT Clear(const Deadline& deadline, std::string* error) = 0;
+    virtual HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) = 0;
+    // Drops input received and not yet read (after a timeout, so that a late
+    // reply is not taken for the answer to the next query).
+    virtual void DiscardInput() = 0;
+    virtual void Close() = 0;
+};
+
+// The raw-socket transport (socket_transport.cpp): connects to host:port of
+// a SOCKET resource within open_timeout_ms (-1: no limit).
+HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
+                            std::unique_ptr<Transport>* out, std::string* error);
+
+}  // namespace qn::visa
