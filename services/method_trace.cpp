@@ -19,6 +19,17 @@ const char* DirectionText(TraceDirection d) {
     return "In";
 }
 
+// The local time of day of `t`, formatted once per second and thread.
+const char* TimeOfDay(std::int64_t t) {
+    thread_local std::int64_t last = -1;
+    thread_local std::string text;
+    if (t != last || text.empty()) {
+        text = LocalTimeOfDay(t);
+        last = t;
+    }
+    return text.c_str();
+}
+
 void AddArray(pugi::xml_node e, SAFEARRAY* psa, const CTracer& tracer) {
     TraceArrayText a = DescribeTraceArray(psa, tracer.GetTraceArrays(), tracer.GetArrayLimit());
     e.append_attribute("NumDims") = a.numDims;
@@ -65,7 +76,7 @@ void CMethodTrace::Begin(CTraceOwner* tracer, const char* interfaceName, const c
         if (!m) return;
         m.append_attribute("Name") = methodName ? methodName : "";
         m.append_attribute("Interface") = interfaceName ? interfaceName : "";
-        m.append_attribute("StartTime") = LocalTimeOfDay(now).c_str();
+        m.append_attribute("StartTime") = TimeOfDay(now);
         m.append_attribute("Thread") = static_cast<int>(gettid());
         AddParameters(m, params, true, *tracer);
         tracer_ = tracer;
@@ -84,7 +95,7 @@ void CMethodTrace::End() noexcept {
         {
             std::lock_guard lock(doc_->mutex);
             pugi::xml_node m(element_);
-            m.append_attribute("EndTime") = LocalTimeOfDay(now).c_str();
+            m.append_attribute("EndTime") = TimeOfDay(now);
             // The whole elapsed time in seconds (a call of 75 s shows 75).
             long elapsed = static_cast<long>(std::max<std::int64_t>(now - start_, 0));
             char buf[32];
