@@ -7,6 +7,7 @@
 
 #include <arpa/inet.h>
 #include <netinet/in.h>
+#include <netinet/tcp.h>
 #include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -41,15 +42,15 @@ public:
         return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
     }
 
-    LoopbackPeer& Expect(std::string bytes) { return Add({Step::kExpect, std::move(bytes)}); }
+    LoopbackPeer& Expect(std::string bytes) { return Add({Step::kExpect, std::move(bytes), 0, 0}); }
     // Sends data in pieces of chunk bytes (0: at once), pausing gap_ms between.
     LoopbackPeer& Send(std::string data, std::size_t chunk = 0, int gap_ms = 0) {
         return Add({Step::kSend, std::move(data), chunk, gap_ms});
     }
     LoopbackPeer& Pause(int ms) { return Add({Step::kPause, {}, 0, ms}); }
     // Fulfils the next of the futures handed out by Signal().
-    LoopbackPeer& Notify() { return Add({Step::kNotify}); }
-    LoopbackPeer& Drop() { return Add({Step::kDrop}); }
+    LoopbackPeer& Notify() { return Add({Step::kNotify, {}, 0, 0}); }
+    LoopbackPeer& Drop() { return Add({Step::kDrop, {}, 0, 0}); }
 
     std::future<void> Signal() {
         signals_.emplace_back();
@@ -96,6 +97,8 @@ private:
             return;
         }
         int fd = ::accept4(listen_fd_, nullptr, nullptr, SOCK_CLOEXEC);
+        int one = 1;
+        ::setsockopt(fd, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
         std::string pending;
         std::size_t next_signal = 0;
         for (const Step& s : steps_) {

@@ -1,0 +1,278 @@
+// Message sessions over the raw-socket transport, against a scripted
+// loopback peer.
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <cstring>
+
+#include "platform/visa/visa.h"
+#include "tests/platform/visa/loopback_peer.h"
+#include "tests/platform/visa/visa_test_util.h"
+
+namespace qn::visa::test {
+namespace {
+
+using qn::com::Bstr;
+
+HRESULT OpenResource(const std::string& resource, LONG open_timeout, ComPtr<IVisaSession>* out) {
+    ComPtr<IResourceManager> rm;
+    EXPECT_EQ(CreateResourceManager(rm.Out()), S_OK);
+    return rm->Open(Bstr(resource).get(), kNoLock, open_timeout, nullptr, out->Out());
+}
+
+TEST(SocketSessionTest, RepliesSplitAtEveryChunkSizeReadWhole) {
+    const std::string reply = "QUORLEN,731XX,SN42,1.3.20\n";
+    LoopbackPeer peer;
+    for (std::size_t chunk = 1; chunk <= reply.size(); ++chunk)
+        peer.Expect("*IDN?\n").Send(reply, chunk);
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    for (std::size_t chunk = 1; chunk <= reply.size(); ++chunk) {
+        ASSERT_EQ(Write(msg.get(), "*IDN?\n"), S_OK);
+        std::string text;
+        ASSERT_EQ(ReadText(msg.get(), &text), S_OK) << ThreadErrorText();
+        EXPECT_EQ(text, reply) << "chunk " << chunk;
+    }
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, TerminationCharacterAndCountEndReads) {
+    LoopbackPeer peer;
+    peer.Send("ab;cd\nef\n");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    std::string text;
+    // A different termination character.
+    msg->put_TerminationCharacter(';');
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "ab;");
+    // Disabled: only the count ends the read, line feeds included.
+    msg->put_TerminationCharacterEnabled(VARIANT_FALSE);
+    ASSERT_EQ(ReadText(msg.get(), &text, 4), S_OK);
+    EXPECT_EQ(text, "cd\ne");
+    // Enabled again with line feed; the count can end a read first.
+    msg->put_TerminationCharacter('\n');
+    msg->put_TerminationCharacterEnabled(VARIANT_TRUE);
+    ASSERT_EQ(ReadText(msg.get(), &text, 1), S_OK);
+    EXPECT_EQ(text, "f");
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "\n");
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+// The peer drips a reply slower than the timeout allows: a per-chunk limit
+// would wait for it, a total deadline fails. The late bytes must then not be
+// taken for the reply to the next query.
+TEST(SocketSessionTest, TimeoutIsTotalAndLateReplyDoesNotLeak) {
+    LoopbackPeer peer;
+    auto dripped = peer.Signal();
+    peer.Expect("SLOW?\n").Send(std::string(30, 'x') + "\n", 1, 20).Notify();
+    peer.Expect("NEXT?\n").Send("fresh\n");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource(), 150);
+    ASSERT_TRUE(msg);
+    ASSERT_EQ(Write(msg.get(), "SLOW?\n"), S_OK);
+    std::string text;
+    EXPECT_EQ(ReadText(msg.get(), &text), E_VISA_TIMEOUT);
+    EXPECT_NE(ThreadErrorText().find("timeout"), std::string::npos);
+    LONG timeout = 0;
+    msg->get_Timeout(&timeout);
+    EXPECT_EQ(timeout, 150);
+    dripped.wait();
+    ASSERT_EQ(Write(msg.get(), "NEXT?\n"), S_OK);
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "fresh\n");
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, QuietLineIsNotTheEndOfAReply) {
+    LoopbackPeer peer;
+    peer.Expect("Q?\n").Send("12").Pause(200).Send("34\n");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource(), 5000);
+    ASSERT_TRUE(msg);
+    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
+    std::string text;
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "1234\n");
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, DroppedConnectionFailsInsteadOfHanging) {
+    LoopbackPeer peer;
+    peer.Expect("Q?\n").Send("partial").Drop();
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource(), kTimeoutInfinite);
+    ASSERT_TRUE(msg);
+    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
+    std::string text;
+    EXPECT_EQ(ReadText(msg.get(), &text), E_VISA_CONNECTION_LOST);
+    EXPECT_NE(ThreadErrorText().find("closed"), std::string::npos);
+    EXPECT_EQ(peer.Finish(), "");
+    // Writing to the dead connection fails too (at the latest the second time).
+    HRESULT hr = Write(msg.get(), "A\n");
+    if (SUCCEEDED(hr)) hr = Write(msg.get(), "B\n");
+    EXPECT_TRUE(FAILED(hr));
+}
+
+TEST(SocketSessionTest, ClearDiscardsUnreadInput) {
+    LoopbackPeer peer;
+    auto sent = peer.Signal();
+    peer.Send("stale reply\n").Notify().Expect("Q?\n").Send("good\n");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    sent.wait();
+    // Loopback delivers at once: the stale reply is here when the peer has sent it.
+    ASSERT_EQ(msg->Clear(), S_OK);
+    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
+    std::string text;
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "good\n");
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, StatusByteByCommonQuery) {
+    LoopbackPeer peer;
+    peer.Expect("*STB?\n").Send("+72\n").Expect("*STB?\n").Send("ON\n");
+    peer.Expect("*STB?\n").Send("300\n");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    SHORT stb = 0;
+    ASSERT_EQ(msg->ReadSTB(&stb), S_OK);
+    EXPECT_EQ(stb, 72);
+    EXPECT_EQ(msg->ReadSTB(&stb), E_VISA_INVALID_FORMAT);
+    EXPECT_EQ(msg->ReadSTB(&stb), E_VISA_INVALID_FORMAT);
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, ByteArraysWithCountsAndDirectCalls) {
+    LoopbackPeer peer;
+    peer.Expect(std::string("A\0B", 3)).Expect("AB").Send("xyz\n").Send("0123456789");
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    qn::com::SafeArray bytes = qn::com::SafeArray::Vector(VT_UI1, 3);
+    std::memcpy(bytes.data<BYTE>(), "A\0B", 3);
+    SAFEARRAY* sa = bytes.get();
+    LONG written = 0;
+    ASSERT_EQ(msg->Write(&sa, -1, &written), S_OK);
+    EXPECT_EQ(written, 3);
+    EXPECT_EQ(msg->Write(&sa, 4, &written), E_INVALIDARG);
+    EXPECT_EQ(msg->Write(&sa, -2, &written), E_INVALIDARG);
+    ComPtr<IMessageDirect> direct;
+    ASSERT_EQ(msg.As(direct), S_OK);
+    ASSERT_EQ(direct->WriteFrom(reinterpret_cast<const BYTE*>("AB"), 2, &written), S_OK);
+    qn::com::SafeArray got;
+    ASSERT_EQ(msg->Read(100, got.Out()), S_OK);
+    ASSERT_EQ(got.size(), 4u);
+    EXPECT_EQ(std::string(got.data<char>(), 4), "xyz\n");
+    BYTE buf[16];
+    LONG actual = 0, end = -1;
+    ASSERT_EQ(direct->ReadInto(buf, 10, kReadIgnoreTermChar, &actual, &end), S_OK);
+    EXPECT_EQ(actual, 10);
+    EXPECT_EQ(end, kReadEndCount);
+    EXPECT_EQ(msg->Read(-1, got.Out()), E_INVALIDARG);
+    direct.reset();
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(SocketSessionTest, SessionPropertiesAndClose) {
+    LoopbackPeer peer;
+    peer.Start();
+    auto msg = OpenMessage(peer.Resource());
+    ASSERT_TRUE(msg);
+    SHORT type = 0;
+    msg->get_HardwareInterfaceType(&type);
+    EXPECT_EQ(type, kInterfaceTcpip);
+    Bstr cls, name;
+    msg->get_ResourceClass(cls.Out());
+    msg->get_ResourceName(name.Out());
+    EXPECT_EQ(cls.utf8(), "SOCKET");
+    EXPECT_EQ(name.utf8(), peer.Resource());
+    EXPECT_EQ(msg->put_Timeout(-2), E_VISA_ATTRIBUTE_STATE);
+    EXPECT_EQ(msg->put_Timeout(kTimeoutInfinite), S_OK);
+    VARIANT_BOOL send_end = VARIANT_FALSE;
+    msg->get_SendEndEnabled(&send_end);
+    EXPECT_EQ(send_end, VARIANT_TRUE);
+    ComPtr<IRegister> reg;
+    EXPECT_EQ(msg.As(reg), E_NOINTERFACE);
+    ASSERT_EQ(msg->Close(), S_OK);
+    EXPECT_EQ(Write(msg.get(), "X\n"), E_VISA_INVALID_OBJECT);
+    msg.reset();
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+struct OpenCase {
+    std::string resource;
+    HRESULT expected;
+    const char* text;  // in the thread's error description
+};
+
+TEST(SocketSessionTest, OpenFailuresAreCleanAndExplained) {
+    // A port where nothing listens: bind one, then close it.
+    int fd = ::socket(AF_INET, SOCK_STREAM, 0);
+    sockaddr_in a{};
+    a.sin_family = AF_INET;
+    a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    ::bind(fd, reinterpret_cast<sockaddr*>(&a), sizeof a);
+    socklen_t len = sizeof a;
+    ::getsockname(fd, reinterpret_cast<sockaddr*>(&a), &len);
+    const std::string closed_port = std::to_string(ntohs(a.sin_port));
+    ::close(fd);
+    const OpenCase kCases[] = {
+        {"TCPIP0::127.0.0.1::" + closed_port + "::SOCKET", E_VISA_RESOURCE_NOT_FOUND, "connect"},
+        {"TCPIP0::no-such-host.invalid::5025::SOCKET", E_VISA_RESOURCE_NOT_FOUND, "unknown host"},
+        {"TCPIP0::127.0.0.1::inst0::INSTR", E_VISA_RESOURCE_NOT_FOUND, "no transport"},
+        {"GPIB0::7::INSTR", E_VISA_RESOURCE_NOT_FOUND, "no transport"},
+        {"TCPIP0::host::99999::SOCKET", E_VISA_INVALID_RESOURCE_NAME, "port"},
+        {"garbage", E_VISA_INVALID_RESOURCE_NAME, "unrecognised"},
+    };
+    for (const OpenCase& c : kCases) {
+        ComPtr<IVisaSession> session;
+        EXPECT_EQ(OpenResource(c.resource, 2000, &session), c.expected) << c.resource;
+        EXPECT_FALSE(session);
+        EXPECT_NE(ThreadErrorText().find(c.text), std::string::npos) << c.resource;
+    }
+}
+
+// A listener whose accept queue is full never completes a handshake: the
+// open must give up by its open timeout.
+TEST(SocketSessionTest, ConnectionThatNeverCompletesTimesOut) {
+    int lfd = ::socket(AF_INET, SOCK_STREAM, 0);
+    sockaddr_in a{};
+    a.sin_family = AF_INET;
+    a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    ::bind(lfd, reinterpret_cast<sockaddr*>(&a), sizeof a);
+    ::listen(lfd, 0);
+    socklen_t len = sizeof a;
+    ::getsockname(lfd, reinterpret_cast<sockaddr*>(&a), &len);
+    std::vector<int> fillers;
+    for (int i = 0; i < 4; ++i) {
+        int f = ::socket(AF_INET, SOCK_STREAM | SOCK_NONBLOCK, 0);
+        ::connect(f, reinterpret_cast<sockaddr*>(&a), sizeof a);
+        fillers.push_back(f);
+    }
+    ComPtr<IVisaSession> session;
+    const std::string resource =
+        "TCPIP0::127.0.0.1::" + std::to_string(ntohs(a.sin_port)) + "::SOCKET";
+    EXPECT_EQ(OpenResource(resource, 300, &session), E_VISA_RESOURCE_NOT_FOUND);
+    EXPECT_NE(ThreadErrorText().find("timed out"), std::string::npos);
+    for (int f : fillers) ::close(f);
+    ::close(lfd);
+}
+
+}  // namespace
+}  // namespace qn::visa::test
