@@ -84,7 +84,10 @@ TEST(TraceValue, ControlCharactersCannotBreakTheXml) {
 
 TEST(TraceValue, ArraysListAtMostTheLimitOfOneDimensionalElements) {
     com::SafeArray v = com::SafeArray::Vector(VT_R8, 3);
-    for (int i = 0; i < 3; ++i) v.data<double>()[i] = i + 0.5;
+    for (LONG i = 0; i < 3; ++i) {
+        double x = i + 0.5;
+        SafeArrayPutElement(v.get(), &i, &x);
+    }
     SAFEARRAYBOUND b2[2] = {{2, 0}, {3, 0}};
     com::SafeArray m(SafeArrayCreate(VT_I4, 2, b2));
     com::SafeArray strings = com::SafeArray::Vector(VT_BSTR, 2, 1);

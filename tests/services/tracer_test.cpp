@@ -173,7 +173,10 @@ TEST_F(TracerTest, TraceNamesAndDefaultName) {
 
 TEST_F(TracerTest, ArrayParameters) {
     com::SafeArray wave = com::SafeArray::Vector(VT_R8, 20);
-    for (int i = 0; i < 20; ++i) wave.data<double>()[i] = i;
+    for (LONG i = 0; i < 20; ++i) {
+        double x = i;
+        SafeArrayPutElement(wave.get(), &i, &x);
+    }
     SAFEARRAYBOUND b[2] = {{2, 0}, {4, 0}};
     com::SafeArray grid(SafeArrayCreate(VT_I2, 2, b));
     SAFEARRAY* w = wave.get();
@@ -197,7 +200,8 @@ TEST_F(TracerTest, ArrayParameters) {
             CMethodTrace trace(&t, "IQuorlen731XXWaveform", "FetchWaveform", p);
         }
         t.SaveOnClose();
-        pugi::xml_node p = Load(t.GetFilePath()).child("TraceRecords").child("Method").child("Parameter");
+        pugi::xml_document d = Load(t.GetFilePath());
+        pugi::xml_node p = d.child("TraceRecords").child("Method").child("Parameter");
         EXPECT_EQ(p.attribute("NumDims").as_int(), c.psa == &g ? 2 : 1);
         EXPECT_STREQ(p.attribute("DimSizes").value(), c.dimSizes);
         auto el = p.children("Element");
@@ -223,7 +227,8 @@ TEST_F(TracerTest, BoolByReferenceAndWholeExecutionSeconds) {
         g_now += 75;
     }
     t.SaveOnClose();
-    pugi::xml_node m = Load(t.GetFilePath()).child("TraceRecords").child("Method");
+    pugi::xml_document d = Load(t.GetFilePath());
+    pugi::xml_node m = d.child("TraceRecords").child("Method");
     EXPECT_STREQ(m.child("Parameter").attribute("Value").value(), "true");
     EXPECT_STREQ(m.attribute("ExecutionTime").value(), "75");
 }
