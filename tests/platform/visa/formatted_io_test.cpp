@@ -1,0 +1,264 @@
+// IFormattedIO488 over a socket session: binary blocks in every chunking,
+// lying and oversized headers, numbers, lists and block writes.
+#include <gtest/gtest.h>
+
+#include <cstring>
+
+#include "platform/visa/visa.h"
+#include "tests/platform/visa/loopback_peer.h"
+#include "tests/platform/visa/visa_test_util.h"
+
+namespace qn::visa::test {
+namespace {
+
+using qn::com::Bstr;
+using qn::com::Variant;
+
+struct Bound {
+    ComPtr<IMessage> msg;
+    ComPtr<IFormattedIO488> io;
+    ComPtr<IFormattedIO488Direct> direct;
+};
+
+Bound Bind(LoopbackPeer& peer, LONG timeout_ms = 2000) {
+    Bound b;
+    b.msg = OpenMessage(peer.Resource(), timeout_ms);
+    EXPECT_EQ(CreateFormattedIO488(b.io.Out()), S_OK);
+    EXPECT_EQ(b.io->put_IO(b.msg.get()), S_OK);
+    EXPECT_EQ(b.io.As(b.direct), S_OK);
+    return b;
+}
+
+void Release(Bound& b) {
+    b.direct.reset();
+    b.io.reset();
+    b.msg.reset();
+}
+
+std::string Query(Bound& b, const std::string& q) {
+    Write(b.msg.get(), q);
+    std::string text;
+    EXPECT_EQ(ReadText(b.msg.get(), &text), S_OK) << ThreadErrorText();
+    return text;
+}
+
+// Binary data with line feeds in it: only the declared length may end it.
+std::string BinaryData(std::size_t n) {
+    std::string d(n, '\0');
+    for (std::size_t i = 0; i < n; ++i) d[i] = char(i % 7 == 0 ? '\n' : i * 31);
+    return d;
+}
+
+std::string Block(const std::string& data) {
+    std::string len = std::to_string(data.size());
+    return "#" + std::to_string(len.size()) + len + data;
+}
+
+TEST(FormattedIOTest, BlockWithEmbeddedLineFeedsAtEveryChunkSize) {
+    const std::string data = BinaryData(300);
+    const std::size_t kChunks[] = {1, 2, 3, 5, 7, 11, 64, 299, 300, 4096};
+    LoopbackPeer peer;
+    for (std::size_t chunk : kChunks) peer.Expect("WAV?\n").Send(Block(data) + "\n", chunk);
+    peer.Expect("*OPC?\n").Send("1\n");
+    peer.Start();
+    Bound b = Bind(peer);
+    for (std::size_t chunk : kChunks) {
+        Write(b.msg.get(), "WAV?\n");
+        Variant v;
+        ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_UI1, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK)
+            << "chunk " << chunk << ": " << ThreadErrorText();
+        ASSERT_EQ(v.vt, VT_ARRAY | VT_UI1);
+        ASSERT_EQ(qn::com::SafeArrayCount(v.parray), data.size());
+        EXPECT_EQ(std::memcmp(v.parray->pvData, data.data(), data.size()), 0) << chunk;
+    }
+    // The trailing line feed was consumed: the next reply is not shifted.
+    EXPECT_EQ(Query(b, "*OPC?\n"), "1\n");
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(FormattedIOTest, WordBlocksHonourByteOrderAndDirectBuffers) {
+    const std::string be("\x01\x02\xff\xfe", 4);  // 0x0102, 0xfffe big-endian
+    LoopbackPeer peer;
+    peer.Send(Block(be) + "\n").Send(Block(be) + "\n").Send("xx#14" + be + "\n");
+    peer.Send(Block(be + be) + "\n").Send("#0" + be + "\n");
+    peer.Start();
+    Bound b = Bind(peer);
+    Variant v;
+    ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK);
+    ASSERT_EQ(v.vt, VT_ARRAY | VT_I2);
+    EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[0], 0x0102);
+    EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[1], -2);
+    b.io->put_InstrumentBigEndian(VARIANT_FALSE);
+    ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK);
+    EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[0], 0x0201);
+    b.io->put_InstrumentBigEndian(VARIANT_TRUE);
+    // seekToBlock skips what precedes the '#'.
+    SHORT words[4] = {};
+    LONG actual = 0;
+    ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_TRUE,
+                                          VARIANT_TRUE),
+              S_OK);
+    EXPECT_EQ(actual, 2);
+    EXPECT_EQ(words[1], -2);
+    // Too little room: the first elements are kept, the rest read and dropped.
+    EXPECT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 3, &actual, VARIANT_FALSE,
+                                          VARIANT_TRUE),
+              E_VISA_USER_BUFFER);
+    EXPECT_EQ(actual, 3);
+    EXPECT_EQ(words[2], 0x0102);
+    // An indefinite block runs to the message end.
+    ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_FALSE,
+                                          VARIANT_TRUE),
+              S_OK);
+    EXPECT_EQ(actual, 2);
+    EXPECT_EQ(words[0], 0x0102);
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+// Lying, truncated and oversized headers fail cleanly, and the session is
+// usable for the next query afterwards.
+TEST(FormattedIOTest, BadBlockHeadersFailAndTheSessionRecovers) {
+    struct Case {
+        std::string reply;
+        HRESULT expected;
+    };
+    const Case kCases[] = {
+        {"#9999999999" + std::string(50, 'x') + "\n", E_VISA_INVALID_FORMAT},  // beyond the bound
+        {"#A123\n", E_VISA_INVALID_FORMAT},
+        {"#5123\n", E_VISA_INVALID_FORMAT},  // message ends inside the header
+        {"12345\n", E_VISA_INVALID_FORMAT},  // no block at all
+        {"#13abcd\n", E_VISA_INVALID_FORMAT},  // 3 bytes for 2-byte elements
+    };
+    LoopbackPeer peer;
+    std::vector<std::future<void>> sent;
+    for (const Case& c : kCases) {
+        sent.push_back(peer.Signal());
+        peer.Expect("WAV?\n").Send(c.reply).Notify().Expect("*OPC?\n").Send("1\n");
+    }
+    peer.Start();
+    Bound b = Bind(peer, 500);
+    b.direct->put_MaxBlockBytes(1000);
+    for (std::size_t i = 0; i < std::size(kCases); ++i) {
+        Write(b.msg.get(), "WAV?\n");
+        sent[i].wait();
+        Variant v;
+        EXPECT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v),
+                  kCases[i].expected)
+            << kCases[i].reply;
+        EXPECT_FALSE(ThreadErrorText().empty());
+        EXPECT_EQ(Query(b, "*OPC?\n"), "1\n") << kCases[i].reply;
+    }
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(FormattedIOTest, ConnectionDroppedMidBlock) {
+    LoopbackPeer peer;
+    peer.Send("#41000" + std::string(10, 'x')).Drop();
+    peer.Start();
+    Bound b = Bind(peer, kTimeoutInfinite);
+    BYTE buf[1000];
+    LONG actual = 0;
+    EXPECT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_UI1, buf, 1000, &actual, VARIANT_FALSE,
+                                          VARIANT_TRUE),
+              E_VISA_CONNECTION_LOST);
+    EXPECT_EQ(actual, 10);
+    EXPECT_EQ(peer.Finish(), "");
+    Release(b);
+}
+
+TEST(FormattedIOTest, NumbersAndListsOfEachType) {
+    LoopbackPeer peer;
+    peer.Send("+1.5E+01;-7,40000\n").Send("1, 2 ,3\n").Send("1.5,ABC,#H10\n").Send("\n");
+    peer.Send("2.7V\n");
+    peer.Start();
+    Bound b = Bind(peer);
+    Variant v;
+    ASSERT_EQ(b.io->ReadNumber(ASCIIType_R8, VARIANT_FALSE, &v), S_OK);
+    EXPECT_EQ(v.vt, VT_R8);
+    EXPECT_DOUBLE_EQ(v.dblVal, 15.0);
+    ASSERT_EQ(b.io->ReadNumber(ASCIIType_I2, VARIANT_FALSE, &v), S_OK);
+    EXPECT_EQ(v.vt, VT_I2);
+    EXPECT_EQ(v.iVal, -7);
+    EXPECT_EQ(b.io->ReadNumber(ASCIIType_I2, VARIANT_TRUE, &v), DISP_E_OVERFLOW);
+    ASSERT_EQ(b.io->ReadList(ASCIIType_I4, nullptr, &v), S_OK);
+    ASSERT_EQ(v.vt, VT_ARRAY | VT_I4);
+    ASSERT_EQ(qn::com::SafeArrayCount(v.parray), 3u);
+    EXPECT_EQ(static_cast<LONG*>(v.parray->pvData)[2], 3);
+    ASSERT_EQ(b.io->ReadList(ASCIIType_Any, nullptr, &v), S_OK);
+    ASSERT_EQ(v.vt, VT_ARRAY | VT_VARIANT);
+    auto* items = static_cast<VARIANT*>(v.parray->pvData);
+    EXPECT_EQ(items[0].vt, VT_R8);
+    EXPECT_EQ(items[1].vt, VT_BSTR);
+    EXPECT_EQ(qn::com::BstrToUtf8(items[1].bstrVal), "ABC");
+    EXPECT_DOUBLE_EQ(items[2].dblVal, 16.0);
+    // An empty reply holds no number.
+    EXPECT_EQ(b.io->ReadNumber(ASCIIType_R8, VARIANT_TRUE, &v), E_VISA_INVALID_FORMAT);
+    // A unit after the number is left for the flush.
+    ASSERT_EQ(b.io->ReadNumber(ASCIIType_I4, VARIANT_TRUE, &v), S_OK);
+    EXPECT_EQ(v.lVal, 2);
+    EXPECT_EQ(b.io->ReadNumber(99, VARIANT_TRUE, &v), E_INVALIDARG);
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
+    LoopbackPeer peer;
+    peer.Expect(":TIM:SCAL 0.000125\n");
+    peer.Expect(":CHAN1:OFFS -3\n");
+    peer.Expect("VALS 1,2.5,-3\n");
+    peer.Expect(std::string(":WMEM #14\x01\x02\xff\xfe\n", 12));
+    peer.Start();
+    Bound b = Bind(peer);
+    ASSERT_EQ(b.io->WriteString(Bstr(":TIM:SCAL ").get(), VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteNumber(Variant::Double(0.000125), ASCIIType_R8, VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    ASSERT_EQ(b.io->WriteString(Bstr(":CHAN1:OFFS ").get(), VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteNumber(Variant::Double(-2.6), ASCIIType_I4, VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    EXPECT_EQ(b.io->WriteNumber(Variant::Double(1e6), ASCIIType_I2, VARIANT_TRUE),
+              DISP_E_OVERFLOW);
+
+    Variant list;
+    list.vt = VT_ARRAY | VT_R8;
+    list.parray = SafeArrayCreateVector(VT_R8, 0, 3);
+    double values[3] = {1, 2.5, -3};
+    std::memcpy(list.parray->pvData, values, sizeof values);
+    ASSERT_EQ(b.io->WriteString(Bstr("VALS ").get(), VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteList(&list, ASCIIType_R8, nullptr, VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+
+    Variant words;
+    words.vt = VT_ARRAY | VT_I2;
+    words.parray = SafeArrayCreateVector(VT_I2, 0, 2);
+    SHORT w[2] = {0x0102, -2};
+    std::memcpy(words.parray->pvData, w, sizeof w);
+    ASSERT_EQ(b.io->WriteIEEEBlock(Bstr(":WMEM ").get(), words, VARIANT_FALSE), S_OK);
+    ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+TEST(FormattedIOTest, UnboundObjectAndArguments) {
+    ComPtr<IFormattedIO488> io;
+    ASSERT_EQ(CreateFormattedIO488(io.Out()), S_OK);
+    BSTR s = nullptr;
+    EXPECT_EQ(io->ReadString(&s), E_VISA_INVALID_OBJECT);
+    EXPECT_EQ(io->FlushWrite(VARIANT_TRUE), E_VISA_INVALID_OBJECT);
+    EXPECT_EQ(io->SetBufferSize(IO_IN_BUF, 4), E_INVALIDARG);
+    EXPECT_EQ(io->SetBufferSize(64, 4096), E_INVALIDARG);
+    EXPECT_EQ(io->SetBufferSize(IO_IN_BUF | IO_OUT_BUF, 4096), S_OK);
+    ComPtr<IFormattedIO488Direct> direct;
+    ASSERT_EQ(io.As(direct), S_OK);
+    EXPECT_EQ(direct->put_MaxBlockBytes(-1), E_INVALIDARG);
+    LONGLONG bound = 0;
+    direct->get_MaxBlockBytes(&bound);
+    EXPECT_EQ(bound, kDefaultMaxBlockBytes);
+    EXPECT_EQ(io->ReadIEEEBlock(BinaryType_UI1, VARIANT_FALSE, VARIANT_FALSE, nullptr), E_POINTER);
+    EXPECT_EQ(io->ReadIEEEBlock(ASCIIType_BSTR, VARIANT_FALSE, VARIANT_FALSE, nullptr), E_POINTER);
+}
+
+}  // namespace
+}  // namespace qn::visa::test
