@@ -52,14 +52,20 @@ struct MemberInfo {
     std::array<std::string_view, kMaxFrameParams> params;  // IDL parameter names
 };
 
-template <class T>
+// Parameter wrappers: the frame learns each parameter's direction and how it
+// is traced from them.
+template <class T, VARTYPE VT = DefaultTraceVt<T>()>
 struct In {
     using type = T;
+    static constexpr bool kIsOut = false;
+    static constexpr VARTYPE kVt = VT;
     T value;
 };
-template <class T>
+template <class T, VARTYPE VT = DefaultTraceVt<T>()>
 struct Out {
     using type = T;
+    static constexpr bool kIsOut = true;
+    static constexpr VARTYPE kVt = VT;
     T* ptr;
 };
 template <class T>
@@ -70,17 +76,15 @@ template <class T>
 Out<T> out(T* p) {
     return Out<T>{p};
 }
+inline In<VARIANT_BOOL, VT_BOOL> in_bool(VARIANT_BOOL v) { return {v}; }
+inline Out<VARIANT_BOOL, VT_BOOL> out_bool(VARIANT_BOOL* p) { return {p}; }
 
 namespace frame_detail {
 
 template <class A>
-struct IsOut : std::false_type {};
-template <class T>
-struct IsOut<Out<T>> : std::true_type {};
+struct IsOut : std::bool_constant<A::kIsOut> {};
 template <class A>
-struct IsIn : std::false_type {};
-template <class T>
-struct IsIn<In<T>> : std::true_type {};
+struct IsIn : std::bool_constant<!A::kIsOut> {};
 
 template <class T>
 inline constexpr bool kSimulatable =
@@ -167,7 +171,8 @@ HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... ar
         (void)check;
         if (FAILED(hr)) return hr;
 
-        FrameTrace trace(core, m, args...);                                       // 7
+        FrameTrace trace(core, m.interface_name.data(), m.entry.data(), m.params,  // 7
+                         args...);
         const std::string& model = core.Model();                                  // 8
 
         if (core.Simulating() &&                                                  // 9
@@ -191,7 +196,7 @@ HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... ar
             (simulate(args), ...);
             (void)simulate;
             (void)model;
-            trace.End(args...);
+            trace.End();
             return S_OK;
         }
 
@@ -216,7 +221,7 @@ HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... ar
         node.Commands().PushCommand(m.command.empty() ? std::string()
                                                       : cmd_args.Format(m.command));
         hr = body();
-        trace.End(args...);                                                       // 11
+        trace.End();                                                              // 11
         return hr;
     } catch (const std::bad_alloc&) {
         return OutOfMemory(node);

@@ -84,11 +84,11 @@ VARIANT_BOOL Vb(bool b) { return b ? VARIANT_TRUE : VARIANT_FALSE; }
 // clang-format off
 HRESULT Quorlen731XX::Initialize(BSTR r, VARIANT_BOOL id, VARIANT_BOOL rst, BSTR o) {
     return RunFrame(*this, kInitialize, [&] { return InitializeBody(r, id != VARIANT_FALSE, rst != VARIANT_FALSE, o); },
-                    in(r), in(id), in(rst), in(o));
+                    in(r), in_bool(id), in_bool(rst), in(o));
 }
 HRESULT Quorlen731XX::Close() { return RunFrame(*this, kClose, [&] { return CloseBody(); }); }
 HRESULT Quorlen731XX::get_Initialized(VARIANT_BOOL* p) {
-    return RunFrame(*this, kInitialized, [&] { *p = Vb(Core().Initialized()); return S_OK; }, out(p));
+    return RunFrame(*this, kInitialized, [&] { *p = Vb(Core().Initialized()); return S_OK; }, out_bool(p));
 }
 HRESULT Quorlen731XX::get_DriverOperation(IIviDriverOperation** p) { return RunFrame(*this, kDriverOperation, [&] { return Nav(p); }, out(p)); }
 HRESULT Quorlen731XX::get_Identity(IIviDriverIdentity** p) { return RunFrame(*this, kIdentity, [&] { return Nav(p); }, out(p)); }
@@ -106,21 +106,21 @@ HRESULT Quorlen731XX::get_SpecificationMajorVersion(LONG* p) { return RunFrame(*
 HRESULT Quorlen731XX::get_SpecificationMinorVersion(LONG* p) { return RunFrame(*this, kSpecMinor, [&] { *p = kSpecificationMinorVersion; return S_OK; }, out(p)); }
 HRESULT Quorlen731XX::get_SupportedInstrumentModels(BSTR* p) { return RunFrame(*this, kSupported, [&] { return PutText(SupportedInstrumentModels(), p); }, out(p)); }
 
-HRESULT Quorlen731XX::get_Cache(VARIANT_BOOL* p) { return RunFrame(*this, kGetCache, [&] { *p = Vb(Core().session.flags.cache); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_Cache(VARIANT_BOOL v) { return RunFrame(*this, kPutCache, [&] { return SetFlag(kFlagCache, v != VARIANT_FALSE); }, in(v)); }
+HRESULT Quorlen731XX::get_Cache(VARIANT_BOOL* p) { return RunFrame(*this, kGetCache, [&] { *p = Vb(Core().session.flags.cache); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_Cache(VARIANT_BOOL v) { return RunFrame(*this, kPutCache, [&] { return SetFlag(kFlagCache, v != VARIANT_FALSE); }, in_bool(v)); }
 HRESULT Quorlen731XX::get_DriverSetup(BSTR* p) { return RunFrame(*this, kDriverSetup, [&] { return PutText(Core().session.driver_setup, p); }, out(p)); }
-HRESULT Quorlen731XX::get_InterchangeCheck(VARIANT_BOOL* p) { return RunFrame(*this, kGetInterchange, [&] { *p = Vb(Core().session.flags.interchange_check); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_InterchangeCheck(VARIANT_BOOL v) { return RunFrame(*this, kPutInterchange, [&] { return SetFlag(kFlagInterchangeCheck, v != VARIANT_FALSE); }, in(v)); }
+HRESULT Quorlen731XX::get_InterchangeCheck(VARIANT_BOOL* p) { return RunFrame(*this, kGetInterchange, [&] { *p = Vb(Core().session.flags.interchange_check); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_InterchangeCheck(VARIANT_BOOL v) { return RunFrame(*this, kPutInterchange, [&] { return SetFlag(kFlagInterchangeCheck, v != VARIANT_FALSE); }, in_bool(v)); }
 HRESULT Quorlen731XX::get_IoResourceDescriptor(BSTR* p) { return RunFrame(*this, kIoResource, [&] { return PutText(Core().session.io_resource_descriptor, p); }, out(p)); }
 HRESULT Quorlen731XX::get_LogicalName(BSTR* p) { return RunFrame(*this, kLogicalName, [&] { return PutText(Core().session.logical_name, p); }, out(p)); }
-HRESULT Quorlen731XX::get_QueryInstrumentStatus(VARIANT_BOOL* p) { return RunFrame(*this, kGetQis, [&] { *p = Vb(Core().session.flags.query_instrument_status); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_QueryInstrumentStatus(VARIANT_BOOL v) { return RunFrame(*this, kPutQis, [&] { return SetFlag(kFlagQueryInstrumentStatus, v != VARIANT_FALSE); }, in(v)); }
-HRESULT Quorlen731XX::get_RangeCheck(VARIANT_BOOL* p) { return RunFrame(*this, kGetRange, [&] { *p = Vb(Core().session.flags.range_check); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_RangeCheck(VARIANT_BOOL v) { return RunFrame(*this, kPutRange, [&] { return SetFlag(kFlagRangeCheck, v != VARIANT_FALSE); }, in(v)); }
-HRESULT Quorlen731XX::get_RecordCoercions(VARIANT_BOOL* p) { return RunFrame(*this, kGetCoerce, [&] { *p = Vb(Core().session.flags.record_coercions); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_RecordCoercions(VARIANT_BOOL v) { return RunFrame(*this, kPutCoerce, [&] { return SetFlag(kFlagRecordCoercions, v != VARIANT_FALSE); }, in(v)); }
-HRESULT Quorlen731XX::get_Simulate(VARIANT_BOOL* p) { return RunFrame(*this, kGetSimulate, [&] { *p = Vb(Core().session.flags.simulate); return S_OK; }, out(p)); }
-HRESULT Quorlen731XX::put_Simulate(VARIANT_BOOL v) { return RunFrame(*this, kPutSimulate, [&] { return SetFlag(kFlagSimulate, v != VARIANT_FALSE); }, in(v)); }
+HRESULT Quorlen731XX::get_QueryInstrumentStatus(VARIANT_BOOL* p) { return RunFrame(*this, kGetQis, [&] { *p = Vb(Core().session.flags.query_instrument_status); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_QueryInstrumentStatus(VARIANT_BOOL v) { return RunFrame(*this, kPutQis, [&] { return SetFlag(kFlagQueryInstrumentStatus, v != VARIANT_FALSE); }, in_bool(v)); }
+HRESULT Quorlen731XX::get_RangeCheck(VARIANT_BOOL* p) { return RunFrame(*this, kGetRange, [&] { *p = Vb(Core().session.flags.range_check); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_RangeCheck(VARIANT_BOOL v) { return RunFrame(*this, kPutRange, [&] { return SetFlag(kFlagRangeCheck, v != VARIANT_FALSE); }, in_bool(v)); }
+HRESULT Quorlen731XX::get_RecordCoercions(VARIANT_BOOL* p) { return RunFrame(*this, kGetCoerce, [&] { *p = Vb(Core().session.flags.record_coercions); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_RecordCoercions(VARIANT_BOOL v) { return RunFrame(*this, kPutCoerce, [&] { return SetFlag(kFlagRecordCoercions, v != VARIANT_FALSE); }, in_bool(v)); }
+HRESULT Quorlen731XX::get_Simulate(VARIANT_BOOL* p) { return RunFrame(*this, kGetSimulate, [&] { *p = Vb(Core().session.flags.simulate); return S_OK; }, out_bool(p)); }
+HRESULT Quorlen731XX::put_Simulate(VARIANT_BOOL v) { return RunFrame(*this, kPutSimulate, [&] { return SetFlag(kFlagSimulate, v != VARIANT_FALSE); }, in_bool(v)); }
 HRESULT Quorlen731XX::ClearInterchangeWarnings() { return RunFrame(*this, kClearIcw, [&] { return Errors().Error(Msg::E_IVI_METHOD_NOT_SUPPORTED, {"ClearInterchangeWarnings"}); }); }
 HRESULT Quorlen731XX::GetNextCoercionRecord(BSTR* p) { return RunFrame(*this, kNextCoercion, [&] { return NextCoercionRecord(p); }, out(p)); }
 HRESULT Quorlen731XX::GetNextInterchangeWarning(BSTR* p) { return RunFrame(*this, kNextIcw, [&] { return Errors().Error(Msg::E_IVI_METHOD_NOT_SUPPORTED, {"GetNextInterchangeWarning"}); }, out(p)); }

@@ -16,6 +16,7 @@
 #include "core/session.h"
 #include "platform/com/lock.h"
 #include "services/coercion_log.h"
+#include "services/tracer.h"
 
 namespace qn {
 
@@ -28,6 +29,7 @@ public:
     com::CriticalSection lock;
     DriverSession session;
     CCoercionLogManager coercions;
+    CTraceOwner tracer;
     // Virtual names of the configuration store's driver session:
     // lower-case virtual name -> physical name.
     std::map<std::string, std::string> virtual_names;

@@ -6,8 +6,26 @@
 
 namespace qn {
 
-HRESULT Quorlen731XX::StartTracing() { return S_OK; }
-void Quorlen731XX::SaveTrace() {}
+// Applies the trace options of DriverSetup and opens the trace file.
+// Tracing never fails Initialize: a file that cannot be written leaves the
+// session untraced.
+HRESULT Quorlen731XX::StartTracing() {
+    const TraceSettings& t = Core().session.trace;
+    CTraceOwner& tracer = Core().tracer;
+    tracer.SetTraceName(t.name);
+    tracer.SetTraceTransform(t.transform);
+    tracer.SetSizeLimit(t.size_max);
+    tracer.SetTraceArrays(t.arrays);
+    tracer.SetArrayLimit(t.array_size_max);
+    tracer.SetSaveInterval(t.save_interval);
+    if (t.enabled_given || tracer.GetEnabled()) {
+        if (FAILED(tracer.SetEnabled(t.enabled))) return S_OK;
+    }
+    if (tracer.GetEnabled() && !tracer.IsRecording()) tracer.StartSessionTracing();
+    return S_OK;
+}
+
+void Quorlen731XX::SaveTrace() { Core().tracer.SaveOnClose(); }
 
 HRESULT Quorlen731XX::OpenIo() { return Errors().Error(Msg::E_IVI_RESOURCE_UNKNOWN); }
 void Quorlen731XX::CloseIo() {}
