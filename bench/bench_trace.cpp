@@ -52,8 +52,12 @@ void Run(benchmark::State& state, bool recording) {
     fs::remove_all(dir);
 }
 
-void BM_CallTracingOff(benchmark::State& state) { Run(state, false); }
-void BM_CallTraced(benchmark::State& state) { Run(state, true); }
+void BM_CallTracingOff(benchmark::State& state) {
+    Run(state, false);
+}
+void BM_CallTraced(benchmark::State& state) {
+    Run(state, true);
+}
 BENCHMARK(BM_CallTracingOff)->Iterations(kCalls)->Unit(benchmark::kNanosecond);
 BENCHMARK(BM_CallTraced)->Iterations(kCalls)->Unit(benchmark::kNanosecond);
 

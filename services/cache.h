@@ -21,7 +21,7 @@ namespace qn {
 // VarBstrCmp.
 template <class T>
 class CSimpleComparePolicy : public CModelBasedType {
-public:
+  public:
     CSimpleComparePolicy(std::string model, std::uint8_t digits)
         : CModelBasedType(std::move(model)), digits_(digits) {}
     std::uint8_t Digits() const { return digits_; }
@@ -39,7 +39,7 @@ public:
         }
     }
 
-private:
+  private:
     std::uint8_t digits_;
 };
 
@@ -59,9 +59,12 @@ enum class CacheType : std::uint8_t { Short, Long, Double, String };
 
 template <class T>
 constexpr CacheType CacheTypeOf() {
-    if constexpr (std::is_same_v<T, SHORT>) return CacheType::Short;
-    else if constexpr (std::is_same_v<T, LONG>) return CacheType::Long;
-    else if constexpr (std::is_same_v<T, double>) return CacheType::Double;
+    if constexpr (std::is_same_v<T, SHORT>)
+        return CacheType::Short;
+    else if constexpr (std::is_same_v<T, LONG>)
+        return CacheType::Long;
+    else if constexpr (std::is_same_v<T, double>)
+        return CacheType::Double;
     else {
         static_assert(std::is_same_v<T, BSTR>, "cache entries hold short, long, double or BSTR");
         return CacheType::String;
@@ -69,7 +72,7 @@ constexpr CacheType CacheTypeOf() {
 }
 
 class CCacheEntryBase {
-public:
+  public:
     explicit CCacheEntryBase(CacheType type) : type_(type) {}
     virtual ~CCacheEntryBase() = default;
     CCacheEntryBase(const CCacheEntryBase&) = delete;
@@ -80,7 +83,7 @@ public:
     bool IsValid() const { return valid_; }
     CacheType Type() const { return type_; }
 
-private:
+  private:
     bool valid_ = false;
     CacheType type_;
 };
@@ -90,7 +93,7 @@ private:
 // throw std::bad_alloc (the method frame turns it into an out-of-memory error).
 template <class T>
 class CCacheEntry : public CCacheEntryBase {
-public:
+  public:
     explicit CCacheEntry(const CComparePolicy<T>* policy = &DefaultComparePolicy<T>())
         : CCacheEntryBase(CacheTypeOf<T>()), policy_(policy) {}
 
@@ -109,14 +112,14 @@ public:
         return p ? p->Compare(a, b) : a == b;
     }
 
-private:
+  private:
     T value_{};
     const CComparePolicy<T>* policy_;
 };
 
 template <>
 class CCacheEntry<BSTR> : public CCacheEntryBase {
-public:
+  public:
     explicit CCacheEntry(const CComparePolicy<BSTR>* policy = &DefaultComparePolicy<BSTR>())
         : CCacheEntryBase(CacheType::String), policy_(policy) {}
 
@@ -143,14 +146,14 @@ public:
         return p ? p->Compare(a, b) : VarBstrCmp(a, b, LOCALE_USER_DEFAULT, 0) == VARCMP_EQ;
     }
 
-private:
+  private:
     com::Bstr value_;
     const CComparePolicy<BSTR>* policy_;
 };
 
 // The store of one node. Not locked: used under the owning object's lock.
 class CCacheManager {
-public:
+  public:
     CCacheManager() = default;
     CCacheManager(const CCacheManager&) = delete;
     CCacheManager& operator=(const CCacheManager&) = delete;
@@ -184,7 +187,7 @@ public:
     void Clear() { entries_.clear(); }
     std::size_t size() const { return entries_.size(); }
 
-private:
+  private:
     StringMap<std::unique_ptr<CCacheEntryBase>> entries_;
 };
 

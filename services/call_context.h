@@ -15,7 +15,7 @@ struct CallContext {
 };
 
 class CCallContextManager {
-public:
+  public:
     CCallContextManager() { stack_.reserve(16); }
 
     // Top record, or null when no call is in progress.
@@ -31,19 +31,19 @@ public:
     std::string_view ContextText() const { return {}; }
     std::size_t Depth() const { return stack_.size(); }
 
-private:
+  private:
     std::vector<CallContext> stack_;
 };
 
 // Pushes a record for the life of a scope, popped on every path out.
 class CallContextScope {
-public:
+  public:
     CallContextScope(CCallContextManager& m, const CallContext& c) : m_(m) { m_.Push(c); }
     ~CallContextScope() { m_.Pop(); }
     CallContextScope(const CallContextScope&) = delete;
     CallContextScope& operator=(const CallContextScope&) = delete;
 
-private:
+  private:
     CCallContextManager& m_;
 };
 

@@ -8,7 +8,7 @@
 namespace qn {
 
 class CCoercionLogManager {
-public:
+  public:
     static constexpr std::size_t kDefaultMaxRecords = 100;
 
     explicit CCoercionLogManager(std::size_t maxRecords = kDefaultMaxRecords)
@@ -29,7 +29,7 @@ public:
     std::size_t size() const { return records_.size(); }
     void Clear() { records_.clear(); }
 
-private:
+  private:
     std::size_t max_;
     std::deque<std::string> records_;
 };

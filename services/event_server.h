@@ -9,7 +9,7 @@ struct IUnknown;
 namespace qn {
 
 class CEventServerNoSink {
-public:
+  public:
     HRESULT Advise(IUnknown* /*sink*/, DWORD* cookie) {
         if (cookie) *cookie = 0;
         return S_OK;
@@ -18,13 +18,13 @@ public:
 };
 
 class CEventServerNoSource {
-public:
+  public:
     HRESULT Fire(LONG /*eventId*/) { return S_OK; }
 };
 
 template <class Sink = CEventServerNoSink, class Source = CEventServerNoSource>
 class CEventServerManager : public Sink, public Source {
-public:
+  public:
     HRESULT Start() { return S_OK; }
     HRESULT Stop() { return S_OK; }
 };

@@ -12,9 +12,12 @@ namespace {
 
 const char* DirectionText(TraceDirection d) {
     switch (d) {
-        case TraceDirection::In: return "In";
-        case TraceDirection::Out: return "Out";
-        case TraceDirection::InOut: return "InOut";
+        case TraceDirection::In:
+            return "In";
+        case TraceDirection::Out:
+            return "Out";
+        case TraceDirection::InOut:
+            return "InOut";
     }
     return "In";
 }

@@ -28,7 +28,7 @@ using StringMap = std::unordered_map<std::string, V, StringHash, std::equal_to<>
 
 // Base of every model-keyed row. An empty model string means "every model".
 class CModelBasedType {
-public:
+  public:
     CModelBasedType() = default;
     explicit CModelBasedType(std::string model) : model_(std::move(model)) {}
     virtual ~CModelBasedType() = default;
@@ -41,7 +41,7 @@ public:
     // Rows carry no condition beyond their model.
     virtual bool Test() const { return true; }
 
-private:
+  private:
     std::string model_;
 };
 
@@ -49,7 +49,7 @@ private:
 // CModelBasedType and is copyable or movable.
 template <class X>
 class CModelBasedMap {
-public:
+  public:
     CModelBasedMap() = default;
     CModelBasedMap(std::initializer_list<X> rows) { AddRow(rows); }
 
@@ -74,7 +74,7 @@ public:
     std::size_t size() const { return rows_.size(); }
     bool empty() const { return rows_.empty(); }
 
-private:
+  private:
     StringMap<X> rows_;
 };
 

@@ -25,17 +25,18 @@ class CSimulationInfo : public CModelBasedType {
     static_assert(std::is_same_v<T, SHORT> || std::is_same_v<T, LONG> || std::is_same_v<T, double>,
                   "simulation values are short, long, double or BSTR");
 
-public:
-    CSimulationInfo(std::string model, T value) : CModelBasedType(std::move(model)), value_(value) {}
+  public:
+    CSimulationInfo(std::string model, T value)
+        : CModelBasedType(std::move(model)), value_(value) {}
     T Value() const { return value_; }
 
-private:
+  private:
     T value_;
 };
 
 template <>
 class CSimulationInfo<BSTR> : public CModelBasedType {
-public:
+  public:
     // Throws std::bad_alloc when the string cannot be allocated.
     CSimulationInfo(std::string model, std::string_view utf8)
         : CModelBasedType(std::move(model)), value_(utf8) {
@@ -43,14 +44,14 @@ public:
     }
     BSTR Value() const { return value_.get(); }  // owned by the row
 
-private:
+  private:
     com::Bstr value_;
 };
 
 // The simulation map of one property.
 template <class T>
 class CSimulationMap : public CModelBasedMap<CSimulationInfo<T>> {
-public:
+  public:
     using CModelBasedMap<CSimulationInfo<T>>::CModelBasedMap;
 
     // The value of the row for `model` (exact, then ""). Without a row: 0,
@@ -94,7 +95,7 @@ struct SimEntry {
 // The simulation maps of many properties, keyed by simulation key. Each map
 // holds one row for every model ("") with the literal's value.
 class CSimulationTable {
-public:
+  public:
     CSimulationTable() = default;
 
     // Rows with an empty key or a value of kind None are skipped.
@@ -123,7 +124,7 @@ public:
 
     std::size_t size() const { return maps_.size(); }
 
-private:
+  private:
     using AnyMap = std::variant<CSimulationMap<SHORT>, CSimulationMap<LONG>, CSimulationMap<double>,
                                 CSimulationMap<BSTR>>;
     StringMap<AnyMap> maps_;

@@ -4,10 +4,9 @@
 // sessions that run on different threads.
 #pragma once
 
-#include <pugixml.hpp>
-
 #include <cstdint>
 #include <mutex>
+#include <pugixml.hpp>
 #include <string>
 
 namespace qn {

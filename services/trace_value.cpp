@@ -36,26 +36,41 @@ std::string FormatTraceValue(VARTYPE vt, const void* p) {
     if (vt == VT_EMPTY) return "<empty>";
     if (vt == VT_NULL || !p) return "<null>";
     switch (vt) {
-        case VT_I1: return std::to_string(int(Read<signed char>(p)));
-        case VT_UI1: return std::to_string(int(Read<BYTE>(p)));
-        case VT_I2: return std::to_string(int(Read<SHORT>(p)));
-        case VT_UI2: return std::to_string(int(Read<USHORT>(p)));
+        case VT_I1:
+            return std::to_string(int(Read<signed char>(p)));
+        case VT_UI1:
+            return std::to_string(int(Read<BYTE>(p)));
+        case VT_I2:
+            return std::to_string(int(Read<SHORT>(p)));
+        case VT_UI2:
+            return std::to_string(int(Read<USHORT>(p)));
         case VT_I4:
-        case VT_INT: return std::to_string(int(Read<LONG>(p)));
+        case VT_INT:
+            return std::to_string(int(Read<LONG>(p)));
         // Unsigned 32-bit values are written unsigned: "%d" would show large
         // values as negative numbers.
         case VT_UI4:
-        case VT_UINT: return std::to_string(unsigned(Read<ULONG>(p)));
-        case VT_I8: return std::to_string(static_cast<long long>(Read<LONGLONG>(p)));
-        case VT_UI8: return std::to_string(static_cast<unsigned long long>(Read<ULONGLONG>(p)));
-        case VT_R4: return Real(double(Read<FLOAT>(p)));
-        case VT_R8: return Real(Read<DOUBLE>(p));
-        case VT_BOOL: return Read<VARIANT_BOOL>(p) ? "true" : "false";
-        case VT_BSTR: return XmlSafeText(Read<BSTR>(p));
-        case VT_VARIANT: return "<variant>";
+        case VT_UINT:
+            return std::to_string(unsigned(Read<ULONG>(p)));
+        case VT_I8:
+            return std::to_string(static_cast<long long>(Read<LONGLONG>(p)));
+        case VT_UI8:
+            return std::to_string(static_cast<unsigned long long>(Read<ULONGLONG>(p)));
+        case VT_R4:
+            return Real(double(Read<FLOAT>(p)));
+        case VT_R8:
+            return Real(Read<DOUBLE>(p));
+        case VT_BOOL:
+            return Read<VARIANT_BOOL>(p) ? "true" : "false";
+        case VT_BSTR:
+            return XmlSafeText(Read<BSTR>(p));
+        case VT_VARIANT:
+            return "<variant>";
         case VT_DISPATCH:
-        case VT_UNKNOWN: return "<interface>";
-        default: return "<unknown>";
+        case VT_UNKNOWN:
+            return "<interface>";
+        default:
+            return "<unknown>";
     }
 }
 

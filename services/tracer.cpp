@@ -159,8 +159,7 @@ void CTraceOwner::SetTraceName(std::string_view name) {
 }
 
 std::string CTraceOwner::DefaultFilePath() const {
-    std::string name = ExecutableFileName() + "_" + LocalFileTimeStamp(Now()) +
-                       ".xml";
+    std::string name = ExecutableFileName() + "_" + LocalFileTimeStamp(Now()) + ".xml";
     return (fs::current_path() / name).lexically_normal().string();
 }
 

@@ -69,7 +69,7 @@ struct TraceParam {
 
 // Settings and state of method tracing, with their defaults.
 class CTracer {
-public:
+  public:
     static constexpr LONG kRecording = 0;
     static constexpr LONG kNotStarted = 1;
     static constexpr LONG kFull = 2;
@@ -98,7 +98,7 @@ public:
     void SetClock(Clock c) { clock_ = c; }
     std::int64_t Now() const;
 
-protected:
+  protected:
     LONG state_ = kNotStarted;
     bool enabled_ = false;
     LONG sizeLimit_ = 1000000;
@@ -116,7 +116,7 @@ struct TraceDocument;  // the XML document of one trace file, shared by its trac
 
 // Owner of the trace document and file of one session.
 class CTraceOwner : public CTracer {
-public:
+  public:
     CTraceOwner();
     ~CTraceOwner();
     CTraceOwner(const CTraceOwner&) = delete;
@@ -152,7 +152,7 @@ public:
     // The style-sheet path for the current TraceTransform.
     std::string StyleSheetPath() const;
 
-private:
+  private:
     std::string ResolveFilePath() const;
 
     std::shared_ptr<TraceDocument> doc_;
@@ -162,7 +162,7 @@ private:
 // destroyed at its end. When the tracer is not recording, construction only
 // tests the state. `params` (at most 25 are used) must outlive the trace.
 class CMethodTrace {
-public:
+  public:
     CMethodTrace(CTraceOwner* tracer, const char* interfaceName, const char* methodName,
                  std::span<const TraceParam> params = {}) noexcept {
         if (tracer && tracer->IsRecording()) Begin(tracer, interfaceName, methodName, params);
@@ -173,7 +173,7 @@ public:
     CMethodTrace(const CMethodTrace&) = delete;
     CMethodTrace& operator=(const CMethodTrace&) = delete;
 
-private:
+  private:
     void Begin(CTraceOwner* tracer, const char* interfaceName, const char* methodName,
                std::span<const TraceParam> params) noexcept;
     void End() noexcept;

@@ -1,7 +1,8 @@
+#include "services/cache.h"
+
 #include <gtest/gtest.h>
 
 #include "platform/com/bstr.h"
-#include "services/cache.h"
 #include "services/call_context.h"
 #include "services/coercion_log.h"
 

@@ -1,7 +1,8 @@
+#include "services/model_map.h"
+
 #include <gtest/gtest.h>
 
 #include "platform/com/bstr.h"
-#include "services/model_map.h"
 #include "services/simulation.h"
 
 namespace qn {

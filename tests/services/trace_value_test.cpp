@@ -1,3 +1,5 @@
+#include "services/trace_value.h"
+
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -5,7 +7,6 @@
 #include "platform/com/bstr.h"
 #include "platform/com/safearray.h"
 #include "platform/com/variant.h"
-#include "services/trace_value.h"
 
 namespace qn {
 namespace {
@@ -62,8 +63,12 @@ TEST(TraceValue, ByReferenceReadsThroughThePointer) {
         void* p;
         const char* text;
     } cases[] = {
-        {VT_BOOL, &b, "true"},        {VT_R8, &d, "1e+300"},          {VT_I4, &l, "-7"},
-        {VT_BSTR, &raw, "x<y"},       {VT_VARIANT, &inner, "<variant>"}, {VT_I4, nullptr, "<null>"},
+        {VT_BOOL, &b, "true"},
+        {VT_R8, &d, "1e+300"},
+        {VT_I4, &l, "-7"},
+        {VT_BSTR, &raw, "x<y"},
+        {VT_VARIANT, &inner, "<variant>"},
+        {VT_I4, nullptr, "<null>"},
     };
     for (const Case& c : cases) {
         VARIANT v;
@@ -75,7 +80,9 @@ TEST(TraceValue, ByReferenceReadsThroughThePointer) {
 }
 
 TEST(TraceValue, ControlCharactersCannotBreakTheXml) {
-    com::Bstr s(std::u16string_view(u"a\x01" u"b\tc\xFFFF"));
+    com::Bstr s(
+        std::u16string_view(u"a\x01"
+                            u"b\tc\xFFFF"));
     BSTR raw = s.get();
     EXPECT_EQ(FormatTraceValue(VT_BSTR, &raw), "a?b\tc?");
     BSTR null = nullptr;

@@ -1,17 +1,17 @@
+#include "services/tracer.h"
+
 #include <gtest/gtest.h>
 #include <unistd.h>
-
-#include <pugixml.hpp>
 
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <pugixml.hpp>
 #include <sstream>
 #include <string>
 
 #include "platform/com/bstr.h"
 #include "platform/com/safearray.h"
-#include "services/tracer.h"
 
 namespace fs = std::filesystem;
 
@@ -19,11 +19,13 @@ namespace qn {
 namespace {
 
 std::int64_t g_now = 1700000000;
-std::int64_t FakeClock() { return g_now; }
+std::int64_t FakeClock() {
+    return g_now;
+}
 
 // Every test runs in its own temporary directory.
 class TracerTest : public ::testing::Test {
-protected:
+  protected:
     void SetUp() override {
         old_ = fs::current_path();
         char tmpl[] = "/tmp/qn_trace_XXXXXX";
@@ -48,8 +50,8 @@ protected:
     }
     static pugi::xml_document Load(const std::string& path) {
         pugi::xml_document d;
-        pugi::xml_parse_result r =
-            d.load_file(path.c_str(), pugi::parse_default | pugi::parse_pi | pugi::parse_declaration);
+        pugi::xml_parse_result r = d.load_file(
+            path.c_str(), pugi::parse_default | pugi::parse_pi | pugi::parse_declaration);
         EXPECT_TRUE(r) << path << ": " << r.description();
         return d;
     }
@@ -126,7 +128,8 @@ TEST_F(TracerTest, FileStartsWithDeclarationAndStyleSheet) {
     setenv("IVI_STANDARD_ROOT_DIR", (dir_ / "ivi").c_str(), 1);
     int n = 0;
     for (const Case& c : cases) {
-        if (c.companyDir) fs::create_directories(dir_ / "ivi" / "Components" / "Quorlen Technologies");
+        if (c.companyDir)
+            fs::create_directories(dir_ / "ivi" / "Components" / "Quorlen Technologies");
         CTraceOwner t;
         t.SetTraceTransform(c.transform);
         Start(t, ("pi" + std::to_string(n++)).c_str());
@@ -187,8 +190,11 @@ TEST_F(TracerTest, ArrayParameters) {
         SAFEARRAY** psa;
         const char* dimSizes;
         int elements;
-    } cases[] = {{true, 10, &w, "20", 10}, {true, 25, &w, "20", 20}, {true, 0, &w, "20", 0},
-                 {false, 10, &w, "20", 0}, {true, 10, &g, "2,4", 0}};
+    } cases[] = {{true, 10, &w, "20", 10},
+                 {true, 25, &w, "20", 20},
+                 {true, 0, &w, "20", 0},
+                 {false, 10, &w, "20", 0},
+                 {true, 10, &g, "2,4", 0}};
     int n = 0;
     for (const Case& c : cases) {
         CTraceOwner t;

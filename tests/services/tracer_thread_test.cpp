@@ -1,9 +1,8 @@
 #include <gtest/gtest.h>
 
-#include <pugixml.hpp>
-
 #include <cstdlib>
 #include <filesystem>
+#include <pugixml.hpp>
 #include <thread>
 #include <vector>
 
