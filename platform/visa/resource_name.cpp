@@ -43,6 +43,9 @@ std::optional<Fields> Split(std::string_view s) {
     }
     if (bracket) return std::nullopt;
     out.push_back(s.substr(start));
+    // ":::" has no single reading: a field may not begin or end with ':'.
+    for (std::string_view f : out)
+        if (!f.empty() && (f.front() == ':' || f.back() == ':')) return std::nullopt;
     return out;
 }
 

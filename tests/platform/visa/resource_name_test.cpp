@@ -106,6 +106,8 @@ TEST(ResourceNameTest, MalformedStringsAreRefusedWithAReason) {
         "VXI0::1::INSTR",
         "MyScope",
         "TCPIP0::host::5025::SOCKET::",
+        "USB0::1::2::SN:::INSTR",  // serial ending in a colon
+        "TCPIP0:::host::5025::SOCKET",
     };
     for (const char* text : kBad) {
         std::string error;
