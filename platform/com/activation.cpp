@@ -86,8 +86,8 @@ HRESULT GetRegisteredClassObject(REFCLSID clsid, REFIID riid, void** ppv) {
     if (!loaded.ok) return Fail(REGDB_E_CLASSNOTREG, loaded.error);
     std::optional<std::string> module = tree.GetValue(key);
     if (!module || module->empty())
-        return Fail(REGDB_E_CLASSNOTREG, "class " + qn::com::GuidToString(clsid) +
-                                             " is not registered in " + file);
+        return Fail(REGDB_E_CLASSNOTREG,
+                    "class " + qn::com::GuidToString(clsid) + " is not registered in " + file);
     std::string error;
     void* handle = OpenModule(*module, &error);
     if (!handle) return Fail(CO_E_DLLNOTFOUND, "cannot load " + *module + ": " + error);
@@ -100,8 +100,12 @@ thread_local int t_init_count = 0;
 
 }  // namespace
 
-HRESULT CoInitializeEx(void*, DWORD) { return t_init_count++ == 0 ? S_OK : S_FALSE; }
-HRESULT CoInitialize(void* reserved) { return CoInitializeEx(reserved, COINIT_APARTMENTTHREADED); }
+HRESULT CoInitializeEx(void*, DWORD) {
+    return t_init_count++ == 0 ? S_OK : S_FALSE;
+}
+HRESULT CoInitialize(void* reserved) {
+    return CoInitializeEx(reserved, COINIT_APARTMENTTHREADED);
+}
 void CoUninitialize() {
     if (t_init_count > 0) --t_init_count;
 }
@@ -136,7 +140,8 @@ void CoFreeUnusedLibraries() {
     ModuleTable& t = ModuleTable::Instance();
     std::lock_guard<std::mutex> g(t.m);
     for (auto it = t.handles.begin(); it != t.handles.end();) {
-        auto can_unload = reinterpret_cast<DllCanUnloadNowFn>(::dlsym(it->second, "DllCanUnloadNow"));
+        auto can_unload =
+            reinterpret_cast<DllCanUnloadNowFn>(::dlsym(it->second, "DllCanUnloadNow"));
         if (can_unload && can_unload() == S_OK) {
             ::dlclose(it->second);
             it = t.handles.erase(it);
@@ -171,7 +176,8 @@ HRESULT CLSIDFromProgID(LPCOLESTR lpszProgID, CLSID* pclsid) {
     *pclsid = GUID_NULL;
     try {
         qn::com::RegistryTree tree;
-        if (!qn::com::LoadRegistryFile(qn::com::RegistryFilePath(), &tree).ok) return CO_E_CLASSSTRING;
+        if (!qn::com::LoadRegistryFile(qn::com::RegistryFilePath(), &tree).ok)
+            return CO_E_CLASSSTRING;
         std::string progid = qn::com::Utf16ToUtf8(lpszProgID);
         // Follow CurVer from a version-independent ProgID; a few hops at most (no loops).
         for (int hop = 0; hop < 4 && !progid.empty() && progid.find('\\') == std::string::npos;
@@ -218,7 +224,7 @@ std::optional<GUID> GuidFromString(std::string_view s) {
         int v = 0;
         for (int k = 0; k < 2; ++k, ++i) {
             char c = s[i];
-            int d = c >= '0' && c <= '9' ? c - '0'
+            int d = c >= '0' && c <= '9'   ? c - '0'
                     : c >= 'a' && c <= 'f' ? c - 'a' + 10
                     : c >= 'A' && c <= 'F' ? c - 'A' + 10
                                            : -1;

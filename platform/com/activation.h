@@ -44,8 +44,8 @@ HRESULT CLSIDFromProgID(LPCOLESTR lpszProgID, CLSID* pclsid);
 
 namespace qn::com {
 
-std::string GuidToString(REFGUID guid);                       // braced, upper case
-std::optional<GUID> GuidFromString(std::string_view text);     // braced, any case
+std::string GuidToString(REFGUID guid);                     // braced, upper case
+std::optional<GUID> GuidFromString(std::string_view text);  // braced, any case
 
 // The in-process class table: classes built into a loaded library, activated
 // by CLSID without a registry entry. The table holds a reference to factory.

@@ -16,7 +16,9 @@ namespace qn::com {
 
 namespace {
 
-char LowerAscii(char c) { return c >= 'A' && c <= 'Z' ? char(c - 'A' + 'a') : c; }
+char LowerAscii(char c) {
+    return c >= 'A' && c <= 'Z' ? char(c - 'A' + 'a') : c;
+}
 
 // Splits a path at backslashes, mapping the short root names; empty on an invalid path.
 std::vector<std::string> SplitPath(std::string_view path) {
@@ -29,7 +31,8 @@ std::vector<std::string> SplitPath(std::string_view path) {
     std::size_t start = 0;
     while (true) {
         std::size_t end = path.find('\\', start);
-        std::string_view part = path.substr(start, end == std::string_view::npos ? end : end - start);
+        std::string_view part =
+            path.substr(start, end == std::string_view::npos ? end : end - start);
         if (part.empty()) return {};
         for (char c : part)
             if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F) return {};
@@ -46,12 +49,23 @@ std::string Quote(std::string_view s) {
     std::string out = "\"";
     for (char c : s) {
         switch (c) {
-            case '\\': out += "\\\\"; break;
-            case '"': out += "\\\""; break;
-            case '\n': out += "\\n"; break;
-            case '\r': out += "\\r"; break;
-            case '\t': out += "\\t"; break;
-            default: out += c;
+            case '\\':
+                out += "\\\\";
+                break;
+            case '"':
+                out += "\\\"";
+                break;
+            case '\n':
+                out += "\\n";
+                break;
+            case '\r':
+                out += "\\r";
+                break;
+            case '\t':
+                out += "\\t";
+                break;
+            default:
+                out += c;
         }
     }
     return out + "\"";
@@ -73,12 +87,23 @@ bool Unquote(std::string_view text, std::size_t* pos, std::string* out) {
         }
         if (++i >= text.size()) return false;
         switch (text[i]) {
-            case '\\': *out += '\\'; break;
-            case '"': *out += '"'; break;
-            case 'n': *out += '\n'; break;
-            case 'r': *out += '\r'; break;
-            case 't': *out += '\t'; break;
-            default: return false;
+            case '\\':
+                *out += '\\';
+                break;
+            case '"':
+                *out += '"';
+                break;
+            case 'n':
+                *out += '\n';
+                break;
+            case 'r':
+                *out += '\r';
+                break;
+            case 't':
+                *out += '\t';
+                break;
+            default:
+                return false;
         }
     }
     return false;
@@ -100,7 +125,7 @@ std::string ErrnoText(const std::string& what, const std::string& path) {
 
 // An flock held on path + ".lock" for the life of the object.
 class FileLock {
-public:
+  public:
     FileLock(const std::string& path, int operation) {
         fd_ = ::open((path + ".lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
         if (fd_ < 0) {
@@ -120,7 +145,7 @@ public:
     FileLock& operator=(const FileLock&) = delete;
     const std::string& error() const { return error_; }
 
-private:
+  private:
     int fd_ = -1;
     std::string error_;
 };
@@ -285,7 +310,8 @@ bool RegistryTree::Deserialize(std::string_view text, std::string* error) {
         } else if (!Unquote(line, &pos, &name)) {
             return fail("a value name must be @ or a quoted string");
         }
-        if (pos >= line.size() || line[pos] != '=') return fail("'=' expected after the value name");
+        if (pos >= line.size() || line[pos] != '=')
+            return fail("'=' expected after the value name");
         ++pos;
         if (!Unquote(line, &pos, &value)) return fail("a quoted value is expected after '='");
         if (pos != line.size()) return fail("text after the value");

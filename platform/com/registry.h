@@ -30,7 +30,7 @@ struct NoCaseLess {
 };
 
 class RegistryTree {
-public:
+  public:
     struct Key {
         std::map<std::string, Key, NoCaseLess> subkeys;
         std::map<std::string, std::string, NoCaseLess> values;
@@ -53,7 +53,7 @@ public:
 
     const Key& root() const { return root_; }
 
-private:
+  private:
     Key root_;
 };
 

@@ -57,12 +57,18 @@ bool ReadFile(const std::string& path, std::string* out, bool* missing, std::str
 
 std::string_view DataTypeName(DataType type) {
     switch (type) {
-        case DataType::kString: return "String";
-        case DataType::kInteger: return "Integer";
-        case DataType::kReal: return "Real";
-        case DataType::kBoolean: return "Boolean";
-        case DataType::kStructure: return "Structure";
-        case DataType::kApiReference: return "APIReference";
+        case DataType::kString:
+            return "String";
+        case DataType::kInteger:
+            return "Integer";
+        case DataType::kReal:
+            return "Real";
+        case DataType::kBoolean:
+            return "Boolean";
+        case DataType::kStructure:
+            return "Structure";
+        case DataType::kApiReference:
+            return "APIReference";
     }
     return "";
 }
@@ -135,7 +141,9 @@ std::string ConfigStore::ProcessDefaultLocation() {
     return env ? std::string(env) : std::string();
 }
 
-std::string ConfigStore::MasterLocation() { return "/etc/ivi/IviConfigurationStore.xml"; }
+std::string ConfigStore::MasterLocation() {
+    return "/etc/ivi/IviConfigurationStore.xml";
+}
 
 const DriverSession* ConfigStore::FindSession(std::string_view name) const {
     if (const LogicalName* logical = FindByName(logical_names_, name))

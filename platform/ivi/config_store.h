@@ -111,7 +111,7 @@ enum class LoadStatus { kLoaded, kAbsent, kError };
 struct LoadResult;
 
 class ConfigStore {
-public:
+  public:
     // Reads the store from `path`: kAbsent when the file does not exist,
     // kError (with `error`) when it cannot be read or is not a valid store.
     static LoadResult Load(const std::string& path);
@@ -137,7 +137,7 @@ public:
     const std::vector<SoftwareModule>& software_modules() const { return modules_; }
     const std::vector<HardwareAsset>& hardware_assets() const { return assets_; }
 
-private:
+  private:
     friend class StoreReader;
     std::vector<DriverSession> sessions_;
     std::vector<LogicalName> logical_names_;
@@ -147,8 +147,8 @@ private:
 
 struct LoadResult {
     LoadStatus status = LoadStatus::kAbsent;
-    ConfigStore store;   // meaningful when status == kLoaded
-    std::string error;   // set when status == kError
+    ConfigStore store;  // meaningful when status == kLoaded
+    std::string error;  // set when status == kError
     bool loaded() const { return status == LoadStatus::kLoaded; }
 };
 

@@ -2,12 +2,11 @@
 // into a ConfigStore. The reader is strict: unknown elements or attributes,
 // bad values, duplicate names and dangling references are errors, so that a
 // misspelt flag cannot be silently ignored.
-#include <pugixml.hpp>
-
 #include <charconv>
 #include <cmath>
 #include <functional>
 #include <limits>
+#include <pugixml.hpp>
 
 #include "platform/ivi/config_store.h"
 
@@ -47,8 +46,8 @@ void CheckAttributes(const pugi::xml_node& node, std::initializer_list<std::stri
         bool known = false;
         for (std::string_view name : allowed) known = known || name == a.name();
         if (!known)
-            Fail(node, std::string("unknown attribute \"") + a.name() + "\" on <" + node.name() +
-                           ">");
+            Fail(node,
+                 std::string("unknown attribute \"") + a.name() + "\" on <" + node.name() + ">");
     }
 }
 
@@ -110,9 +109,9 @@ struct TypeEntry {
     DataType type;
 };
 constexpr TypeEntry kTypes[] = {
-    {"String", DataType::kString},         {"Integer", DataType::kInteger},
-    {"Real", DataType::kReal},             {"Boolean", DataType::kBoolean},
-    {"Structure", DataType::kStructure},   {"APIReference", DataType::kApiReference},
+    {"String", DataType::kString},       {"Integer", DataType::kInteger},
+    {"Real", DataType::kReal},           {"Boolean", DataType::kBoolean},
+    {"Structure", DataType::kStructure}, {"APIReference", DataType::kApiReference},
 };
 
 constexpr int kMaxStructureDepth = 32;
@@ -163,7 +162,9 @@ DataComponent ReadDataComponent(const pugi::xml_node& node, int depth) {
     bool ok = true;
     switch (c.type) {
         case DataType::kString:
-        case DataType::kApiReference: c.value = std::string(text); break;
+        case DataType::kApiReference:
+            c.value = std::string(text);
+            break;
         case DataType::kInteger: {
             std::int32_t v = 0;
             ok = ParseInt32(text, &v);
@@ -182,7 +183,8 @@ DataComponent ReadDataComponent(const pugi::xml_node& node, int depth) {
             c.value = v;
             break;
         }
-        case DataType::kStructure: break;
+        case DataType::kStructure:
+            break;
     }
     if (!ok)
         Fail(node, "data component \"" + c.name + "\": \"" + std::string(text) +
@@ -229,7 +231,7 @@ VirtualName ReadVirtualName(const pugi::xml_node& node) {
 
 // Builds a ConfigStore from a parsed document (friend of ConfigStore).
 class StoreReader {
-public:
+  public:
     static void Read(const pugi::xml_node& root, ConfigStore* store) {
         if (std::string_view(root.name()) != "IviConfigurationStore")
             Fail(root, std::string("the root element is <") + root.name() +
@@ -255,12 +257,11 @@ public:
         Resolve(root, store);
     }
 
-private:
+  private:
     static void ReadAsset(const pugi::xml_node& node, ConfigStore* store) {
         CheckAttributes(node, {"name", "resourceDescriptor", "description"});
-        store->assets_.push_back(
-            {Required(node, "name"), Optional(node, "description"),
-             Required(node, "resourceDescriptor")});
+        store->assets_.push_back({Required(node, "name"), Optional(node, "description"),
+                                  Required(node, "resourceDescriptor")});
         CheckUnique(store->assets_, node, "hardware asset");
         NoChildren(node);
     }
@@ -354,9 +355,9 @@ private:
             bool found = false;
             for (const DriverSession& s : store->sessions_) found = found || s.name == l.session;
             if (!found)
-                Fail(find("LogicalName", l.name),
-                     "logical name \"" + l.name + "\" refers to the unknown session \"" +
-                         l.session + "\"");
+                Fail(find("LogicalName", l.name), "logical name \"" + l.name +
+                                                      "\" refers to the unknown session \"" +
+                                                      l.session + "\"");
         }
     }
 };

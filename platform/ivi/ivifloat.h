@@ -8,13 +8,17 @@
 namespace qn::ivi {
 
 // A quiet NaN: "no number was read". Compare with IsIviNaN, never with ==.
-constexpr double IviFloatNaN() noexcept { return std::numeric_limits<double>::quiet_NaN(); }
+constexpr double IviFloatNaN() noexcept {
+    return std::numeric_limits<double>::quiet_NaN();
+}
 constexpr double IviFloatPositiveInfinity() noexcept {
     return std::numeric_limits<double>::infinity();
 }
 constexpr double IviFloatNegativeInfinity() noexcept {
     return -std::numeric_limits<double>::infinity();
 }
-inline bool IsIviNaN(double v) noexcept { return std::isnan(v); }
+inline bool IsIviNaN(double v) noexcept {
+    return std::isnan(v);
+}
 
 }  // namespace qn::ivi

@@ -27,7 +27,7 @@ struct Session {
 };
 
 class SessionTable {
-public:
+  public:
     static SessionTable& Instance() {
         static SessionTable table;
         return table;
@@ -59,7 +59,7 @@ public:
         return s;
     }
 
-private:
+  private:
     std::mutex m_;
     std::unordered_map<ViSession, std::shared_ptr<Session>> sessions_;
     ViSession next_ = 0;
@@ -216,8 +216,7 @@ ViStatus IviSession_ClearError(ViSession vi) {
 
 namespace qn::ivi {
 
-ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout,
-                        ViBoolean* callerHasLock) {
+ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoolean* callerHasLock) {
     // Beyond a year the wait is as good as endless; this also keeps now() + timeout finite.
     if (timeout >= std::chrono::hours(24 * 365))
         return Lock(vi, Clock::time_point::max(), callerHasLock);

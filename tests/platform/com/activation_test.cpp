@@ -20,9 +20,10 @@ TEST(GuidText, FormatsAndParsesBothWays) {
     constexpr GUID g = MakeGuid("0123abcd-4567-89ef-0a1b-2c3d4e5f6789");
     EXPECT_EQ(qn::com::GuidToString(g), "{0123ABCD-4567-89EF-0A1B-2C3D4E5F6789}");
     EXPECT_EQ(qn::com::GuidFromString("{0123abcd-4567-89EF-0a1b-2c3d4e5f6789}"), g);
-    for (const char* bad : {"", "{}", "0123abcd-4567-89ef-0a1b-2c3d4e5f6789",
-                            "{0123abcd-4567-89ef-0a1b-2c3d4e5f678}", "{0123abcd-4567-89ef-0a1b+2c3d4e5f6789}",
-                            "{0123abcd-4567-89ef-0a1b-2c3d4e5f678g}", "{0123abcd-4567-89ef-0a1b-2c3d4e5f6789"}) {
+    for (const char* bad :
+         {"", "{}", "0123abcd-4567-89ef-0a1b-2c3d4e5f6789", "{0123abcd-4567-89ef-0a1b-2c3d4e5f678}",
+          "{0123abcd-4567-89ef-0a1b+2c3d4e5f6789}", "{0123abcd-4567-89ef-0a1b-2c3d4e5f678g}",
+          "{0123abcd-4567-89ef-0a1b-2c3d4e5f6789"}) {
         EXPECT_EQ(qn::com::GuidFromString(bad), std::nullopt) << bad;
     }
     OLECHAR buf[39];
@@ -39,7 +40,7 @@ TEST(GuidText, FormatsAndParsesBothWays) {
 
 // Each test gets its own registry file through QN_REGISTRY_FILE.
 class Activation : public ::testing::Test {
-protected:
+  protected:
     void SetUp() override {
         char dir[] = "/tmp/qn-activation-XXXXXX";
         ASSERT_NE(mkdtemp(dir), nullptr);
@@ -52,13 +53,14 @@ protected:
     }
     void Register(const std::string& module) {
         const std::string clsid = qn::com::GuidToString(kTestModuleClsid);
-        auto status = qn::com::UpdateRegistryFile(qn::com::RegistryFilePath(), [&](RegistryTree& t) {
-            return t.SetValue("HKCR\\CLSID\\" + clsid + "\\InprocServer32", "", module) &&
-                   t.SetValue("HKCR\\Test.Value.1\\CLSID", "", clsid) &&
-                   t.SetValue("HKCR\\Test.Value\\CurVer", "", "Test.Value.1") &&
-                   t.SetValue("HKCR\\Test.Loop\\CurVer", "", "Test.Loop2") &&
-                   t.SetValue("HKCR\\Test.Loop2\\CurVer", "", "Test.Loop");
-        });
+        auto status =
+            qn::com::UpdateRegistryFile(qn::com::RegistryFilePath(), [&](RegistryTree& t) {
+                return t.SetValue("HKCR\\CLSID\\" + clsid + "\\InprocServer32", "", module) &&
+                       t.SetValue("HKCR\\Test.Value.1\\CLSID", "", clsid) &&
+                       t.SetValue("HKCR\\Test.Value\\CurVer", "", "Test.Value.1") &&
+                       t.SetValue("HKCR\\Test.Loop\\CurVer", "", "Test.Loop2") &&
+                       t.SetValue("HKCR\\Test.Loop2\\CurVer", "", "Test.Loop");
+            });
         ASSERT_TRUE(status.ok) << status.error;
     }
     std::string dir_;
@@ -75,8 +77,8 @@ TEST_F(Activation, CreatesTheRegisteredClassFromItsModule) {
     EXPECT_EQ(value->Value(), 42);
     value.reset();
     CoFreeUnusedLibraries();
-    ASSERT_EQ(CoCreateInstance(kTestModuleClsid, nullptr, CLSCTX_INPROC_SERVER,
-                               iid_of<IUnknown>, reinterpret_cast<void**>(value.Out())),
+    ASSERT_EQ(CoCreateInstance(kTestModuleClsid, nullptr, CLSCTX_INPROC_SERVER, iid_of<IUnknown>,
+                               reinterpret_cast<void**>(value.Out())),
               S_OK);  // reloaded after the unload
 }
 
@@ -116,8 +118,9 @@ TEST_F(Activation, FailuresAreReportedWithTheirReason) {
     EXPECT_NE(rec.description.find("missing.so"), std::string::npos) << rec.description;
 
     Register(QN_TEST_MODULE_PATH);
-    EXPECT_EQ(CoCreateInstance(kTestModuleClsid, nullptr, 0x4 /* local server */, iid_of<IUnknown>, &p),
-              REGDB_E_CLASSNOTREG);
+    EXPECT_EQ(
+        CoCreateInstance(kTestModuleClsid, nullptr, 0x4 /* local server */, iid_of<IUnknown>, &p),
+        REGDB_E_CLASSNOTREG);
     IUnknown* outer = reinterpret_cast<IUnknown*>(&p);  // never called: refused before use
     EXPECT_EQ(CoCreateInstance(kTestModuleClsid, outer, CLSCTX_ALL, iid_of<ITestValue>, &p),
               CLASS_E_NOAGGREGATION);
@@ -145,11 +148,11 @@ TEST_F(Activation, MalformedRegistryFileIsNotACrash) {
 
 // A built-in class: no registry entry, no module.
 class BuiltIn final : public qn::com::ComObject<BuiltIn, ITestValue> {
-public:
+  public:
     int Value() override { return 7; }
 };
 class BuiltInFactory final : public qn::com::ComObject<BuiltInFactory, IClassFactory> {
-public:
+  public:
     HRESULT CreateInstance(IUnknown*, REFIID riid, void** ppv) override {
         return qn::com::MakeComObject<BuiltIn>()->QueryInterface(riid, ppv);
     }

@@ -113,8 +113,8 @@ TEST(Utf16ToUtf8, EncodesPairsAndReplacesLoneSurrogates) {
 }
 
 TEST(Utf8ToUtf16, RoundTripsEveryScalarValueSample) {
-    for (char32_t c : {0x7Fu, 0x80u, 0x7FFu, 0x800u, 0xD7FFu, 0xE000u, 0xFFFDu, 0xFFFFu, 0x10000u,
-                       0x10FFFFu}) {
+    for (char32_t c :
+         {0x7Fu, 0x80u, 0x7FFu, 0x800u, 0xD7FFu, 0xE000u, 0xFFFDu, 0xFFFFu, 0x10000u, 0x10FFFFu}) {
         std::u16string u;
         if (c < 0x10000) {
             u += char16_t(c);

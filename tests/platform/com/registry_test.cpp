@@ -2,7 +2,6 @@
 #include "platform/com/registry.h"
 
 #include <gtest/gtest.h>
-
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -60,7 +59,8 @@ TEST(RegistryTree, SerializationRoundTripsAwkwardText) {
     std::string error;
     ASSERT_TRUE(back.Deserialize(t.Serialize(), &error)) << error << "\n" << t.Serialize();
     EXPECT_EQ(back.Serialize(), t.Serialize());
-    EXPECT_EQ(back.GetValue("HKCR\\key with ] and \"quotes\""), "back\\slash \"q\" line\nfeed\ttab\r");
+    EXPECT_EQ(back.GetValue("HKCR\\key with ] and \"quotes\""),
+              "back\\slash \"q\" line\nfeed\ttab\r");
     EXPECT_NE(back.OpenKey("HKCR\\Empty\\Leaf"), nullptr);
 }
 
@@ -69,11 +69,12 @@ TEST(RegistryTree, MalformedTextIsAnErrorWithTheLine) {
         const char* text;
         const char* line;
     };
-    for (Case c : {Case{"@=\"x\"", "line 1"}, Case{"[HKCR\\A]\n\"n\"", "line 2"},
-                   Case{"[HKCR\\A\n", "line 1"}, Case{"[]", "line 1"},
-                   Case{"[HKCR\\A]\n@=\"unterminated", "line 2"}, Case{"[HKCR\\A]\n@=\"\\q\"", "line 2"},
-                   Case{"[HKCR\\A]\n@=\"x\" trailing", "line 2"}, Case{"[HKCR\\A]\nname=\"x\"", "line 2"},
-                   Case{"; ok\n\n[HKCR\\A]\r\n@=\"x\"\r\n[\\\\]", "line 5"}}) {
+    for (Case c :
+         {Case{"@=\"x\"", "line 1"}, Case{"[HKCR\\A]\n\"n\"", "line 2"},
+          Case{"[HKCR\\A\n", "line 1"}, Case{"[]", "line 1"},
+          Case{"[HKCR\\A]\n@=\"unterminated", "line 2"}, Case{"[HKCR\\A]\n@=\"\\q\"", "line 2"},
+          Case{"[HKCR\\A]\n@=\"x\" trailing", "line 2"}, Case{"[HKCR\\A]\nname=\"x\"", "line 2"},
+          Case{"; ok\n\n[HKCR\\A]\r\n@=\"x\"\r\n[\\\\]", "line 5"}}) {
         RegistryTree t;
         std::string error;
         EXPECT_FALSE(t.Deserialize(c.text, &error)) << c.text;
@@ -83,7 +84,7 @@ TEST(RegistryTree, MalformedTextIsAnErrorWithTheLine) {
 }
 
 class RegistryFile : public ::testing::Test {
-protected:
+  protected:
     void SetUp() override {
         char dir[] = "/tmp/qn-registry-XXXXXX";
         ASSERT_NE(mkdtemp(dir), nullptr);
@@ -98,9 +99,8 @@ TEST_F(RegistryFile, MissingFileIsEmptyAndUpdatesPersist) {
     RegistryTree t;
     ASSERT_TRUE(qn::com::LoadRegistryFile(path_, &t).ok);
     EXPECT_TRUE(t.EnumSubkeys("HKCR").empty());
-    auto status = qn::com::UpdateRegistryFile(path_, [](RegistryTree& tree) {
-        return tree.SetValue("HKCR\\Prog.Id\\CLSID", "", "{X}");
-    });
+    auto status = qn::com::UpdateRegistryFile(
+        path_, [](RegistryTree& tree) { return tree.SetValue("HKCR\\Prog.Id\\CLSID", "", "{X}"); });
     ASSERT_TRUE(status.ok) << status.error;
     ASSERT_TRUE(qn::com::LoadRegistryFile(path_, &t).ok);
     EXPECT_EQ(t.GetValue("HKCR\\Prog.Id\\CLSID"), "{X}");

@@ -4,8 +4,8 @@
 
 #include <gtest/gtest.h>
 
-#include <limits>
 #include <cstring>
+#include <limits>
 
 #include "platform/com/bstr.h"
 #include "platform/com/variant.h"

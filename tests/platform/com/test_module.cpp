@@ -9,14 +9,14 @@ namespace {
 std::atomic<long> g_objects{0};
 
 class TestObject final : public qn::com::ComObject<TestObject, ITestValue> {
-public:
+  public:
     TestObject() { ++g_objects; }
     ~TestObject() override { --g_objects; }
     int Value() override { return 42; }
 };
 
 class Factory final : public qn::com::ComObject<Factory, IClassFactory> {
-public:
+  public:
     HRESULT CreateInstance(IUnknown* outer, REFIID riid, void** ppv) override {
         if (!ppv) return E_POINTER;
         *ppv = nullptr;
@@ -30,8 +30,8 @@ public:
 }  // namespace
 
 extern "C" __attribute__((visibility("default"))) HRESULT DllGetClassObject(REFCLSID clsid,
-                                                                           REFIID riid,
-                                                                           void** ppv) {
+                                                                            REFIID riid,
+                                                                            void** ppv) {
     if (!ppv) return E_POINTER;
     *ppv = nullptr;
     if (!(clsid == kTestModuleClsid)) return CLASS_E_CLASSNOTAVAILABLE;

@@ -27,7 +27,7 @@ struct IUnlisted : IUnknown {
 };
 
 class Widget : public ComObject<Widget, IAlpha, IBetaEx, As<IBeta, IBetaEx>> {
-public:
+  public:
     explicit Widget(bool* destroyed = nullptr) : destroyed_(destroyed) {}
     ~Widget() override {
         if (destroyed_) *destroyed_ = true;
@@ -36,7 +36,7 @@ public:
     int Beta() override { return 2; }
     int BetaEx() override { return 3; }
 
-private:
+  private:
     bool* destroyed_;
 };
 
@@ -92,7 +92,7 @@ TEST(ComObject, LastReleaseDestroysAndModuleCountFollowsObjects) {
 
 // An outer object that aggregates a Widget and adds IUnlisted of its own.
 class Outer : public ComObject<Outer, IUnlisted> {
-public:
+  public:
     explicit Outer(bool* inner_destroyed) {
         inner_ = new Widget(inner_destroyed);
         inner_->SetOuterUnknown(this);
@@ -108,7 +108,7 @@ public:
     IUnknown* inner_unknown() const { return inner_unknown_; }
     Widget* inner() const { return inner_; }
 
-private:
+  private:
     Widget* inner_;
     IUnknown* inner_unknown_;
 };

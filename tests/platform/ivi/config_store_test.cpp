@@ -3,12 +3,12 @@
 #include "platform/ivi/config_store.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <string>
-#include <unistd.h>
 
 namespace {
 
@@ -149,8 +149,8 @@ TEST(ExpandVirtualNames, CollidingNamesAreAnError) {
 
 struct BadStore {
     const char* name;
-    std::string body;       // placed inside <IviConfigurationStore>
-    const char* expected;   // part of the error text
+    std::string body;      // placed inside <IviConfigurationStore>
+    const char* expected;  // part of the error text
 };
 
 const BadStore kBadStores[] = {
@@ -160,32 +160,53 @@ const BadStore kBadStores[] = {
     {"session_without_name", "<DriverSession/>", "non-empty \"name\""},
     {"duplicate_session", "<DriverSession name='x'/><DriverSession name='x'/>", "defined twice"},
     {"unknown_asset", "<DriverSession name='x' hardwareAsset='none'/>", "unknown hardware asset"},
-    {"unknown_module", "<DriverSession name='x' softwareModule='none'/>", "unknown software module"},
+    {"unknown_module", "<DriverSession name='x' softwareModule='none'/>",
+     "unknown software module"},
     {"dangling_logical_name", "<LogicalName name='a' session='none'/>", "unknown session"},
-    {"unknown_type", "<SoftwareModule name='m'><DataComponent name='a' type='Text' value='1'/></SoftwareModule>",
+    {"unknown_type",
+     "<SoftwareModule name='m'><DataComponent name='a' type='Text' value='1'/></SoftwareModule>",
      "unknown type \"Text\""},
-    {"integer_overflow", "<SoftwareModule name='m'><DataComponent name='a' type='Integer' value='2147483648'/></SoftwareModule>",
+    {"integer_overflow",
+     "<SoftwareModule name='m'><DataComponent name='a' type='Integer' "
+     "value='2147483648'/></SoftwareModule>",
      "not a valid Integer"},
-    {"integer_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Integer' value='12abc'/></SoftwareModule>",
+    {"integer_junk",
+     "<SoftwareModule name='m'><DataComponent name='a' type='Integer' "
+     "value='12abc'/></SoftwareModule>",
      "not a valid Integer"},
-    {"real_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Real' value='1.5V'/></SoftwareModule>",
+    {"real_junk",
+     "<SoftwareModule name='m'><DataComponent name='a' type='Real' value='1.5V'/></SoftwareModule>",
      "not a valid Real"},
-    {"boolean_junk", "<SoftwareModule name='m'><DataComponent name='a' type='Boolean' value='on'/></SoftwareModule>",
+    {"boolean_junk",
+     "<SoftwareModule name='m'><DataComponent name='a' type='Boolean' "
+     "value='on'/></SoftwareModule>",
      "not a valid Boolean"},
-    {"missing_value", "<SoftwareModule name='m'><DataComponent name='a' type='String'/></SoftwareModule>",
+    {"missing_value",
+     "<SoftwareModule name='m'><DataComponent name='a' type='String'/></SoftwareModule>",
      "needs a \"value\""},
-    {"duplicate_component", "<SoftwareModule name='m'><DataComponent name='a' type='String' value=''/>"
-                            "<DataComponent name='a' type='String' value=''/></SoftwareModule>",
+    {"duplicate_component",
+     "<SoftwareModule name='m'><DataComponent name='a' type='String' value=''/>"
+     "<DataComponent name='a' type='String' value=''/></SoftwareModule>",
      "defined twice"},
-    {"range_reversed", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='4' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+    {"range_reversed",
+     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='4' end='1' "
+     "physicalStart='1'/></VirtualName></DriverSession>",
      "end is below"},
-    {"range_huge", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='2000000000' physicalStart='1'/></VirtualName></DriverSession>",
+    {"range_huge",
+     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='2000000000' "
+     "physicalStart='1'/></VirtualName></DriverSession>",
      "more than 100000"},
-    {"range_negative", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='-1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+    {"range_negative",
+     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='-1' end='1' "
+     "physicalStart='1'/></VirtualName></DriverSession>",
      "non-negative"},
-    {"range_physical_overflow", "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='9' physicalStart='2147483645'/></VirtualName></DriverSession>",
+    {"range_physical_overflow",
+     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='9' "
+     "physicalStart='2147483645'/></VirtualName></DriverSession>",
      "exceed"},
-    {"virtual_collision", "<DriverSession name='x'><VirtualName name='c1' mapTo='A'/><VirtualName name='C' mapTo='B'><Range start='1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
+    {"virtual_collision",
+     "<DriverSession name='x'><VirtualName name='c1' mapTo='A'/><VirtualName name='C' "
+     "mapTo='B'><Range start='1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
      "more than once"},
 };
 
@@ -204,12 +225,13 @@ TEST(ConfigStore, MalformedXmlCarriesTheParserMessageAndOffset) {
         std::string xml;
         const char* parser_text;
     };
-    for (const Case& c : {Case{"<IviConfigurationStore><DriverSession name='x'>", "Start-end tags mismatch"},
-                          Case{"", "No document element found"},
-                          Case{"<IviConfigurationStore>\n<a b=></a></IviConfigurationStore>",
-                               "Error parsing element attribute"},
-                          Case{std::string("<Ivi\0Store/>", 12), ""},
-                          Case{"<Other/>", "expected <IviConfigurationStore>"}}) {
+    for (const Case& c :
+         {Case{"<IviConfigurationStore><DriverSession name='x'>", "Start-end tags mismatch"},
+          Case{"", "No document element found"},
+          Case{"<IviConfigurationStore>\n<a b=></a></IviConfigurationStore>",
+               "Error parsing element attribute"},
+          Case{std::string("<Ivi\0Store/>", 12), ""},
+          Case{"<Other/>", "expected <IviConfigurationStore>"}}) {
         LoadResult r = ConfigStore::Parse(c.xml, "s.xml");
         EXPECT_EQ(r.status, LoadStatus::kError);
         EXPECT_NE(r.error.find(c.parser_text), std::string::npos) << r.error;
@@ -219,7 +241,7 @@ TEST(ConfigStore, MalformedXmlCarriesTheParserMessageAndOffset) {
 
 // A temporary file removed at the end of the test.
 class TempFile {
-public:
+  public:
     explicit TempFile(const std::string& content) {
         char name[] = "/tmp/qn-ivi-store-XXXXXX";
         int fd = mkstemp(name);
@@ -230,7 +252,7 @@ public:
     ~TempFile() { std::remove(path_.c_str()); }
     const std::string& path() const { return path_; }
 
-private:
+  private:
     std::string path_;
 };
 

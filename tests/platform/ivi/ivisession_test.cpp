@@ -16,12 +16,12 @@ namespace {
 using namespace std::chrono_literals;
 
 class Session {
-public:
+  public:
     Session() { EXPECT_EQ(IviSession_New(&vi_), VI_SUCCESS); }
     ~Session() { IviSession_Dispose(vi_); }
     ViSession vi() const { return vi_; }
 
-private:
+  private:
     ViSession vi_ = 0;
 };
 
@@ -92,7 +92,7 @@ TEST(IviSession, LockIsReentrantAndHonoursCallerHasLock) {
     ViBoolean has = VI_FALSE;
     ASSERT_EQ(IviSession_Lock(s.vi(), &has), VI_SUCCESS);
     EXPECT_EQ(has, VI_TRUE);
-    ASSERT_EQ(IviSession_Lock(s.vi(), &has), VI_SUCCESS);  // already held: no second level
+    ASSERT_EQ(IviSession_Lock(s.vi(), &has), VI_SUCCESS);     // already held: no second level
     ASSERT_EQ(IviSession_Lock(s.vi(), nullptr), VI_SUCCESS);  // nested level
     ASSERT_EQ(IviSession_Unlock(s.vi(), nullptr), VI_SUCCESS);
     ASSERT_EQ(IviSession_Unlock(s.vi(), &has), VI_SUCCESS);
