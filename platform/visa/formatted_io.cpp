@@ -59,6 +59,16 @@ HRESULT FormattedIO::Fill(const Deadline& deadline) {
     return hr;
 }
 
+// After a failed read nothing buffered of that reply can be trusted (a late
+// rest of it would be taken for the next reply): forget it.
+HRESULT FormattedIO::Settle(HRESULT hr) {
+    if (FAILED(hr)) {
+        rpos_ = rend_ = 0;
+        open_message_ = false;
+    }
+    return hr;
+}
+
 // Waits for a new message when nothing of one is pending.
 HRESULT FormattedIO::StartMessage(const Deadline& deadline) {
     if (rpos_ < rend_ || open_message_) return S_OK;
@@ -278,8 +288,8 @@ HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_
         target.vt = vt;
         target.elem = elem;
         BlockResult r;
-        HRESULT hr = ReadBlock(elem, seekToBlock != VARIANT_FALSE, flushToEND != VARIANT_FALSE,
-                               target, &r);
+        HRESULT hr = Settle(ReadBlock(elem, seekToBlock != VARIANT_FALSE,
+                                      flushToEND != VARIANT_FALSE, target, &r));
         if (FAILED(hr)) return hr;
         if (elem > 1 && fmt::NeedsSwap(big_endian_)) fmt::SwapBytes(target.array.data<BYTE>(), r.stored, elem);
         VariantClear(pData);
@@ -312,8 +322,8 @@ HRESULT FormattedIO::ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG
         target.buf = static_cast<BYTE*>(buf);
         target.room = std::size_t(maxCount) * elem;
         BlockResult r;
-        HRESULT hr = ReadBlock(elem, seekToBlock != VARIANT_FALSE, flushToEND != VARIANT_FALSE,
-                               target, &r);
+        HRESULT hr = Settle(ReadBlock(elem, seekToBlock != VARIANT_FALSE,
+                                      flushToEND != VARIANT_FALSE, target, &r));
         if (elem > 1 && fmt::NeedsSwap(big_endian_)) fmt::SwapBytes(buf, r.stored, elem);
         *pActualCount = LONG(r.stored / elem);
         if (FAILED(hr)) return hr;
@@ -332,7 +342,7 @@ HRESULT FormattedIO::ReadString(BSTR* pString) {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
         std::string text;
-        HRESULT hr = ReadRest(OpDeadline(), &text);
+        HRESULT hr = Settle(ReadRest(OpDeadline(), &text));
         if (FAILED(hr)) return hr;
         *pString = qn::com::Utf8ToBstr(text);
         return *pString ? S_OK : E_OUTOFMEMORY;
@@ -351,7 +361,7 @@ HRESULT FormattedIO::ReadNumber(LONG type, VARIANT_BOOL flushToEND, VARIANT* pDa
             HRESULT flushed = DrainMessage(deadline);
             if (SUCCEEDED(hr)) hr = flushed;
         }
-        if (FAILED(hr)) return hr;
+        if (FAILED(Settle(hr))) return hr;
         return VariantCopy(pData, &value);
     });
 }
@@ -364,7 +374,7 @@ HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
         std::string text;
-        HRESULT hr = ReadRest(OpDeadline(), &text);
+        HRESULT hr = Settle(ReadRest(OpDeadline(), &text));
         if (FAILED(hr)) return hr;
         std::string seps = listSeparator ? qn::com::BstrToUtf8(listSeparator) : ",";
         if (seps.empty()) seps = ",";

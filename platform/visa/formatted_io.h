@@ -73,6 +73,7 @@ private:
     std::string_view Pending() const;
     void Consume(std::size_t n);
     HRESULT Fill(const Deadline& deadline);
+    HRESULT Settle(HRESULT hr);
     HRESULT StartMessage(const Deadline& deadline);
     HRESULT ReadRest(const Deadline& deadline, std::string* out);
     HRESULT SkipSeparators(const Deadline& deadline, bool* at_end);

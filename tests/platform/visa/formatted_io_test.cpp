@@ -241,6 +241,25 @@ TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
     EXPECT_EQ(peer.Finish(), "");
 }
 
+// A reply that timed out half-read must not prefix the next one.
+TEST(FormattedIOTest, TimedOutReplyDoesNotLeakIntoTheNext) {
+    LoopbackPeer peer;
+    auto late = peer.Signal();
+    peer.Expect("A?\n").Send("abc").Pause(300).Send("def\n").Notify();
+    peer.Expect("B?\n").Send("good\n");
+    peer.Start();
+    Bound b = Bind(peer, 150);
+    Write(b.msg.get(), "A?\n");
+    Bstr text;
+    EXPECT_EQ(b.io->ReadString(text.Out()), E_VISA_TIMEOUT);
+    late.wait();
+    Write(b.msg.get(), "B?\n");
+    ASSERT_EQ(b.io->ReadString(text.Out()), S_OK) << ThreadErrorText();
+    EXPECT_EQ(text.utf8(), "good\n");
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
 TEST(FormattedIOTest, UnboundObjectAndArguments) {
     ComPtr<IFormattedIO488> io;
     ASSERT_EQ(CreateFormattedIO488(io.Out()), S_OK);
