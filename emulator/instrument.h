@@ -1,0 +1,89 @@
+// The emulated instrument: executes SCPI messages against its settings and status model and
+// keeps the output queue. Not thread-safe; the server drives it from one thread.
+#pragma once
+
+#include <array>
+#include <chrono>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "emulator/command_tree.h"
+#include "emulator/models.h"
+#include "emulator/scope_state.h"
+#include "emulator/status_model.h"
+
+namespace qn::emu {
+
+// Command tables, one per subsystem group.
+std::span<const CommandSpec> CommonCommands();
+std::span<const CommandSpec> SystemDataCommands();
+std::span<const CommandSpec> ScopeCommands();
+std::span<const CommandSpec> StatusCommands();
+
+class Instrument {
+  public:
+    static constexpr int kSetupSlots = 10;
+
+    explicit Instrument(ModelInfo model);
+
+    // Executes one message (without its terminator). A reply still in the output queue when
+    // the message arrives is discarded with -410, as IEEE 488.2 6.3.2.3 requires.
+    void Execute(std::string_view message);
+    bool output_pending() const { return !output_.empty(); }
+    // The queued reply, terminator included; empties the output queue.
+    std::string TakeOutput();
+
+    // Services for the command handlers.
+    void Error(ScpiError error) { status_.PushError(error); }
+    StatusModel& status() { return status_; }
+    ScopeSettings& settings() { return settings_; }
+    const ModelInfo& model() const { return model_; }
+    bool message_available() const { return !output_.empty() || !replies_.empty(); }
+    void Reset();
+    bool Save(int slot);
+    bool Recall(int slot);
+
+    // Acquisition engine: a started acquisition runs for a simulated time, then captures a
+    // record from the current settings, clears the run bit and completes a pending *OPC.
+    void StartAcquisition(bool continuous);
+    void StopAcquisition();
+    void ArmOperationComplete();
+    void WaitForCompletion();  // *OPC?: returns when no single acquisition is running
+    void Tick();               // completes an acquisition whose time has passed
+    const AcquiredRecord& record() const { return record_; }
+
+    // Test hook: raw bytes served verbatim as the reply to :WAV:DATA? while set.
+    void set_waveform_override(std::optional<std::string> bytes) {
+        waveform_override_ = std::move(bytes);
+    }
+    const std::optional<std::string>& waveform_override() const { return waveform_override_; }
+
+  private:
+    using Clock = std::chrono::steady_clock;
+    void ExecuteUnit(const ProgramUnit& unit, bool& stop);
+    void Capture();
+
+    ModelInfo model_;
+    CommandTree tree_;
+    StatusModel status_;
+    ScopeSettings settings_;
+    std::array<std::optional<ScopeSettings>, kSetupSlots> saved_;
+    std::string output_;
+    std::vector<std::string> replies_;  // replies of the message being executed
+    const CommandTree::Node* base_ = nullptr;
+    std::vector<int> base_suffixes_;
+
+    bool running_ = false;
+    bool continuous_ = false;
+    bool opc_armed_ = false;
+    Clock::time_point done_at_{};
+    AcquiredRecord record_;
+    std::uint32_t acquisitions_ = 0;
+    std::optional<std::string> waveform_override_;
+};
+
+}  // namespace qn::emu

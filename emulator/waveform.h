@@ -1,0 +1,51 @@
+// Synthesised acquisitions and their transfer encoding.
+//
+// An acquisition captures every displayed source at the family's full record length: analog
+// channels carry a sine (odd channels) or a square wave (even channels) plus noise, scaled by
+// the channel's range, offset, coupling and inversion; pods carry a binary counter. A transfer
+// decimates the record to the requested point count (min/max pairs for a peak record) and
+// encodes it as WORD (16-bit) or BYTE (8-bit) codes.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "emulator/models.h"
+#include "emulator/scope_state.h"
+
+namespace qn::emu {
+
+// `acquisition` numbers the acquisition and seeds its noise.
+AcquiredRecord SynthesizeRecord(const ScopeSettings& settings, const ModelInfo& model,
+                                std::uint32_t acquisition);
+
+// Scaling of a transfer in the current :WAV:FORM/UNS settings.
+struct TransferScale {
+    int format = 1;  // 0 BYTE, 1 WORD
+    int type = 0;    // 0 NORM, 1 PEAK, 2 AVER, 3 HRES
+    int points = 0;
+    int count = 1;
+    double x_increment = 0.0;
+    double x_origin = 0.0;
+    double y_increment = 0.0;
+    double y_origin = 0.0;
+    int y_reference = 0;
+};
+
+// Scale of the selected source: from the record when it holds the source, else from the
+// current settings.
+TransferScale ComputeScale(const ScopeSettings& settings, const AcquiredRecord& record,
+                           const ModelInfo& model);
+// "format,type,points,count,xinc,xorigin,xref,yinc,yorigin,yref".
+std::string FormatPreamble(const TransferScale& scale);
+// The IEEE 488.2 block with the selected source's data; nullopt when the record does not hold
+// that source.
+std::optional<std::string> EncodeWaveformBlock(const ScopeSettings& settings,
+                                               const AcquiredRecord& record,
+                                               const ModelInfo& model);
+// Wraps raw bytes in a definite-length block header.
+std::string MakeBlock(const std::string& payload);
+
+}  // namespace qn::emu
