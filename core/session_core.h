@@ -16,6 +16,7 @@
 #include "core/session.h"
 #include "platform/com/lock.h"
 #include "services/coercion_log.h"
+#include "io/visa_provider.h"
 #include "services/tracer.h"
 
 namespace qn {
@@ -30,6 +31,9 @@ public:
     DriverSession session;
     CCoercionLogManager coercions;
     CTraceOwner tracer;
+    // The instrument session (closed while simulating). Tests may put a
+    // scripted provider in its place before Initialize.
+    std::unique_ptr<CDriverIOProvider> io = std::make_unique<CVisaComIOProvider>();
     // Virtual names of the configuration store's driver session:
     // lower-case virtual name -> physical name.
     std::map<std::string, std::string> virtual_names;

@@ -1,0 +1,228 @@
+#include "io/provider.h"
+
+#include "Quorlen731XXErrors.h"
+#include "platform/com/errorinfo.h"
+
+namespace qn {
+
+namespace {
+constexpr int kSendEnd = 0;
+constexpr int kTermCharEnabled = 1;
+constexpr LONG kStatusReplyChars = 100;
+constexpr long kStatusErrorMask = 0x3C;  // query, device-dependent, execution, command error
+
+// Leading white space, an optional sign, then digits up to the first non-digit.
+long ParseStatusInteger(std::string_view s) {
+    std::size_t i = 0;
+    while (i < s.size() && (s[i] == ' ' || (s[i] >= '\t' && s[i] <= '\r'))) ++i;
+    bool negative = false;
+    if (i < s.size() && (s[i] == '+' || s[i] == '-')) negative = s[i++] == '-';
+    long v = 0;
+    for (; i < s.size() && s[i] >= '0' && s[i] <= '9'; ++i)
+        if (v < 100000000) v = v * 10 + (s[i] - '0');
+    return negative ? -v : v;
+}
+}  // namespace
+
+HRESULT CDriverIOProvider::WriteWithTerminator(std::string_view cmd) {
+    std::string msg(cmd);
+    if (msg.size() < write_term_.size() ||
+        msg.compare(msg.size() - write_term_.size(), write_term_.size(), write_term_) != 0)
+        msg += write_term_;
+    LONG written = 0;
+    HRESULT hr = RawWrite(reinterpret_cast<const BYTE*>(msg.data()), static_cast<LONG>(msg.size()),
+                          &written);
+    if (SUCCEEDED(hr) && written < static_cast<LONG>(msg.size())) {
+        com::SetThreadError(GUID_NULL, "VISA", "fewer characters were written than asked");
+        return E_FAIL;
+    }
+    return hr;
+}
+
+HRESULT CDriverIOProvider::ReadRaw(std::string* out, LONG max_chars, bool strip) {
+    out->assign(static_cast<std::size_t>(max_chars > 0 ? max_chars : 0), '\0');
+    LONG actual = 0;
+    HRESULT hr = RawRead(reinterpret_cast<BYTE*>(out->data()), max_chars, &actual);
+    out->resize(static_cast<std::size_t>(actual > 0 ? actual : 0));
+    if (FAILED(hr)) return hr;
+    if (strip && out->size() >= read_term_.size() && !read_term_.empty() &&
+        out->compare(out->size() - read_term_.size(), read_term_.size(), read_term_) == 0)
+        out->resize(out->size() - read_term_.size());
+    return S_OK;
+}
+
+HRESULT CDriverIOProvider::StatusCheck() {
+    static constexpr std::string_view kEsr = "*ESR?\n";
+    LONG written = 0;
+    HRESULT hr = RawWrite(reinterpret_cast<const BYTE*>(kEsr.data()), LONG(kEsr.size()), &written);
+    if (FAILED(hr)) {
+        RawClear();
+        return hr;
+    }
+    std::string reply;
+    hr = ReadRaw(&reply, kStatusReplyChars, false);
+    if (FAILED(hr)) {
+        RawClear();
+        return hr;
+    }
+    return (ParseStatusInteger(reply) & kStatusErrorMask) ? E_FAIL : S_OK;
+}
+
+HRESULT CDriverIOProvider::PollInstrumentErrors(const CErrorManagerBase& err) {
+    if (!flags_ || !flags_->query_instrument_status) return S_OK;
+    if (!initialized_) return err.Error(Msg::E_IVI_INSTRUMENT_STATUS);
+    if (FAILED(StatusCheck())) return err.Error(Msg::E_IVI_INSTRUMENT_STATUS);
+    return S_OK;
+}
+
+HRESULT CDriverIOProvider::ReportIOError(const CErrorManagerBase& err, HRESULT hr) {
+    if (hr == kVisaTimeout) hr = kProviderTimeout;
+    // The transport's own description, taken before the device clear can
+    // replace it.
+    com::ErrorRecord rec;
+    std::string text = com::TakeThreadError(&rec) ? rec.description : std::string();
+    if (text.empty() && !initialized_) text = "the I/O session is not open";
+    if (initialized_) RawClear();
+    HRESULT reported;
+    if (hr == kProviderTimeout) {
+        timed_out_ = true;
+        reported = err.Error(Msg::E_QUORLEN731XX_IO_TIMEOUT, {text});
+    } else {
+        reported = err.Error(Msg::E_QUORLEN731XX_IO_GENERAL, {text});
+    }
+    if (initialized_ && flags_ && flags_->query_instrument_status) {
+        // Clears the event status register; the outcome is not reported, and
+        // the error information of the report above is kept.
+        ComPtr<IErrorInfo> keep;
+        GetErrorInfo(0, keep.Out());
+        StatusCheck();
+        SetErrorInfo(0, keep.get());
+    }
+    return reported;
+}
+
+HRESULT CDriverIOProvider::DeviceClear() { return initialized_ ? RawClear() : E_FAIL; }
+HRESULT CDriverIOProvider::ReadSTB(SHORT* stb) {
+    if (!stb) return E_POINTER;
+    return initialized_ ? RawReadSTB(stb) : E_FAIL;
+}
+
+HRESULT CDriverIOProvider::SetIOTimeout(const CErrorManagerBase& err, LONG timeout) {
+    return Run(err, kTimeoutSession, false, [&] { return RawSetTimeout(timeout); });
+}
+HRESULT CDriverIOProvider::GetIOTimeout(const CErrorManagerBase& err, LONG* timeout) {
+    if (!timeout) return E_POINTER;
+    return Run(err, kTimeoutSession, false, [&] { return RawGetTimeout(timeout); });
+}
+
+HRESULT CDriverIOProvider::GetVisaInterfaceType(const CErrorManagerBase& err, LONG* type) {
+    if (!type) return E_POINTER;
+    return Run(err, kTimeoutSession, false, [&] {
+        SHORT t = 0;
+        std::string rclass;
+        HRESULT hr = RawInterface(&t, &rclass);
+        if (FAILED(hr)) return hr;
+        bool instr = rclass.size() == 5 && (rclass[0] | 0x20) == 'i' && (rclass[1] | 0x20) == 'n' &&
+                     (rclass[2] | 0x20) == 's' && (rclass[3] | 0x20) == 't' &&
+                     (rclass[4] | 0x20) == 'r';
+        switch (t) {
+            case 1: case 2: case 3: case 4: *type = t; break;
+            case 6: *type = instr ? 6 : 7; break;
+            case 7: *type = 8; break;
+            default: *type = 0; break;
+        }
+        return S_OK;
+    });
+}
+
+HRESULT CDriverIOProvider::SetSendEndEnabled(const CErrorManagerBase& err, bool on) {
+    return Run(err, kTimeoutSession, false, [&] { return RawSetBool(kSendEnd, on); });
+}
+HRESULT CDriverIOProvider::GetSendEndEnabled(const CErrorManagerBase& err, bool* on) {
+    if (!on) return E_POINTER;
+    return Run(err, kTimeoutSession, false, [&] { return RawGetBool(kSendEnd, on); });
+}
+HRESULT CDriverIOProvider::SetTerminationCharacter(const CErrorManagerBase& err, BYTE c) {
+    return Run(err, kTimeoutSession, false, [&] { return RawSetTermChar(c); });
+}
+HRESULT CDriverIOProvider::GetTerminationCharacter(const CErrorManagerBase& err, BYTE* c) {
+    if (!c) return E_POINTER;
+    return Run(err, kTimeoutSession, false, [&] { return RawGetTermChar(c); });
+}
+HRESULT CDriverIOProvider::SetTerminationCharacterEnabled(const CErrorManagerBase& err, bool on) {
+    return Run(err, kTimeoutSession, false, [&] { return RawSetBool(kTermCharEnabled, on); });
+}
+HRESULT CDriverIOProvider::GetTerminationCharacterEnabled(const CErrorManagerBase& err, bool* on) {
+    if (!on) return E_POINTER;
+    return Run(err, kTimeoutSession, false, [&] { return RawGetBool(kTermCharEnabled, on); });
+}
+
+HRESULT CDriverIOProvider::Write(const CErrorManagerBase& err, std::string_view cmd, LONG timeout,
+                                 bool poll) {
+    return Run(err, timeout, poll, [&] { return WriteWithTerminator(cmd); });
+}
+
+HRESULT CDriverIOProvider::Query(const CErrorManagerBase& err, std::string_view cmd,
+                                 std::string* reply, LONG max_chars, LONG timeout, bool poll) {
+    return Run(err, timeout, poll, [&] {
+        HRESULT hr = WriteWithTerminator(cmd);
+        return SUCCEEDED(hr) ? ReadRaw(reply, max_chars, true) : hr;
+    });
+}
+
+HRESULT CDriverIOProvider::ReadText(const CErrorManagerBase& err, std::string* out,
+                                    LONG max_chars, LONG timeout, bool strip, bool poll) {
+    return Run(err, timeout, poll, [&] { return ReadRaw(out, max_chars, strip); });
+}
+
+HRESULT CDriverIOProvider::ReadBytes(const CErrorManagerBase& err, SAFEARRAY** out, LONG count,
+                                     LONG timeout, bool poll) {
+    if (!out) return E_POINTER;
+    if (count < 0) return E_INVALIDARG;
+    return Run(err, timeout, poll, [&] { return RawReadArray(count, out); });
+}
+
+HRESULT CDriverIOProvider::ReadBuffer(const CErrorManagerBase& err, BYTE* buf, LONG count,
+                                      LONG* actual, LONG timeout, bool poll) {
+    if (!buf || !actual) return E_POINTER;
+    if (count < 0) return E_INVALIDARG;
+    *actual = 0;
+    return Run(err, timeout, poll, [&] { return RawRead(buf, count, actual); });
+}
+
+HRESULT CDriverIOProvider::WriteBytes(const CErrorManagerBase& err, SAFEARRAY* psa, LONG count,
+                                      LONG timeout, bool poll) {
+    if (!psa) return E_POINTER;
+    VARTYPE vt = 0;
+    SafeArrayGetVartype(psa, &vt);
+    ULONG size = com::SafeArrayCount(psa);
+    if (SafeArrayGetDim(psa) != 1 || (vt != VT_UI1 && vt != VT_I1)) return E_INVALIDARG;
+    if (count == -1) count = static_cast<LONG>(size);
+    if (count < 0 || static_cast<ULONG>(count) > size) return E_INVALIDARG;
+    return Run(err, timeout, poll, [&] {
+        LONG written = 0;
+        HRESULT hr = RawWrite(static_cast<const BYTE*>(psa->pvData), count, &written);
+        if (SUCCEEDED(hr) && written < count) {
+            com::SetThreadError(GUID_NULL, "VISA", "fewer bytes were written than asked");
+            return E_FAIL;
+        }
+        return hr;
+    });
+}
+
+HRESULT CDriverIOProvider::WriteBuffer(const CErrorManagerBase& err, const BYTE* buf, LONG count,
+                                       LONG* actual, LONG timeout, bool poll) {
+    if (!buf || !actual) return E_POINTER;
+    if (count < 0) return E_INVALIDARG;
+    *actual = 0;
+    return Run(err, timeout, poll, [&] {
+        HRESULT hr = RawWrite(buf, count, actual);
+        if (SUCCEEDED(hr) && *actual < count) {
+            com::SetThreadError(GUID_NULL, "VISA", "fewer bytes were written than asked");
+            return E_FAIL;
+        }
+        return hr;
+    });
+}
+
+}  // namespace qn

@@ -1,0 +1,200 @@
+#include <gtest/gtest.h>
+
+#include <cmath>
+
+#include "Quorlen731XXErrors.h"
+#include "core/root.h"
+#include "io/io_manager.h"
+#include "tests/support/scripted_provider.h"
+
+namespace qn::test {
+namespace {
+
+constexpr const char* kIdn = "QUORLEN TECHNOLOGIES,QDS4032A,SN0001,2.10\n";
+
+class IoManagerTest : public ::testing::Test {
+protected:
+    void SetUp() override {
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        driver_ = com::MakeComObject<Quorlen731XX>();
+        auto p = std::make_unique<ScriptedProvider>();
+        io_ = p.get();
+        driver_->Core().io = std::move(p);
+        io_->Expect("*IDN?\n", kIdn);
+    }
+    void TearDown() override {
+        if (!HasFailure()) {
+            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
+        }
+    }
+    void Open(const char* options = "") {
+        com::Bstr r("scripted"), o(options);
+        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    }
+    CDriverIOManager Io() { return qn::Io(*driver_.get()); }
+    static std::string ErrorText() {
+        com::ErrorRecord rec;
+        return com::TakeThreadError(&rec) ? rec.description : std::string();
+    }
+
+    ComPtr<Quorlen731XX> driver_;
+    ScriptedProvider* io_ = nullptr;
+};
+
+TEST_F(IoManagerTest, InitializeIdentifiesTheInstrument) {
+    Open();
+    const InstrumentIdentity& id = driver_->Core().session.identity;
+    EXPECT_EQ(id.manufacturer, "QUORLEN TECHNOLOGIES");
+    EXPECT_EQ(id.model, "QDS4032A");
+    EXPECT_EQ(id.serial_number, "SN0001");
+    EXPECT_EQ(id.firmware_revision, "2.10");
+    com::Bstr model;
+    driver_->get_InstrumentModel(model.Out());
+    EXPECT_EQ(model.utf8(), "QDS4032A");
+}
+
+TEST_F(IoManagerTest, StatusCheckFailsOnErrorBitsOnly) {
+    io_->AnswerStatusWith("+0");
+    Open("QueryInstrStatus=true");
+    const std::pair<const char*, HRESULT> cases[] = {
+        {"+4", E_IVI_INSTRUMENT_STATUS}, {"32", E_IVI_INSTRUMENT_STATUS},
+        {"+1", S_OK},                    {"+128", S_OK},
+        {"+60", E_IVI_INSTRUMENT_STATUS}, {"garbage", S_OK},
+    };
+    for (auto [esr, expected] : cases) {
+        io_->AnswerStatusWith(esr);
+        io_->Expect(":RUN\n");
+        EXPECT_EQ(Io().InstrWrite(":RUN"), expected) << esr;
+    }
+    io_->AnswerStatusWith("+4");
+    io_->Expect(":RUN\n");
+    EXPECT_EQ(Io().InstrWrite(":RUN"), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(ErrorText(),
+              "Quorlen731XX: Instrument error detected.  Use ErrorQuery() to determine the "
+              "error(s).");
+}
+
+TEST_F(IoManagerTest, WithoutStatusCheckingNoStatusQueryIsSent) {
+    Open();
+    io_->Expect(":RUN\n").ExpectTimeout(":ACQ:COUN?\n");
+    EXPECT_EQ(Io().InstrWrite(":RUN"), S_OK);
+    LONG v = 0;
+    EXPECT_EQ(Io().InstrQuery(":ACQ:COUN?", &v), E_QUORLEN731XX_IO_TIMEOUT);
+    for (const std::string& w : io_->Written()) EXPECT_NE(w, "*ESR?\n");
+}
+
+TEST_F(IoManagerTest, TerminatorIsAppendedOnceAndStrippedOnce) {
+    Open();
+    io_->Expect("*CLS\n").Expect(":A\n").Expect(":B?\n", "x\n\n");
+    EXPECT_EQ(Io().InstrWrite("*CLS\n"), S_OK);
+    EXPECT_EQ(Io().InstrWrite(":A"), S_OK);
+    std::string reply;
+    EXPECT_EQ(Io().InstrQuery(":B?", &reply, 100), S_OK);
+    EXPECT_EQ(reply, "x\n");
+}
+
+TEST_F(IoManagerTest, NumericRepliesConvertByType) {
+    Open();
+    io_->Expect("A?\n", "\n").Expect("B?\n", "2.7\n").Expect("C?\n", "-2.7\n").Expect("D?\n", "OFF\n");
+    LONG l = 7;
+    EXPECT_EQ(Io().InstrQuery("A?", &l), S_OK);
+    EXPECT_EQ(l, 0);
+    EXPECT_EQ(Io().InstrQuery("B?", &l), S_OK);
+    EXPECT_EQ(l, 2);
+    EXPECT_EQ(Io().InstrQuery("C?", &l), S_OK);
+    EXPECT_EQ(l, -2);
+    double d = 0;
+    EXPECT_EQ(Io().InstrQuery("D?", &d), S_OK);
+    EXPECT_TRUE(std::isnan(d));
+}
+
+TEST_F(IoManagerTest, TimeoutIsReportedAndTheSessionTimeoutRestored) {
+    io_->AnswerStatusWith("+0");
+    Open("QueryInstrStatus=true");
+    io_->ExpectTimeout("*IDN?\n");
+    std::string reply;
+    EXPECT_EQ(Io().InstrQuery("*IDN?", &reply, 100, 500), E_QUORLEN731XX_IO_TIMEOUT);
+    EXPECT_EQ(ErrorText(),
+              "Quorlen731XX: IO timeout error: Timeout expired before operation completed..");
+    bool timed_out = false;
+    Io().IsTimeout(&timed_out);
+    EXPECT_TRUE(timed_out);
+    EXPECT_EQ(io_->SessionTimeout(), 2000);
+    EXPECT_EQ(io_->Clears(), 1);
+    // The failure cleared the event status register once more.
+    EXPECT_EQ(io_->Written().back(), "*ESR?\n");
+    // The flag lasts until the next operation starts.
+    io_->Expect(":RUN\n");
+    EXPECT_EQ(Io().InstrWrite(":RUN"), S_OK);
+    Io().IsTimeout(&timed_out);
+    EXPECT_FALSE(timed_out);
+}
+
+TEST_F(IoManagerTest, CommandStackQueries) {
+    Open();
+    io_->Expect("\n");
+    EXPECT_EQ(Io().InstrPrintCommand(), S_OK);  // empty stack: just the terminator
+
+    driver_->Commands().PushCommand(":CHAN1:DISP?");
+    io_->Expect(":CHAN1:DISP?\n", " 1 \n").Expect(":CHAN1:DISP?\n", "ON\n");
+    VARIANT_BOOL b = VARIANT_FALSE;
+    EXPECT_EQ(Io().InstrQueryCommandBool(&b), S_OK);
+    EXPECT_EQ(b, VARIANT_TRUE);
+    EXPECT_EQ(Io().InstrQueryCommandBool(&b), E_IVI_UNEXPECTED_RESPONSE);
+    EXPECT_EQ(b, VARIANT_FALSE);
+
+    static const CEnumCommandTable kUnits{{"", 0, "VOLT"}, {"", 1, "AMP"}};
+    driver_->Commands().PopCommand();
+    driver_->Commands().PushCommand(":CHAN1:UNIT?");
+    io_->Expect(":CHAN1:UNIT?\n", "AMP\n").Expect(":CHAN1:UNIT?\n", "volt\n");
+    LONG units = -1;
+    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), S_OK);
+    EXPECT_EQ(units, 1);
+    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), E_IVI_UNEXPECTED_RESPONSE);
+    EXPECT_EQ(units, 1);
+    driver_->Commands().PopCommand();
+}
+
+TEST_F(IoManagerTest, ErrorQueryParsesTheReplyWithoutCheckingStatus) {
+    io_->AnswerStatusWith("+0");
+    Open("QueryInstrStatus=true");
+    const std::size_t before = io_->Written().size();
+    io_->Expect("SYST:ERR?\n", "+0,\"No error\"\n")
+        .Expect("SYST:ERR?\n", "-113,\"Undefined header\"\n")
+        .Expect("SYST:ERR?\n", "-113\n");
+    LONG code = 1;
+    com::Bstr msg;
+    EXPECT_EQ(driver_->ErrorQuery(&code, msg.Out()), S_OK);
+    EXPECT_EQ(code, 0);
+    EXPECT_EQ(msg.utf8(), "No error");
+    EXPECT_EQ(driver_->ErrorQuery(&code, msg.Out()), S_OK);
+    EXPECT_EQ(code, -113);
+    EXPECT_EQ(msg.utf8(), "Undefined header");
+    EXPECT_EQ(driver_->ErrorQuery(&code, msg.Out()), E_IVI_UNEXPECTED_RESPONSE);
+    for (std::size_t i = before; i < io_->Written().size(); ++i)
+        EXPECT_NE(io_->Written()[i], "*ESR?\n");
+    EXPECT_TRUE(driver_->Core().session.flags.query_instrument_status);
+}
+
+TEST_F(IoManagerTest, UtilityOperationsSendTheirCommands) {
+    Open();
+    io_->Expect("*RST;*OPC?\n", "1\n").Expect("*TST?\n", "1\n").Expect("*CLS\n");
+    EXPECT_EQ(driver_->Reset(), S_OK);
+    LONG result = 0;
+    com::Bstr msg;
+    EXPECT_EQ(driver_->SelfTest(&result, msg.Out()), S_OK);
+    EXPECT_EQ(result, 1);
+    EXPECT_EQ(msg.utf8(), "Selftest failed");
+    io_->AnswerStatusWith("+0");
+    EXPECT_EQ(driver_->put_QueryInstrumentStatus(VARIANT_TRUE), S_OK);
+    EXPECT_EQ(io_->SessionTimeout(), 2000);  // the 30 s reset timeout was restored
+}
+
+TEST_F(IoManagerTest, CloseReleasesTheSession) {
+    Open();
+    EXPECT_EQ(driver_->Close(), S_OK);
+    EXPECT_EQ(Io().InstrWrite(":RUN"), E_QUORLEN731XX_IO_GENERAL);
+}
+
+}  // namespace
+}  // namespace qn::test
