@@ -178,6 +178,7 @@ private:
     std::vector<BYTE> buf_;
     std::size_t head_ = 0, tail_ = 0;  // unread bytes are buf_[head_, tail_)
     bool stale_ = false;               // the last operation failed: drop input before a write
+    bool drained_ = false;             // the last receive emptied the socket's queue
 };
 
 bool SocketTransport::TakeBuffered(const ReadRequest& req, ReadResult* r) {
@@ -200,10 +201,15 @@ bool SocketTransport::TakeBuffered(const ReadRequest& req, ReadResult* r) {
 
 HRESULT SocketTransport::RecvSome(BYTE* dst, std::size_t n, const Deadline& deadline,
                                   std::size_t* got, std::string* error) {
+    // A short receive left the queue empty: wait first instead of asking again.
+    bool wait_first = drained_;
     for (;;) {
-        ssize_t r = ::recv(fd_.get(), dst, n, 0);
+        ssize_t r = wait_first ? -1 : ::recv(fd_.get(), dst, n, 0);
+        if (wait_first) errno = EAGAIN;
+        wait_first = false;
         if (r > 0) {
             *got = std::size_t(r);
+            drained_ = std::size_t(r) < n;
             return S_OK;
         }
         if (r == 0) {
