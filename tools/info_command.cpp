@@ -93,9 +93,10 @@ int InfoCommand(std::span<char*> argv) {
                      OptionHelp(kSessionOptions).c_str());
         return 2;
     }
-    ComPtr<Quorlen731XX> driver;
-    HRESULT hr = OpenSession(args, &driver);
+    ToolSession session;
+    HRESULT hr = OpenSession(args, &session);
     if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    ComPtr<Quorlen731XX>& driver = session.driver;
     if (args.Has("json"))
         PrintJson(driver->Core());
     else

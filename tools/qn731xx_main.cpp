@@ -24,7 +24,7 @@ int Usage(FILE* to) {
     for (const Command& c : kCommands)
         std::fprintf(to, "  %-10.*s %.*s\n", int(c.name.size()), c.name.data(), int(c.help.size()),
                      c.help.data());
-    std::fprintf(to, "\nsession options: --resource R --options S --simulate --id-query --reset --json\n");
+    std::fprintf(to, "\nsession options: --resource R --model M --options S --simulate --id-query --reset --json\nwithout --resource, an emulator of model M runs on loopback and the driver talks to it\n");
     return to == stdout ? 0 : 2;
 }
 

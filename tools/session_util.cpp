@@ -6,8 +6,9 @@
 
 namespace qn::tools {
 
-const OptionSpec kSessionOptions[6] = {
-    {"resource", true, "VISA resource or logical name (default: simulate)"},
+const OptionSpec kSessionOptions[7] = {
+    {"resource", true, "VISA resource or logical name (default: the embedded emulator)"},
+    {"model", true, "model of the embedded emulator (default QDS4032A)"},
     {"options", true, "option string, e.g. \"Simulate=true,DriverSetup=Model=QDS4032A\""},
     {"simulate", false, "simulate the instrument"},
     {"id-query", false, "check the instrument model"},
@@ -30,17 +31,29 @@ int ReportFailure(const char* what, HRESULT hr) {
     return 1;
 }
 
-HRESULT OpenSession(const CliArgs& args, ComPtr<Quorlen731XX>* driver) {
-    *driver = com::MakeComObject<Quorlen731XX>();
+HRESULT OpenSession(const CliArgs& args, ToolSession* session) {
+    session->driver = com::MakeComObject<Quorlen731XX>();
     std::string resource = args.Value("resource").value_or("");
     std::string options = args.Value("options").value_or("");
-    // Without a resource the session simulates; an explicit Simulate in the
-    // user's options still wins, since a later pair replaces an earlier one.
-    if (resource.empty() || args.Has("simulate"))
+    // An explicit Simulate in the user's options still wins, since a later
+    // pair replaces an earlier one.
+    if (args.Has("simulate")) {
         options = options.empty() ? "Simulate=true" : "Simulate=true," + options;
+    } else if (resource.empty()) {
+        try {
+            session->emulator =
+                std::make_unique<emu::Emulator>(args.Value("model").value_or("QDS4032A"));
+            std::uint16_t port = session->emulator->Start();
+            resource = "TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET";
+        } catch (const std::exception& e) {
+            std::fprintf(stderr, "cannot start the embedded emulator: %s\n", e.what());
+            return E_FAIL;
+        }
+    }
     com::Bstr r(resource), o(options);
-    return (*driver)->Initialize(r.get(), args.Has("id-query") ? VARIANT_TRUE : VARIANT_FALSE,
-                                 args.Has("reset") ? VARIANT_TRUE : VARIANT_FALSE, o.get());
+    return session->driver->Initialize(r.get(),
+                                       args.Has("id-query") ? VARIANT_TRUE : VARIANT_FALSE,
+                                       args.Has("reset") ? VARIANT_TRUE : VARIANT_FALSE, o.get());
 }
 
 }  // namespace qn::tools

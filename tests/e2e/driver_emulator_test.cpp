@@ -1,0 +1,129 @@
+// The driver against the emulator over a real loopback socket.
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <cstdlib>
+
+#include "Quorlen731XXErrors.h"
+#include "core/root.h"
+#include "emulator/emulator.h"
+#include "io/io_manager.h"
+
+namespace qn::test {
+namespace {
+
+class DriverOnEmulator : public ::testing::Test {
+protected:
+    void SetUp() override { ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1); }
+    void Start(const char* model) {
+        emu_ = std::make_unique<emu::Emulator>(model);
+        port_ = emu_->Start();
+        driver_ = com::MakeComObject<Quorlen731XX>();
+    }
+    std::string Resource() const {
+        return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
+    }
+    HRESULT Init(const char* options = "", bool id_query = true, bool reset = false) {
+        com::Bstr r(Resource()), o(options);
+        return driver_->Initialize(r.get(), id_query ? VARIANT_TRUE : VARIANT_FALSE,
+                                   reset ? VARIANT_TRUE : VARIANT_FALSE, o.get());
+    }
+    CDriverIOManager Io() { return qn::Io(*driver_.get()); }
+    static std::string ErrorText() {
+        com::ErrorRecord rec;
+        return com::TakeThreadError(&rec) ? rec.description : std::string();
+    }
+
+    std::unique_ptr<emu::Emulator> emu_;
+    std::uint16_t port_ = 0;
+    ComPtr<Quorlen731XX> driver_;
+};
+
+TEST_F(DriverOnEmulator, IdentifiesAndChecksTheModel) {
+    Start("QDS2014A");
+    ASSERT_EQ(Init(), S_OK) << ErrorText();
+    com::Bstr s;
+    driver_->get_InstrumentManufacturer(s.Out());
+    EXPECT_EQ(s.utf8(), "QUORLEN TECHNOLOGIES");
+    driver_->get_InstrumentModel(s.Out());
+    EXPECT_EQ(s.utf8(), "QDS2014A");
+    driver_->get_IoResourceDescriptor(s.Out());
+    EXPECT_EQ(s.utf8(), Resource());
+    EXPECT_EQ(emu_->ReceivedMessages().front(), "*IDN?");
+    EXPECT_EQ(driver_->Close(), S_OK);
+}
+
+TEST_F(DriverOnEmulator, BadCommandFailsWithStatusCheckAndIsReadBack) {
+    Start("QDS4032A");
+    ASSERT_EQ(Init("QueryInstrStatus=true"), S_OK) << ErrorText();
+    EXPECT_EQ(Io().InstrWrite(":NO:SUCH:COMMand 1"), E_IVI_INSTRUMENT_STATUS);
+    LONG code = 0;
+    com::Bstr msg;
+    ASSERT_EQ(driver_->ErrorQuery(&code, msg.Out()), S_OK);
+    EXPECT_EQ(code, -113);
+    EXPECT_EQ(msg.utf8(), "Undefined header");
+    ASSERT_EQ(driver_->ErrorQuery(&code, msg.Out()), S_OK);
+    EXPECT_EQ(code, 0);
+}
+
+TEST_F(DriverOnEmulator, ResetAndSelfTestTalkToTheInstrument) {
+    Start("QMS3104A");
+    ASSERT_EQ(Init("", true, /*reset=*/true), S_OK) << ErrorText();
+    LONG result = -1;
+    com::Bstr msg;
+    EXPECT_EQ(driver_->SelfTest(&result, msg.Out()), S_OK);
+    EXPECT_EQ(result, 0);
+    EXPECT_EQ(msg.utf8(), "Selftest passed");
+    auto log = emu_->ReceivedMessages();
+    EXPECT_NE(std::find(log.begin(), log.end(), "*RST;*OPC?"), log.end());
+    EXPECT_NE(std::find(log.begin(), log.end(), "*TST?"), log.end());
+}
+
+TEST_F(DriverOnEmulator, MissingReplyTimesOutAndTheSessionRecovers) {
+    Start("QDS4032A");
+    ASSERT_EQ(Init(), S_OK) << ErrorText();
+    LONG before = 0;
+    ASSERT_EQ(Io().GetIOTimeout(&before), S_OK);
+    emu_->SuppressReplies(1);
+    std::string reply;
+    EXPECT_EQ(Io().InstrQuery("*IDN?", &reply, 256, 300), E_QUORLEN731XX_IO_TIMEOUT);
+    EXPECT_NE(ErrorText().find("IO timeout error"), std::string::npos);
+    bool timed_out = false;
+    Io().IsTimeout(&timed_out);
+    EXPECT_TRUE(timed_out);
+    LONG after = 0;
+    ASSERT_EQ(Io().GetIOTimeout(&after), S_OK);
+    EXPECT_EQ(after, before);
+    // The next query gets its own reply, not a late one.
+    ASSERT_EQ(Io().InstrQuery("*ESE?", &reply, 256), S_OK);
+    EXPECT_EQ(reply, "0");
+}
+
+TEST_F(DriverOnEmulator, DroppedConnectionIsAnIoError) {
+    Start("QDS4032A");
+    ASSERT_EQ(Init(), S_OK) << ErrorText();
+    emu_->DropConnectionOnNextQuery();
+    std::string reply;
+    EXPECT_EQ(Io().InstrQuery("*IDN?", &reply, 256, 2000), E_QUORLEN731XX_IO_GENERAL);
+    EXPECT_EQ(driver_->Close(), S_OK);
+}
+
+TEST_F(DriverOnEmulator, NothingListeningIsAnUnknownResource) {
+    Start("QDS4032A");
+    std::uint16_t port = port_;
+    emu_->Stop();
+    port_ = port;
+    auto t0 = std::chrono::steady_clock::now();
+    EXPECT_EQ(Init(), E_IVI_RESOURCE_UNKNOWN);
+    EXPECT_LT(std::chrono::steady_clock::now() - t0, std::chrono::seconds(10));
+    VARIANT_BOOL b = VARIANT_TRUE;
+    driver_->get_Initialized(&b);
+    EXPECT_EQ(b, VARIANT_FALSE);
+    com::Bstr r("TCPIP0::no-such-host.invalid::5025::SOCKET"), o("");
+    EXPECT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()),
+              E_IVI_RESOURCE_UNKNOWN);
+    EXPECT_NE(ErrorText().find("Unknown resource."), std::string::npos);
+}
+
+}  // namespace
+}  // namespace qn::test
