@@ -10,7 +10,8 @@ namespace qn::emu {
 namespace {
 
 std::vector<std::span<const CommandSpec>> AllTables() {
-    return {CommonCommands(), SystemDataCommands(), ScopeCommands(), StatusCommands()};
+    return {CommonCommands(), SystemDataCommands(), ScopeCommands(),
+            StatusCommands(), ChannelCommands(),    WaveformCommands()};
 }
 
 CommandTree BuildTree(const ModelInfo& model) {

@@ -23,6 +23,8 @@ std::span<const CommandSpec> CommonCommands();
 std::span<const CommandSpec> SystemDataCommands();
 std::span<const CommandSpec> ScopeCommands();
 std::span<const CommandSpec> StatusCommands();
+std::span<const CommandSpec> ChannelCommands();
+std::span<const CommandSpec> WaveformCommands();
 
 class Instrument {
   public:
