@@ -4,6 +4,7 @@
 // owns (BSTRs are freed by the caller with SysFreeString).
 #pragma once
 
+#include "Quorlen731XXIds.h"
 #include "platform/com/com.h"
 
 struct IIviDriverOperation;
@@ -11,14 +12,14 @@ struct IIviDriverIdentity;
 struct IIviDriverUtility;
 
 struct IIviComponentIdentity : IUnknown {
-    QN_INTERFACE_ID("4c84a4a0-5a31-4c1e-9b6e-31a1c0a73101");
+    QN_INTERFACE_IID(IID_IIviComponentIdentity);
     virtual HRESULT get_Description(BSTR* pbstr) = 0;
     virtual HRESULT get_Revision(BSTR* pbstr) = 0;
     virtual HRESULT get_Vendor(BSTR* pbstr) = 0;
 };
 
 struct IIviDriverIdentity : IIviComponentIdentity {
-    QN_INTERFACE_ID("4c84a4a0-5a31-4c1e-9b6e-31a1c0a73102");
+    QN_INTERFACE_IID(IID_IIviDriverIdentity);
     virtual HRESULT get_GroupCapabilities(BSTR* pbstr) = 0;
     virtual HRESULT get_Identifier(BSTR* pbstr) = 0;
     virtual HRESULT get_InstrumentFirmwareRevision(BSTR* pbstr) = 0;
@@ -30,7 +31,7 @@ struct IIviDriverIdentity : IIviComponentIdentity {
 };
 
 struct IIviDriverOperation : IUnknown {
-    QN_INTERFACE_ID("4c84a4a0-5a31-4c1e-9b6e-31a1c0a73103");
+    QN_INTERFACE_IID(IID_IIviDriverOperation);
     virtual HRESULT get_Cache(VARIANT_BOOL* val) = 0;
     virtual HRESULT put_Cache(VARIANT_BOOL val) = 0;
     virtual HRESULT get_DriverSetup(BSTR* val) = 0;
@@ -54,7 +55,7 @@ struct IIviDriverOperation : IUnknown {
 };
 
 struct IIviDriverUtility : IUnknown {
-    QN_INTERFACE_ID("4c84a4a0-5a31-4c1e-9b6e-31a1c0a73104");
+    QN_INTERFACE_IID(IID_IIviDriverUtility);
     virtual HRESULT Disable() = 0;
     virtual HRESULT ErrorQuery(LONG* ErrorCode, BSTR* ErrorMessage) = 0;
     virtual HRESULT LockObject() = 0;
@@ -65,7 +66,7 @@ struct IIviDriverUtility : IUnknown {
 };
 
 struct IIviDriver : IUnknown {
-    QN_INTERFACE_ID("4c84a4a0-5a31-4c1e-9b6e-31a1c0a73105");
+    QN_INTERFACE_IID(IID_IIviDriver);
     virtual HRESULT Initialize(BSTR ResourceName, VARIANT_BOOL IdQuery, VARIANT_BOOL Reset,
                                BSTR OptionString) = 0;
     virtual HRESULT Close() = 0;

@@ -12,6 +12,8 @@
 
 // Declares the interface id of an interface type: place inside the struct.
 #define QN_INTERFACE_ID(text) static constexpr GUID kIid = MakeGuid(text)
+// The same, with the id taken from a named constant (e.g. IID_IIviDriver).
+#define QN_INTERFACE_IID(constant) static constexpr GUID kIid = constant
 
 // The IID of interface I, from its declaration.
 template <class I>
