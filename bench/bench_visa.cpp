@@ -28,7 +28,7 @@ const char kIdn[] = "QUORLEN,731XX,SN000001,1.3.20\n";
 
 // The instrument: answers "*IDN?" and "BLK? <bytes>" on every connection.
 class Server {
-public:
+  public:
     Server() {
         fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
         sockaddr_in a{};
@@ -46,7 +46,7 @@ public:
         return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
     }
 
-private:
+  private:
     void AcceptLoop() {
         for (;;) {
             int c = ::accept4(fd_, nullptr, nullptr, SOCK_CLOEXEC);
@@ -114,7 +114,7 @@ Server& TheServer() {
 // The bare client: blocking socket, a small receive buffer for replies and
 // headers, large data straight into the destination.
 class BareClient {
-public:
+  public:
     BareClient() {
         fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
         sockaddr_in a{};
@@ -154,7 +154,7 @@ public:
         return len;
     }
 
-private:
+  private:
     int fd_ = -1;
 };
 
@@ -228,9 +228,8 @@ void BM_Block_FormattedDirect(benchmark::State& state) {
     for (auto _ : state) {
         LONG written = 0, actual = 0;
         msg->WriteString(query.get(), &written);
-        if (FAILED(direct->ReadIEEEBlockInto(qn::visa::BinaryType_UI1, dst.data(),
-                                             LONG(dst.size()), &actual, VARIANT_FALSE,
-                                             VARIANT_TRUE)))
+        if (FAILED(direct->ReadIEEEBlockInto(qn::visa::BinaryType_UI1, dst.data(), LONG(dst.size()),
+                                             &actual, VARIANT_FALSE, VARIANT_TRUE)))
             state.SkipWithError("block read failed");
     }
     state.SetBytesProcessed(state.iterations() * state.range(0));

@@ -9,7 +9,7 @@
 namespace qn::visa {
 
 class Deadline {
-public:
+  public:
     using Clock = std::chrono::steady_clock;
 
     // From a VISA timeout in milliseconds: negative means no deadline.
@@ -36,7 +36,7 @@ public:
         return ms > INT_MAX ? INT_MAX : int(ms);
     }
 
-private:
+  private:
     bool infinite_ = true;
     Clock::time_point at_{};
 };

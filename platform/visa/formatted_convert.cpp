@@ -18,8 +18,8 @@ struct TypeRow {
 };
 
 constexpr TypeRow kTypes[] = {
-    {ASCIIType_I2, VT_I2, true},     {ASCIIType_I4, VT_I4, true},
-    {ASCIIType_R4, VT_R4, true},     {ASCIIType_R8, VT_R8, true},
+    {ASCIIType_I2, VT_I2, true},      {ASCIIType_I4, VT_I4, true},
+    {ASCIIType_R4, VT_R4, true},      {ASCIIType_R8, VT_R8, true},
     {ASCIIType_BSTR, VT_BSTR, false}, {ASCIIType_Any, VT_VARIANT, false},
     {ASCIIType_UI1, VT_UI1, true},
 };
@@ -45,18 +45,43 @@ std::string_view Trim(std::string_view s) {
 // The value of a VARIANT holding a number, or false.
 bool NumberOf(const VARIANT& v, double* out) {
     switch (v.vt) {
-        case VT_I2: *out = v.iVal; return true;
-        case VT_I4: case VT_INT: *out = v.lVal; return true;
-        case VT_R4: *out = v.fltVal; return true;
-        case VT_R8: *out = v.dblVal; return true;
-        case VT_UI1: *out = v.bVal; return true;
-        case VT_I1: *out = v.cVal; return true;
-        case VT_UI2: *out = v.uiVal; return true;
-        case VT_UI4: case VT_UINT: *out = v.ulVal; return true;
-        case VT_I8: *out = double(v.llVal); return true;
-        case VT_UI8: *out = double(v.ullVal); return true;
-        case VT_BOOL: *out = v.boolVal ? 1 : 0; return true;
-        default: return false;
+        case VT_I2:
+            *out = v.iVal;
+            return true;
+        case VT_I4:
+        case VT_INT:
+            *out = v.lVal;
+            return true;
+        case VT_R4:
+            *out = v.fltVal;
+            return true;
+        case VT_R8:
+            *out = v.dblVal;
+            return true;
+        case VT_UI1:
+            *out = v.bVal;
+            return true;
+        case VT_I1:
+            *out = v.cVal;
+            return true;
+        case VT_UI2:
+            *out = v.uiVal;
+            return true;
+        case VT_UI4:
+        case VT_UINT:
+            *out = v.ulVal;
+            return true;
+        case VT_I8:
+            *out = double(v.llVal);
+            return true;
+        case VT_UI8:
+            *out = double(v.ullVal);
+            return true;
+        case VT_BOOL:
+            *out = v.boolVal ? 1 : 0;
+            return true;
+        default:
+            return false;
     }
 }
 
@@ -83,11 +108,24 @@ VARTYPE BinaryElementType(LONG type) {
 
 std::size_t PlainElementSize(VARTYPE vt) {
     switch (vt) {
-        case VT_UI1: case VT_I1: return 1;
-        case VT_I2: case VT_UI2: return 2;
-        case VT_I4: case VT_UI4: case VT_R4: case VT_INT: case VT_UINT: return 4;
-        case VT_R8: case VT_I8: case VT_UI8: return 8;
-        default: return 0;
+        case VT_UI1:
+        case VT_I1:
+            return 1;
+        case VT_I2:
+        case VT_UI2:
+            return 2;
+        case VT_I4:
+        case VT_UI4:
+        case VT_R4:
+        case VT_INT:
+        case VT_UINT:
+            return 4;
+        case VT_R8:
+        case VT_I8:
+        case VT_UI8:
+            return 8;
+        default:
+            return 0;
     }
 }
 
@@ -137,8 +175,9 @@ HRESULT FieldToVariant(std::string_view text, VARTYPE vt, VARIANT* out, std::str
 HRESULT StoreElement(const VARIANT& value, VARTYPE vt, void* dst) {
     if (vt == VT_VARIANT) return VariantCopy(static_cast<VARIANT*>(dst), &value);
     if (vt == VT_BSTR) {
-        BSTR copy = value.vt == VT_BSTR ? SysAllocStringLen(value.bstrVal, SysStringLen(value.bstrVal))
-                                        : nullptr;
+        BSTR copy = value.vt == VT_BSTR
+                        ? SysAllocStringLen(value.bstrVal, SysStringLen(value.bstrVal))
+                        : nullptr;
         if (!copy) return E_OUTOFMEMORY;
         *static_cast<BSTR*>(dst) = copy;
         return S_OK;

@@ -15,15 +15,21 @@ constexpr GUID kFormattedIid = iid_of<IFormattedIO488>;
 constexpr std::size_t kDefaultBufferSize = 4096;
 constexpr std::size_t kMinBufferSize = 16;
 
-bool IsBlank(char c) { return c == ' ' || c == '\t' || c == '\r'; }
-bool IsFieldEnd(char c) { return IsBlank(c) || c == ',' || c == ';' || c == '\n'; }
+bool IsBlank(char c) {
+    return c == ' ' || c == '\t' || c == '\r';
+}
+bool IsFieldEnd(char c) {
+    return IsBlank(c) || c == ',' || c == ';' || c == '\n';
+}
 
 }  // namespace
 
 FormattedIO::FormattedIO() : rbuf_(kDefaultBufferSize), wsize_(kDefaultBufferSize) {}
 
 HRESULT FormattedIO::Bound() const {
-    return io_ ? S_OK : Report(E_VISA_INVALID_OBJECT, kFormattedIid, "no session bound to the IO property");
+    return io_ ? S_OK
+               : Report(E_VISA_INVALID_OBJECT, kFormattedIid,
+                        "no session bound to the IO property");
 }
 
 Deadline FormattedIO::OpDeadline() const {
@@ -43,17 +49,19 @@ void FormattedIO::Consume(std::size_t n) {
 
 // Adds what the session has of the current message to the read buffer.
 HRESULT FormattedIO::Fill(const Deadline& deadline) {
-    if (deadline.Expired()) return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout reading the reply");
+    if (deadline.Expired())
+        return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout reading the reply");
     if (rpos_ > 0) {
         std::memmove(rbuf_.data(), rbuf_.data() + rpos_, rend_ - rpos_);
         rend_ -= rpos_;
         rpos_ = 0;
     }
     if (rend_ == rbuf_.size())
-        return Report(E_VISA_INVALID_FORMAT, kFormattedIid, "reply item longer than the read buffer");
+        return Report(E_VISA_INVALID_FORMAT, kFormattedIid,
+                      "reply item longer than the read buffer");
     LONG got = 0, end = kReadEndCount;
-    HRESULT hr = direct_->ReadInto(rbuf_.data() + rend_, LONG(rbuf_.size() - rend_),
-                                   kReadAvailable, &got, &end);
+    HRESULT hr = direct_->ReadInto(rbuf_.data() + rend_, LONG(rbuf_.size() - rend_), kReadAvailable,
+                                   &got, &end);
     rend_ += std::size_t(got);
     if (got > 0 || SUCCEEDED(hr)) open_message_ = !(end == kReadEndTermChar || end == kReadEndEnd);
     return hr;
@@ -115,7 +123,8 @@ HRESULT FormattedIO::SkipSeparators(const Deadline& deadline, bool* at_end) {
 // BSTR and Any.
 HRESULT FormattedIO::ReadField(LONG type, const Deadline& deadline, VARIANT* out) {
     const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY) return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
     bool at_end = false;
     HRESULT hr = SkipSeparators(deadline, &at_end);
     if (FAILED(hr)) return hr;
@@ -150,7 +159,8 @@ HRESULT FormattedIO::DrainMessage(const Deadline& deadline) {
     rpos_ = rend_ = 0;
     BYTE scratch[4096];
     while (open_message_) {
-        if (deadline.Expired()) return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout flushing the reply");
+        if (deadline.Expired())
+            return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout flushing the reply");
         LONG got = 0, end = kReadEndCount;
         HRESULT hr = direct_->ReadInto(scratch, LONG(sizeof scratch), kReadDefault, &got, &end);
         if (FAILED(hr)) {
@@ -186,14 +196,13 @@ HRESULT FormattedIO::ReadBlockHeader(bool seek, const Deadline& deadline, BlockH
             return S_OK;
         }
         if (r == BlockParse::kTooLarge)
-            return Resync(E_VISA_INVALID_FORMAT,
-                          "block header declares more than " + std::to_string(max_block_) +
-                              " bytes");
+            return Resync(E_VISA_INVALID_FORMAT, "block header declares more than " +
+                                                     std::to_string(max_block_) + " bytes");
         if (r != BlockParse::kNeedMore || !open_message_)
             return Resync(E_VISA_INVALID_FORMAT,
-                          p.empty() ? "reply holds no block"
-                                    : "malformed block header '" +
-                                          std::string(p.substr(0, 12)) + "'");
+                          p.empty()
+                              ? "reply holds no block"
+                              : "malformed block header '" + std::string(p.substr(0, 12)) + "'");
         hr = Fill(deadline);
     }
 }
@@ -210,7 +219,8 @@ HRESULT FormattedIO::ReadDefiniteBody(std::size_t length, BYTE* dst, std::size_t
     std::size_t done = have;
     BYTE scratch[4096];
     while (done < length) {
-        if (deadline.Expired()) return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout reading the block");
+        if (deadline.Expired())
+            return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout reading the block");
         const bool into_dst = result->stored < room;
         BYTE* where = into_dst ? dst + result->stored : scratch;
         std::size_t want = into_dst ? std::min(length - done, room - result->stored)
@@ -245,7 +255,9 @@ HRESULT FormattedIO::ReadBlock(std::size_t elem, bool seek, bool flush, BlockTar
         hr = ReadRest(deadline, &data);
         if (FAILED(hr)) return hr;
         if (!data.empty() && data.back() == '\n') data.pop_back();
-        if (data.size() % elem) return Report(E_VISA_INVALID_FORMAT, kFormattedIid, "block length is not a whole number of elements");
+        if (data.size() % elem)
+            return Report(E_VISA_INVALID_FORMAT, kFormattedIid,
+                          "block length is not a whole number of elements");
         hr = target.Place(data.size(), &dst, &room);
         if (FAILED(hr)) return hr;
         result->total = data.size();
@@ -268,7 +280,8 @@ HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_
                                    VARIANT* pData) {
     if (!pData) return E_POINTER;
     const VARTYPE vt = fmt::BinaryElementType(type);
-    if (vt == VT_EMPTY) return Report(E_INVALIDARG, kFormattedIid, "unknown binary type " + std::to_string(type));
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown binary type " + std::to_string(type));
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -279,7 +292,8 @@ HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_
             qn::com::SafeArray array;
             HRESULT Place(std::size_t bytes, BYTE** dst, std::size_t* room) override {
                 array = qn::com::SafeArray::Vector(vt, ULONG(bytes / elem));
-                if (!array) return Report(E_OUTOFMEMORY, kFormattedIid, "out of memory for the block");
+                if (!array)
+                    return Report(E_OUTOFMEMORY, kFormattedIid, "out of memory for the block");
                 *dst = array.data<BYTE>();
                 *room = bytes;
                 return S_OK;
@@ -288,10 +302,11 @@ HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_
         target.vt = vt;
         target.elem = elem;
         BlockResult r;
-        HRESULT hr = Settle(ReadBlock(elem, seekToBlock != VARIANT_FALSE,
-                                      flushToEND != VARIANT_FALSE, target, &r));
+        HRESULT hr = Settle(
+            ReadBlock(elem, seekToBlock != VARIANT_FALSE, flushToEND != VARIANT_FALSE, target, &r));
         if (FAILED(hr)) return hr;
-        if (elem > 1 && fmt::NeedsSwap(big_endian_)) fmt::SwapBytes(target.array.data<BYTE>(), r.stored, elem);
+        if (elem > 1 && fmt::NeedsSwap(big_endian_))
+            fmt::SwapBytes(target.array.data<BYTE>(), r.stored, elem);
         VariantClear(pData);
         pData->vt = VARTYPE(VT_ARRAY | vt);
         pData->parray = target.array.Detach();
@@ -322,8 +337,8 @@ HRESULT FormattedIO::ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG
         target.buf = static_cast<BYTE*>(buf);
         target.room = std::size_t(maxCount) * elem;
         BlockResult r;
-        HRESULT hr = Settle(ReadBlock(elem, seekToBlock != VARIANT_FALSE,
-                                      flushToEND != VARIANT_FALSE, target, &r));
+        HRESULT hr = Settle(
+            ReadBlock(elem, seekToBlock != VARIANT_FALSE, flushToEND != VARIANT_FALSE, target, &r));
         if (elem > 1 && fmt::NeedsSwap(big_endian_)) fmt::SwapBytes(buf, r.stored, elem);
         *pActualCount = LONG(r.stored / elem);
         if (FAILED(hr)) return hr;
@@ -369,7 +384,8 @@ HRESULT FormattedIO::ReadNumber(LONG type, VARIANT_BOOL flushToEND, VARIANT* pDa
 HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
     if (!pData) return E_POINTER;
     const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY) return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -393,7 +409,9 @@ HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
             qn::com::Variant v;
             std::string error;
             hr = fmt::FieldToVariant(fields[i], vt, &v, &error);
-            if (FAILED(hr)) return Report(hr, kFormattedIid, "list element " + std::to_string(i) + ": " + error);
+            if (FAILED(hr))
+                return Report(hr, kFormattedIid,
+                              "list element " + std::to_string(i) + ": " + error);
             hr = fmt::StoreElement(v, vt, array.data<BYTE>() + i * elem);
             if (FAILED(hr)) return hr;
         }

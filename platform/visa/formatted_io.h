@@ -25,7 +25,7 @@ namespace qn::visa {
 
 class FormattedIO final
     : public qn::com::ComObject<FormattedIO, IFormattedIO488, IFormattedIO488Direct> {
-public:
+  public:
     FormattedIO();
 
     // IFormattedIO488
@@ -53,14 +53,14 @@ public:
     HRESULT get_MaxBlockBytes(LONGLONG* pVal) override;
     HRESULT put_MaxBlockBytes(LONGLONG val) override;
 
-private:
+  private:
     // Where a block's data goes once its size is known: *dst with room for
     // *room bytes (bytes beyond the room are read and dropped).
     class BlockTarget {
-    public:
+      public:
         virtual HRESULT Place(std::size_t bytes, BYTE** dst, std::size_t* room) = 0;
 
-    protected:
+      protected:
         ~BlockTarget() = default;
     };
     struct BlockResult {

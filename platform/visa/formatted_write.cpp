@@ -46,7 +46,8 @@ HRESULT FormattedIO::WriteString(BSTR data, VARIANT_BOOL flushAndEND) {
 
 HRESULT FormattedIO::WriteNumber(VARIANT data, LONG type, VARIANT_BOOL flushAndEND) {
     const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY) return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -64,7 +65,8 @@ HRESULT FormattedIO::WriteList(VARIANT* data, LONG type, BSTR listSeparator,
                                VARIANT_BOOL flushAndEND) {
     if (!data) return E_POINTER;
     const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY) return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -86,10 +88,13 @@ HRESULT FormattedIO::WriteList(VARIANT* data, LONG type, BSTR listSeparator,
                     element.vt = sa->vt;
                     std::memcpy(&element.llVal, static_cast<BYTE*>(sa->pvData) + i * size, size);
                 } else {
-                    return Report(DISP_E_TYPEMISMATCH, kFormattedIid, "unsupported array element type");
+                    return Report(DISP_E_TYPEMISMATCH, kFormattedIid,
+                                  "unsupported array element type");
                 }
                 hr = fmt::FormatValue(element, vt, &item, &error);
-                if (FAILED(hr)) return Report(hr, kFormattedIid, "list element " + std::to_string(i) + ": " + error);
+                if (FAILED(hr))
+                    return Report(hr, kFormattedIid,
+                                  "list element " + std::to_string(i) + ": " + error);
                 if (i) text += sep;
                 text += item;
             }
@@ -107,7 +112,8 @@ HRESULT FormattedIO::WriteList(VARIANT* data, LONG type, BSTR listSeparator,
 // needed, else swapped through the write buffer in pieces.
 HRESULT FormattedIO::SendBlockData(const BYTE* data, std::size_t bytes, std::size_t elem) {
     if (elem == 1 || !fmt::NeedsSwap(big_endian_)) {
-        if (wbuf_.size() + bytes < wsize_) return Append({reinterpret_cast<const char*>(data), bytes});
+        if (wbuf_.size() + bytes < wsize_)
+            return Append({reinterpret_cast<const char*>(data), bytes});
         HRESULT hr = SendBuffer();
         if (FAILED(hr)) return hr;
         return direct_->WriteFrom(data, LONG(bytes), nullptr);
@@ -128,13 +134,15 @@ HRESULT FormattedIO::WriteIEEEBlock(BSTR command, VARIANT data, VARIANT_BOOL flu
     SAFEARRAY* sa = ArrayOf(data);
     const std::size_t elem = sa ? fmt::PlainElementSize(sa->vt) : 0;
     if (elem == 0)
-        return Report(DISP_E_TYPEMISMATCH, kFormattedIid, "block data must be an array of numbers or bytes");
+        return Report(DISP_E_TYPEMISMATCH, kFormattedIid,
+                      "block data must be an array of numbers or bytes");
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
         const std::size_t bytes = std::size_t(qn::com::SafeArrayCount(sa)) * elem;
         const std::string length = std::to_string(bytes);
-        if (length.size() > 9) return Report(E_INVALIDARG, kFormattedIid, "block too long for a header");
+        if (length.size() > 9)
+            return Report(E_INVALIDARG, kFormattedIid, "block too long for a header");
         std::string head = qn::com::BstrToUtf8(command);
         head += '#';
         head += char('0' + length.size());

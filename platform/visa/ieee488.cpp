@@ -8,9 +8,13 @@
 namespace qn::visa {
 namespace {
 
-bool IsDigit(char c) { return c >= '0' && c <= '9'; }
+bool IsDigit(char c) {
+    return c >= '0' && c <= '9';
+}
 
-char Upper(char c) { return c >= 'a' && c <= 'z' ? char(c - 32) : c; }
+char Upper(char c) {
+    return c >= 'a' && c <= 'z' ? char(c - 32) : c;
+}
 
 bool IStartsWith(std::string_view s, std::string_view word) {
     if (s.size() < word.size()) return false;
@@ -36,7 +40,8 @@ NumberParse NonDecimal(std::string_view t, bool at_end, double* value, std::size
     for (; i < t.size(); ++i) {
         int d = DigitIn(t[i], base);
         if (d < 0) break;
-        if (v > (std::numeric_limits<std::uint64_t>::max() - std::uint64_t(d)) / std::uint64_t(base))
+        if (v >
+            (std::numeric_limits<std::uint64_t>::max() - std::uint64_t(d)) / std::uint64_t(base))
             return NumberParse::kNoNumber;
         v = v * std::uint64_t(base) + std::uint64_t(d);
     }
@@ -134,8 +139,10 @@ NumberParse ParseNumber(std::string_view t, bool at_end, double* value, std::siz
         std::size_t e = i + 1;
         if (e < t.size() && (t[e] == '+' || t[e] == '-')) ++e;
         std::size_t d = Digits(t, e);
-        if (d > e) end = d;                                        // complete exponent
-        else if (d == t.size() && !at_end) return NumberParse::kNeedMore;  // "1E", "1E+"
+        if (d > e)
+            end = d;  // complete exponent
+        else if (d == t.size() && !at_end)
+            return NumberParse::kNeedMore;  // "1E", "1E+"
     }
     if (end == t.size() && !at_end) return NumberParse::kNeedMore;
 
@@ -146,8 +153,8 @@ NumberParse ParseNumber(std::string_view t, bool at_end, double* value, std::siz
     if (ec == std::errc::result_out_of_range) {
         // Overflow or underflow: decide by the exponent's sign.
         std::size_t epos = digits.find_first_of("eE");
-        bool tiny = epos != std::string_view::npos && epos + 1 < digits.size() &&
-                    digits[epos + 1] == '-';
+        bool tiny =
+            epos != std::string_view::npos && epos + 1 < digits.size() && digits[epos + 1] == '-';
         v = tiny ? 0.0 : std::numeric_limits<double>::infinity();
     } else if (ec != std::errc() || ptr != digits.data() + digits.size()) {
         return NumberParse::kNoNumber;

@@ -27,21 +27,26 @@ constexpr TransportKind kTransports[] = {
 };
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {
-public:
+  public:
     HRESULT Open(BSTR resourceName, LONG /*accessMode*/, LONG openTimeout, BSTR /*optionString*/,
                  IVisaSession** ppSession) override {
         if (!ppSession) return E_POINTER;
         *ppSession = nullptr;
-        return Guard(kManagerIid, [&] { return OpenSession(qn::com::BstrToUtf8(resourceName), openTimeout, ppSession); });
+        return Guard(kManagerIid, [&] {
+            return OpenSession(qn::com::BstrToUtf8(resourceName), openTimeout, ppSession);
+        });
     }
 
-private:
+  private:
     static HRESULT OpenSession(const std::string& text, LONG openTimeout,
                                IVisaSession** ppSession) {
         std::string error;
         std::optional<ResourceName> name = ParseResourceName(text, &error);
-        if (!name) return Report(E_VISA_INVALID_RESOURCE_NAME, kManagerIid, "invalid resource name " + error);
-        if (openTimeout <= 0 && openTimeout != kTimeoutInfinite) openTimeout = kDefaultOpenTimeoutMs;
+        if (!name)
+            return Report(E_VISA_INVALID_RESOURCE_NAME, kManagerIid,
+                          "invalid resource name " + error);
+        if (openTimeout <= 0 && openTimeout != kTimeoutInfinite)
+            openTimeout = kDefaultOpenTimeoutMs;
         for (const TransportKind& kind : kTransports) {
             if (kind.interface_type != name->interface_type ||
                 kind.resource_class != name->resource_class)
@@ -49,8 +54,8 @@ private:
             std::unique_ptr<Transport> transport;
             HRESULT hr = kind.open(*name, openTimeout, &transport, &error);
             if (FAILED(hr)) return Report(hr, kManagerIid, text + ": " + error);
-            auto session = qn::com::MakeComObject<MessageSession>(std::move(*name),
-                                                                  std::move(transport));
+            auto session =
+                qn::com::MakeComObject<MessageSession>(std::move(*name), std::move(transport));
             return session->QueryInterface(iid_of<IVisaSession>,
                                            reinterpret_cast<void**>(ppSession));
         }

@@ -155,8 +155,7 @@ bool ParseUsb(std::string_view board, Fields f, ResourceName& r, std::string& er
     std::string_view cls = PopClass(f);
     auto vid = f.size() >= 4 ? Number(f[1], 0xffff, true) : std::nullopt;
     auto pid = f.size() >= 4 ? Number(f[2], 0xffff, true) : std::nullopt;
-    if (cls == "SOCKET" || f.size() < 4 || f.size() > 5 || !vid || !pid ||
-        !PrintableField(f[3])) {
+    if (cls == "SOCKET" || f.size() < 4 || f.size() > 5 || !vid || !pid || !PrintableField(f[3])) {
         err = "USB resource is USB<n>::vid::pid::serial[::interface][::INSTR]";
         return false;
     }
@@ -248,8 +247,8 @@ std::string ResourceName::Canonical() const {
         case 4:
             return (device_path.empty() ? "ASRL" + b : "ASRL" + device_path) + "::INSTR";
         case 7:
-            return "USB" + b + "::" + Hex4(vendor_id) + "::" + Hex4(product_id) + "::" +
-                   serial_number +
+            return "USB" + b + "::" + Hex4(vendor_id) + "::" + Hex4(product_id) +
+                   "::" + serial_number +
                    (usb_interface >= 0 ? "::" + std::to_string(usb_interface) : "") + "::INSTR";
         case 1:
             return "GPIB" + b + "::" + std::to_string(primary_address) +

@@ -24,9 +24,9 @@ struct ResourceName {
     unsigned board = 0;
     std::string resource_class;  // "INSTR" or "SOCKET"
     // TCPIP
-    std::string host;           // without IPv6 brackets
-    std::uint16_t port = 0;     // SOCKET only
-    std::string device_name;    // INSTR only ("inst0", "hislip0", ...)
+    std::string host;         // without IPv6 brackets
+    std::uint16_t port = 0;   // SOCKET only
+    std::string device_name;  // INSTR only ("inst0", "hislip0", ...)
     // ASRL
     std::string device_path;  // "/dev/ttyUSB0" for ASRL/dev/...; empty for ASRLn
     // USB

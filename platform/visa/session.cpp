@@ -13,7 +13,9 @@ constexpr GUID kIidMessage = iid_of<IMessage>;
 // what the reply needs.
 constexpr std::size_t kStringChunk = 64 * 1024;
 
-VARIANT_BOOL Bool(bool b) { return b ? VARIANT_TRUE : VARIANT_FALSE; }
+VARIANT_BOOL Bool(bool b) {
+    return b ? VARIANT_TRUE : VARIANT_FALSE;
+}
 
 }  // namespace
 
@@ -141,8 +143,8 @@ HRESULT MessageSession::ReadString(LONG count, BSTR* pBuffer) {
             std::size_t old = text.size();
             text.resize(old + chunk);
             ReadResult r;
-            HRESULT hr = ReadLocked(reinterpret_cast<BYTE*>(&text[old]), chunk, kReadDefault,
-                                    deadline, &r);
+            HRESULT hr =
+                ReadLocked(reinterpret_cast<BYTE*>(&text[old]), chunk, kReadDefault, deadline, &r);
             if (FAILED(hr)) return hr;
             text.resize(old + r.bytes);
             left -= r.bytes;
@@ -158,8 +160,8 @@ HRESULT MessageSession::WriteBytes(const BYTE* data, std::size_t size, LONG* pRe
     if (!transport_) return Closed();
     std::string error;
     std::size_t written = 0;
-    HRESULT hr = transport_->Write(data, size, send_end_, Deadline::FromTimeout(timeout_),
-                                   &written, &error);
+    HRESULT hr =
+        transport_->Write(data, size, send_end_, Deadline::FromTimeout(timeout_), &written, &error);
     if (pRetCount) *pRetCount = LONG(written);
     return FAILED(hr) ? Report(hr, kIidMessage, error) : hr;
 }
@@ -228,7 +230,8 @@ HRESULT MessageSession::ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActu
     return Guard(kIidMessage, [&] {
         std::lock_guard<std::mutex> lock(io_);
         ReadResult r;
-        HRESULT hr = ReadLocked(buf, std::size_t(count), flags, Deadline::FromTimeout(timeout_), &r);
+        HRESULT hr =
+            ReadLocked(buf, std::size_t(count), flags, Deadline::FromTimeout(timeout_), &r);
         *pActual = LONG(r.bytes);
         if (pEnd) *pEnd = r.end;
         return hr;

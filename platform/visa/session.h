@@ -16,7 +16,7 @@ namespace qn::visa {
 class MessageSession final
     : public qn::com::ComObject<MessageSession, IMessage, qn::com::As<IVisaSession, IMessage>,
                                 IMessageDirect> {
-public:
+  public:
     MessageSession(ResourceName name, std::unique_ptr<Transport> transport);
 
     // IVisaSession
@@ -46,7 +46,7 @@ public:
     HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) override;
     HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) override;
 
-private:
+  private:
     // One transport read with the session's settings and deadline; the
     // caller holds io_.
     HRESULT ReadLocked(BYTE* buf, std::size_t count, DWORD flags, const Deadline& deadline,

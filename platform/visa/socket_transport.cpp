@@ -43,7 +43,9 @@ constexpr std::size_t kDirectReadMin = 4096;
 // DiscardInput stops after this much, should the peer never pause.
 constexpr std::size_t kMaxDiscard = 256u * 1024 * 1024;
 
-std::string ErrnoText(int err) { return std::strerror(err); }
+std::string ErrnoText(int err) {
+    return std::strerror(err);
+}
 
 struct AddrInfoFree {
     void operator()(addrinfo* p) const {
@@ -63,8 +65,8 @@ struct ResolveState {
     AddrList list;
 };
 
-int Resolve(const std::string& host, std::uint16_t port, const Deadline& deadline,
-            AddrList* out, std::string* error) {
+int Resolve(const std::string& host, std::uint16_t port, const Deadline& deadline, AddrList* out,
+            std::string* error) {
     addrinfo hints{};
     hints.ai_family = AF_UNSPEC;
     hints.ai_socktype = SOCK_STREAM;
@@ -107,7 +109,7 @@ int Resolve(const std::string& host, std::uint16_t port, const Deadline& deadlin
 }
 
 class FdHolder {
-public:
+  public:
     explicit FdHolder(int fd = -1) : fd_(fd) {}
     FdHolder(const FdHolder&) = delete;
     FdHolder& operator=(const FdHolder&) = delete;
@@ -119,15 +121,15 @@ public:
         fd_ = fd;
     }
 
-private:
+  private:
     int fd_;
 };
 
 // Non-blocking connect to one address; 0 or an errno value (ETIMEDOUT when
 // the deadline passed).
 int ConnectOne(const addrinfo* a, const Deadline& deadline, FdHolder* fd) {
-    fd->reset(::socket(a->ai_family, a->ai_socktype | SOCK_NONBLOCK | SOCK_CLOEXEC,
-                       a->ai_protocol));
+    fd->reset(
+        ::socket(a->ai_family, a->ai_socktype | SOCK_NONBLOCK | SOCK_CLOEXEC, a->ai_protocol));
     if (fd->get() < 0) return errno;
     if (::connect(fd->get(), a->ai_addr, a->ai_addrlen) == 0) return 0;
     if (errno != EINPROGRESS) return errno;
@@ -146,8 +148,9 @@ int ConnectOne(const addrinfo* a, const Deadline& deadline, FdHolder* fd) {
 }
 
 class SocketTransport final : public Transport {
-public:
-    SocketTransport(int fd, std::string peer) : fd_(fd), peer_(std::move(peer)), buf_(kBufferSize) {}
+  public:
+    SocketTransport(int fd, std::string peer)
+        : fd_(fd), peer_(std::move(peer)), buf_(kBufferSize) {}
     ~SocketTransport() override { Close(); }
 
     HRESULT Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
@@ -162,7 +165,7 @@ public:
     void DiscardInput() override;
     void Close() override { fd_.reset(); }
 
-private:
+  private:
     // Copies buffered bytes into the request; true when that ends the read.
     bool TakeBuffered(const ReadRequest& req, ReadResult* r);
     // Receives at least one byte into dst (at most n); waits until deadline.
@@ -238,8 +241,8 @@ HRESULT SocketTransport::RecvSome(BYTE* dst, std::size_t n, const Deadline& dead
     }
 }
 
-HRESULT SocketTransport::Read(const ReadRequest& req, const Deadline& deadline,
-                              ReadResult* result, std::string* error) {
+HRESULT SocketTransport::Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
+                              std::string* error) {
     *result = ReadResult{};
     if (fd_.get() < 0) {
         *error = "session closed";
@@ -274,8 +277,7 @@ HRESULT SocketTransport::Read(const ReadRequest& req, const Deadline& deadline,
 }
 
 HRESULT SocketTransport::Write(const BYTE* data, std::size_t size, bool /*send_end*/,
-                               const Deadline& deadline, std::size_t* written,
-                               std::string* error) {
+                               const Deadline& deadline, std::size_t* written, std::string* error) {
     *written = 0;
     if (fd_.get() < 0) {
         *error = "session closed";
@@ -340,8 +342,8 @@ HRESULT SocketTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
     while (!text.empty() && (text.front() == ' ' || text.front() == '\t')) text.remove_prefix(1);
     double v = 0;
     std::size_t used = 0;
-    if (r.end != kReadEndTermChar ||
-        ParseNumber(text, true, &v, &used) != NumberParse::kOk || !(v >= 0 && v <= 255)) {
+    if (r.end != kReadEndTermChar || ParseNumber(text, true, &v, &used) != NumberParse::kOk ||
+        !(v >= 0 && v <= 255)) {
         *error = "unreadable status byte reply '" + std::string(text.substr(0, 32)) + "'";
         return Failed(E_VISA_INVALID_FORMAT);
     }
@@ -356,7 +358,8 @@ HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
     const Deadline deadline = Deadline::FromTimeout(open_timeout_ms);
     const std::string peer = name.host + ":" + std::to_string(name.port);
     AddrList list;
-    if (Resolve(name.host, name.port, deadline, &list, error) != 0) return E_VISA_RESOURCE_NOT_FOUND;
+    if (Resolve(name.host, name.port, deadline, &list, error) != 0)
+        return E_VISA_RESOURCE_NOT_FOUND;
     int err = ENOENT;
     for (const addrinfo* a = list.get(); a; a = a->ai_next) {
         FdHolder fd;

@@ -30,7 +30,7 @@ struct ReadResult {
 };
 
 class Transport {
-public:
+  public:
     virtual ~Transport() = default;
 
     virtual HRESULT Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,

@@ -84,10 +84,10 @@ enum BufferMask : LONG { IO_IN_BUF = 16, IO_OUT_BUF = 32 };
 
 // Why a read stopped (IMessageDirect::ReadInto).
 enum ReadEnd : LONG {
-    kReadEndCount = 0,     // the requested count was reached
-    kReadEndTermChar = 1,  // the termination character was read (and is in the data)
-    kReadEndEnd = 2,       // the device marked the end of its message (END)
-    kReadEndAvailable = 3, // kReadAvailable: no more data was waiting
+    kReadEndCount = 0,      // the requested count was reached
+    kReadEndTermChar = 1,   // the termination character was read (and is in the data)
+    kReadEndEnd = 2,        // the device marked the end of its message (END)
+    kReadEndAvailable = 3,  // kReadAvailable: no more data was waiting
 };
 
 // IMessageDirect::ReadInto flags.
@@ -167,8 +167,7 @@ struct IMessageDirect : IUnknown {
     // Reads at most count bytes into buf (ReadFlags in flags). *pActual is
     // set to the bytes stored, also when the read fails (e.g. on timeout);
     // *pEnd (may be null) tells why the read stopped.
-    virtual HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual,
-                             LONG* pEnd) = 0;
+    virtual HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) = 0;
     // Writes count bytes; *pActual (may be null) receives the count written.
     virtual HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) = 0;
 };

@@ -96,21 +96,21 @@ TEST(FormattedIOTest, WordBlocksHonourByteOrderAndDirectBuffers) {
     // seekToBlock skips what precedes the '#'.
     SHORT words[4] = {};
     LONG actual = 0;
-    ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_TRUE,
-                                          VARIANT_TRUE),
-              S_OK);
+    ASSERT_EQ(
+        b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_TRUE, VARIANT_TRUE),
+        S_OK);
     EXPECT_EQ(actual, 2);
     EXPECT_EQ(words[1], -2);
     // Too little room: the first elements are kept, the rest read and dropped.
-    EXPECT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 3, &actual, VARIANT_FALSE,
-                                          VARIANT_TRUE),
-              E_VISA_USER_BUFFER);
+    EXPECT_EQ(
+        b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 3, &actual, VARIANT_FALSE, VARIANT_TRUE),
+        E_VISA_USER_BUFFER);
     EXPECT_EQ(actual, 3);
     EXPECT_EQ(words[2], 0x0102);
     // An indefinite block runs to the message end.
-    ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_FALSE,
-                                          VARIANT_TRUE),
-              S_OK);
+    ASSERT_EQ(
+        b.direct->ReadIEEEBlockInto(BinaryType_I2, words, 4, &actual, VARIANT_FALSE, VARIANT_TRUE),
+        S_OK);
     EXPECT_EQ(actual, 2);
     EXPECT_EQ(words[0], 0x0102);
     Release(b);
@@ -127,8 +127,8 @@ TEST(FormattedIOTest, BadBlockHeadersFailAndTheSessionRecovers) {
     const Case kCases[] = {
         {"#9999999999" + std::string(50, 'x') + "\n", E_VISA_INVALID_FORMAT},  // beyond the bound
         {"#A123\n", E_VISA_INVALID_FORMAT},
-        {"#5123\n", E_VISA_INVALID_FORMAT},  // message ends inside the header
-        {"12345\n", E_VISA_INVALID_FORMAT},  // no block at all
+        {"#5123\n", E_VISA_INVALID_FORMAT},    // message ends inside the header
+        {"12345\n", E_VISA_INVALID_FORMAT},    // no block at all
         {"#13abcd\n", E_VISA_INVALID_FORMAT},  // 3 bytes for 2-byte elements
     };
     LoopbackPeer peer;
@@ -218,8 +218,7 @@ TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
     ASSERT_EQ(b.io->WriteString(Bstr(":CHAN1:OFFS ").get(), VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteNumber(Variant::Double(-2.6), ASCIIType_I4, VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
-    EXPECT_EQ(b.io->WriteNumber(Variant::Double(1e6), ASCIIType_I2, VARIANT_TRUE),
-              DISP_E_OVERFLOW);
+    EXPECT_EQ(b.io->WriteNumber(Variant::Double(1e6), ASCIIType_I2, VARIANT_TRUE), DISP_E_OVERFLOW);
 
     Variant list;
     list.vt = VT_ARRAY | VT_R8;

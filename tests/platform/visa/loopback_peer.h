@@ -21,7 +21,7 @@
 namespace qn::visa::test {
 
 class LoopbackPeer {
-public:
+  public:
     LoopbackPeer() {
         listen_fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
         sockaddr_in a{};
@@ -66,7 +66,7 @@ public:
         return failure_;
     }
 
-private:
+  private:
     struct Step {
         enum Kind { kExpect, kSend, kPause, kNotify, kDrop } kind;
         std::string data;
@@ -114,7 +114,8 @@ private:
                 case Step::kSend: {
                     std::size_t chunk = s.chunk ? s.chunk : s.data.size();
                     for (std::size_t off = 0; off < s.data.size(); off += chunk) {
-                        if (off && s.ms) std::this_thread::sleep_for(std::chrono::milliseconds(s.ms));
+                        if (off && s.ms)
+                            std::this_thread::sleep_for(std::chrono::milliseconds(s.ms));
                         std::size_t n = std::min(chunk, s.data.size() - off);
                         if (::send(fd, s.data.data() + off, n, MSG_NOSIGNAL) != ssize_t(n)) break;
                     }

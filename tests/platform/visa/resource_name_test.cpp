@@ -33,7 +33,8 @@ constexpr Good kGood[] = {
     {"ASRL/dev/ttyUSB0::INSTR", 4, 0, "INSTR", "", 0, "", "ASRL/dev/ttyUSB0::INSTR"},
     {"USB0::0x0957::0x1796::MY123::INSTR", 7, 0, "INSTR", "", 0, "",
      "USB0::0x0957::0x1796::MY123::INSTR"},
-    {"usb::2391::6038::MY123::0", 7, 0, "INSTR", "", 0, "", "USB0::0x0957::0x1796::MY123::0::INSTR"},
+    {"usb::2391::6038::MY123::0", 7, 0, "INSTR", "", 0, "",
+     "USB0::0x0957::0x1796::MY123::0::INSTR"},
     {"GPIB0::7::INSTR", 1, 0, "INSTR", "", 0, "", "GPIB0::7::INSTR"},
     {"GPIB1::7::30", 1, 1, "INSTR", "", 0, "", "GPIB1::7::30::INSTR"},
 };
