@@ -73,17 +73,18 @@ TEST_P(FeatureKeys, AnswerFromModelNameAndFamily) {
 
 INSTANTIATE_TEST_SUITE_P(
     Families, FeatureKeys,
-    ::testing::Values(
-        KeyCase{"QMS4104B", "4", "2", "1e9", "2.5e7", R"("FIFT,PROT,PSK")", R"("EXT,ZONE")",
-                R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")", R"("DDIG,MEAS,FFT")", "1", "1"},
-        KeyCase{"QDS4032A", "2", "0", "3.5e8", "2.5e7", R"("FIFT,PROT,PSK")", R"("EXT")",
-                R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")", R"("DDIG,MEAS")", "1", "1"},
-        KeyCase{"QMS3052A", "2", "2", "5e8", "2e7", R"("FIFT,PROT,PSK")", R"("EXT")",
-                R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")", R"("DDIG,MEAS")", "1", "1"},
-        KeyCase{"QDS3014L", "4", "0", "1e8", "2e7", R"("PSK")", R"("")", R"("EDGE,GLIT,PATT,TV")",
-                R"("DDIG,MEAS")", "1", "0"},
-        KeyCase{"QDS2054A", "4", "0", "5e8", "2e7", R"("GCO,ALEV,PSK")", R"("EXT")",
-                R"("EDGE,GLIT,PATT,TV")", R"("MEAS")", "1", "0"}),
+    ::testing::Values(KeyCase{"QMS4104B", "4", "2", "1e9", "2.5e7", R"("FIFT,PROT,PSK")",
+                              R"("EXT,ZONE")", R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")",
+                              R"("DDIG,MEAS,FFT")", "1", "1"},
+                      KeyCase{"QDS4032A", "2", "0", "3.5e8", "2.5e7", R"("FIFT,PROT,PSK")",
+                              R"("EXT")", R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")", R"("DDIG,MEAS")", "1",
+                              "1"},
+                      KeyCase{"QMS3052A", "2", "2", "5e8", "2e7", R"("FIFT,PROT,PSK")", R"("EXT")",
+                              R"("EDGE,GLIT,PATT,TV,RUNT,SEQ")", R"("DDIG,MEAS")", "1", "1"},
+                      KeyCase{"QDS3014L", "4", "0", "1e8", "2e7", R"("PSK")", R"("")",
+                              R"("EDGE,GLIT,PATT,TV")", R"("DDIG,MEAS")", "1", "0"},
+                      KeyCase{"QDS2054A", "4", "0", "5e8", "2e7", R"("GCO,ALEV,PSK")", R"("EXT")",
+                              R"("EDGE,GLIT,PATT,TV")", R"("MEAS")", "1", "0"}),
     [](const ::testing::TestParamInfo<KeyCase>& p) { return std::string(p.param.model); });
 
 TEST(EmulatorModels, DisplayLabelAndWaveformFeatureValues) {
@@ -127,8 +128,8 @@ TEST(EmulatorModels, EarlyModelsDeriveChannelsPodsAndBandwidthFromTheName) {
         bool ext_trigger;
     };
     const Case cases[] = {
-        {"73122A", 2, 0, 1e8, false, true},  {"73124A", 4, 0, 1e8, false, false},
-        {"73121D", 2, 2, 6e7, false, true},  {"73141D", 2, 2, 3e8, true, true},
+        {"73122A", 2, 0, 1e8, false, true}, {"73124A", 4, 0, 1e8, false, false},
+        {"73121D", 2, 2, 6e7, false, true}, {"73141D", 2, 2, 3e8, true, true},
         {"73142A", 2, 0, 5e8, true, true},
     };
     for (const Case& tc : cases) {
