@@ -1,0 +1,106 @@
+// Activation of the driver the way a client program does it: this test links
+// only the platform layer and finds the driver through the registry store.
+// The module is opened with dlopen just to call its registration entry points.
+#include "platform/com/activation.h"
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <filesystem>
+#include <string>
+
+#include "IviDriver.h"
+#include "Quorlen731XXIds.h"
+
+namespace {
+
+// Calls one of the driver module's parameterless entry points.
+HRESULT CallModule(const char* entry) {
+    void* module = ::dlopen(QN_DRIVER_MODULE_PATH, RTLD_NOW | RTLD_LOCAL);
+    if (!module) {
+        ADD_FAILURE() << ::dlerror();
+        return E_FAIL;
+    }
+    auto fn = reinterpret_cast<HRESULT (*)()>(::dlsym(module, entry));
+    HRESULT hr = fn ? fn() : E_FAIL;
+    ::dlclose(module);
+    return hr;
+}
+
+class DriverActivation : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        char dir[] = "/tmp/qn-comact-XXXXXX";
+        ASSERT_NE(::mkdtemp(dir), nullptr);
+        dir_ = dir;
+        ::setenv("QN_REGISTRY_FILE", (dir_ + "/registry").c_str(), 1);
+        ::setenv("IVI_CONFIG_STORE", (dir_ + "/store.xml").c_str(), 1);  // absent
+        ASSERT_EQ(CallModule("DllRegisterServer"), S_OK);
+    }
+    void TearDown() override {
+        EXPECT_EQ(CallModule("DllUnregisterServer"), S_OK);
+        CoFreeUnusedLibraries();
+        ::unsetenv("QN_REGISTRY_FILE");
+        ::unsetenv("IVI_CONFIG_STORE");
+        std::filesystem::remove_all(dir_);
+    }
+    std::string dir_;
+};
+
+// Opens a simulated session, checks the identity and closes it again.
+void UseSimulatedSession(IIviDriver* driver) {
+    qn::com::Bstr resource(""), options("Simulate=true");
+    ASSERT_EQ(driver->Initialize(resource.get(), VARIANT_FALSE, VARIANT_FALSE, options.get()),
+              S_OK);
+    ComPtr<IIviDriverIdentity> identity;
+    ASSERT_EQ(driver->QueryInterface(iid_of<IIviDriverIdentity>, identity.OutVoid()), S_OK);
+    qn::com::Bstr model, identifier;
+    EXPECT_EQ(identity->get_InstrumentModel(model.Out()), S_OK);
+    EXPECT_EQ(model.utf8(), "QDS4032A");
+    EXPECT_EQ(identity->get_Identifier(identifier.Out()), S_OK);
+    EXPECT_EQ(identifier.utf8(), "Quorlen731XX");
+    EXPECT_EQ(driver->Close(), S_OK);
+}
+
+TEST_F(DriverActivation, CreatesTheDriverByProgIdAndByClsid) {
+    for (const char16_t* progid : {u"Quorlen731XX.Quorlen731XX", u"Quorlen731XX.Quorlen731XX.1"}) {
+        CLSID clsid = GUID_NULL;
+        EXPECT_EQ(CLSIDFromProgID(progid, &clsid), S_OK);
+        EXPECT_EQ(clsid, CLSID_Quorlen731XX);
+    }
+    CLSID clsid = GUID_NULL;
+    ASSERT_EQ(CLSIDFromProgID(u"Quorlen731XX.Quorlen731XX", &clsid), S_OK);
+    ComPtr<IIviDriver> driver;
+    ASSERT_EQ(CoCreateInstance(clsid, nullptr, CLSCTX_INPROC_SERVER, iid_of<IIviDriver>,
+                               driver.OutVoid()),
+              S_OK);
+    UseSimulatedSession(driver.get());
+    CoFreeUnusedLibraries();  // an object is alive: the module stays
+    VARIANT_BOOL initialized = VARIANT_TRUE;
+    EXPECT_EQ(driver->get_Initialized(&initialized), S_OK);
+    EXPECT_EQ(initialized, VARIANT_FALSE);
+    driver.reset();
+    CoFreeUnusedLibraries();
+
+    // Again by CLSID, through IUnknown, once the unused module may have gone.
+    ComPtr<IUnknown> unknown;
+    ASSERT_EQ(CoCreateInstance(CLSID_Quorlen731XX, nullptr, CLSCTX_ALL, iid_of<IUnknown>,
+                               unknown.OutVoid()),
+              S_OK);
+    ASSERT_EQ(unknown.As(driver), S_OK);
+    unknown.reset();
+    UseSimulatedSession(driver.get());
+}
+
+TEST_F(DriverActivation, AnUnregisteredDriverIsNotFound) {
+    ASSERT_EQ(CallModule("DllUnregisterServer"), S_OK);
+    CLSID clsid = GUID_NULL;
+    EXPECT_EQ(CLSIDFromProgID(u"Quorlen731XX.Quorlen731XX", &clsid), CO_E_CLASSSTRING);
+    ComPtr<IIviDriver> driver;
+    EXPECT_EQ(CoCreateInstance(CLSID_Quorlen731XX, nullptr, CLSCTX_INPROC_SERVER,
+                               iid_of<IIviDriver>, driver.OutVoid()),
+              REGDB_E_CLASSNOTREG);
+}
+
+}  // namespace
