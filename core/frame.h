@@ -121,10 +121,12 @@ HRESULT OutOfMemory(CDriverNode& node);
 
 // Adds one in-value to the command arguments; a text holding a line feed or
 // a NUL is refused (it would end the message and start another command).
-template <class T>
+template <VARTYPE Vt, class T>
 HRESULT AddCommandArg(CDriverNode& node, const MemberInfo& m, std::size_t index, const T& v,
                       CommandArgList& list) {
-    if constexpr (std::is_same_v<T, BSTR>) {
+    if constexpr (Vt == VT_BOOL) {
+        list.Add(CommandArg(std::string_view(v != VARIANT_FALSE ? "1" : "0")));
+    } else if constexpr (std::is_same_v<T, BSTR>) {
         std::string text = com::BstrToUtf8(v);
         if (text.find('\n') != std::string::npos || text.find('\0') != std::string::npos)
             return node.Errors().InvalidValue(m.entry, m.params[index], std::string_view(text));
@@ -206,8 +208,10 @@ HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... ar
                 cmd_args.Add(CommandArg(static_cast<std::int64_t>(node.CommandNumber())));
             index = 0;
             auto add = [&](auto& a) {
-                if constexpr (IsIn<std::decay_t<decltype(a)>>::value)
-                    if (SUCCEEDED(hr)) hr = AddCommandArg(node, m, index, a.value, cmd_args);
+                using A = std::decay_t<decltype(a)>;
+                if constexpr (IsIn<A>::value)
+                    if (SUCCEEDED(hr))
+                        hr = AddCommandArg<A::kVt>(node, m, index, a.value, cmd_args);
                 ++index;
             };
             (add(args), ...);

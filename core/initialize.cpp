@@ -62,6 +62,9 @@ Quorlen731XX::~Quorlen731XX() {
         Core().session.initialized = false;
         EndSession();
     }
+    // The children hold the session core; dropping the lists breaks that
+    // cycle. Children a client still holds stay valid, not initialized.
+    Core().repcaps.Clear();
 }
 
 template <class T>
@@ -176,6 +179,11 @@ HRESULT Quorlen731XX::InitializeBody(BSTR resource, bool id_query, bool reset, B
         s.initialized = false;
         return hr;
     }
+    core.features = s.flags.simulate ? FixedFeatures(s.model) : DiscoverFeatures(*this, s.model);
+    CompleteMeasurements();
+    // A failed discovery query does not fail Initialize and leaves no error
+    // information behind.
+    SetErrorInfo(0, nullptr);
     return S_OK;
 }
 
@@ -189,7 +197,5 @@ HRESULT Quorlen731XX::CloseBody() {
     EndSession();
     return S_OK;
 }
-
-void Quorlen731XX::InvalidateAll() { Cache().InvalidateAll(); }
 
 }  // namespace qn

@@ -8,13 +8,49 @@
 #include "IviDriver.h"
 #include "core/frame.h"
 #include "core/node.h"
+#include "core/ties.h"
 
 namespace qn {
 
 class Quorlen731XX final
     : public com::ComObject<Quorlen731XX, IIviDriver, IIviDriverOperation, IIviDriverIdentity,
                             com::As<IIviComponentIdentity, IIviDriverIdentity>, IIviDriverUtility,
-                            ISupportErrorInfo>,
+                            ISupportErrorInfo,
+                            Tie<IQuorlen731XX, Quorlen731XX>,
+                            Tie<IQuorlen731XXAcquisition, Quorlen731XX>,
+                            Tie<IQuorlen731XXChannels, Quorlen731XX>,
+                            Tie<IQuorlen731XXConfigurableMeasurement, Quorlen731XX>,
+                            Tie<IQuorlen731XXCursors, Quorlen731XX>,
+                            Tie<IQuorlen731XXDigitalChannels, Quorlen731XX>,
+                            Tie<IQuorlen731XXDisplay, Quorlen731XX>,
+                            Tie<IQuorlen731XXExternal, Quorlen731XX>,
+                            Tie<IQuorlen731XXMeasurements, Quorlen731XX>,
+                            Tie<IQuorlen731XXMultiWaveformMeasurement, Quorlen731XX>,
+                            Tie<IQuorlen731XXReferenceLevel, Quorlen731XX>,
+                            Tie<IQuorlen731XXSetupMemory, Quorlen731XX>,
+                            Tie<IQuorlen731XXStatus, Quorlen731XX>,
+                            Tie<IQuorlen731XXSystem, Quorlen731XX>,
+                            Tie<IQuorlen731XXTrigger, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerAcLine, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerEdge, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerGlitch, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerPattern, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerRunt, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerState, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerTv, Quorlen731XX>,
+                            Tie<IQuorlen731XXTriggerWidth, Quorlen731XX>,
+                            Tie<IIviScope, Quorlen731XX>,
+                            Tie<IIviScopeAcquisition, Quorlen731XX>,
+                            Tie<IIviScopeChannels, Quorlen731XX>,
+                            Tie<IIviScopeMeasurements, Quorlen731XX>,
+                            Tie<IIviScopeReferenceLevel, Quorlen731XX>,
+                            Tie<IIviScopeTrigger, Quorlen731XX>,
+                            Tie<IIviScopeTriggerAcLine, Quorlen731XX>,
+                            Tie<IIviScopeTriggerEdge, Quorlen731XX>,
+                            Tie<IIviScopeTriggerGlitch, Quorlen731XX>,
+                            Tie<IIviScopeTriggerRunt, Quorlen731XX>,
+                            Tie<IIviScopeTriggerTv, Quorlen731XX>,
+                            Tie<IIviScopeTriggerWidth, Quorlen731XX>>,
       public CDriverNode {
 public:
     Quorlen731XX();
@@ -78,6 +114,56 @@ public:
     // ISupportErrorInfo
     HRESULT InterfaceSupportsErrorInfo(REFIID riid) override;
 
+    // Entries of the table-driven interfaces.
+#include "core/member_entries_begin.h"
+#include "members/IQuorlen731XX.def"
+#include "members/IQuorlen731XXAcquisition.def"
+#include "members/IQuorlen731XXChannels.def"
+#include "members/IQuorlen731XXConfigurableMeasurement.def"
+#include "members/IQuorlen731XXCursors.def"
+#include "members/IQuorlen731XXDigitalChannels.def"
+#include "members/IQuorlen731XXDisplay.def"
+#include "members/IQuorlen731XXExternal.def"
+#include "members/IQuorlen731XXMeasurements.def"
+#include "members/IQuorlen731XXMultiWaveformMeasurement.def"
+#include "members/IQuorlen731XXReferenceLevel.def"
+#include "members/IQuorlen731XXSetupMemory.def"
+#include "members/IQuorlen731XXStatus.def"
+#include "members/IQuorlen731XXSystem.def"
+#include "members/IQuorlen731XXTrigger.def"
+#include "members/IQuorlen731XXTriggerAcLine.def"
+#include "members/IQuorlen731XXTriggerEdge.def"
+#include "members/IQuorlen731XXTriggerGlitch.def"
+#include "members/IQuorlen731XXTriggerPattern.def"
+#include "members/IQuorlen731XXTriggerRunt.def"
+#include "members/IQuorlen731XXTriggerState.def"
+#include "members/IQuorlen731XXTriggerTv.def"
+#include "members/IQuorlen731XXTriggerWidth.def"
+#include "members/IIviScope.def"
+#include "members/IIviScopeAcquisition.def"
+#include "members/IIviScopeChannels.def"
+#include "members/IIviScopeMeasurements.def"
+#include "members/IIviScopeReferenceLevel.def"
+#include "members/IIviScopeTrigger.def"
+#include "members/IIviScopeTriggerAcLine.def"
+#include "members/IIviScopeTriggerEdge.def"
+#include "members/IIviScopeTriggerGlitch.def"
+#include "members/IIviScopeTriggerRunt.def"
+#include "members/IIviScopeTriggerTv.def"
+#include "members/IIviScopeTriggerWidth.def"
+#include "QnEndMembers.h"
+
+    // The instrument-specific counterparts of the class-compliant interfaces.
+    IQuorlen731XXAcquisition* Counterpart(IIviScopeAcquisition*) { return this; }
+    IQuorlen731XXReferenceLevel* Counterpart(IIviScopeReferenceLevel*) { return this; }
+    IQuorlen731XXTrigger* Counterpart(IIviScopeTrigger*) { return this; }
+    IQuorlen731XXTriggerAcLine* Counterpart(IIviScopeTriggerAcLine*) { return this; }
+    IQuorlen731XXTriggerEdge* Counterpart(IIviScopeTriggerEdge*) { return this; }
+    IQuorlen731XXTriggerGlitch* Counterpart(IIviScopeTriggerGlitch*) { return this; }
+    IQuorlen731XXTriggerRunt* Counterpart(IIviScopeTriggerRunt*) { return this; }
+    IQuorlen731XXTriggerTv* Counterpart(IIviScopeTriggerTv*) { return this; }
+    IQuorlen731XXTriggerWidth* Counterpart(IIviScopeTriggerWidth*) { return this; }
+
     // Model tests offered to every part of the driver; false when the
     // session is not initialized.
     bool IsModelSupported() const;
@@ -96,6 +182,8 @@ private:
     void CloseIo();
     HRESULT StartSession();
     void EndSession();
+    void CompleteMeasurements();
+    HRESULT BuildInstanceLists();
     HRESULT QueryIdentity();
     void InvalidateAll();
     // Applies one session-flag value through the rules of its setter

@@ -13,6 +13,8 @@
 #include <map>
 #include <string>
 
+#include "core/features.h"
+#include "core/repcap.h"
 #include "core/session.h"
 #include "platform/com/lock.h"
 #include "services/coercion_log.h"
@@ -29,6 +31,8 @@ public:
     // commands and replies.
     com::CriticalSection lock;
     DriverSession session;
+    FeatureRecord features;
+    RepCapLists repcaps;
     CCoercionLogManager coercions;
     CTraceOwner tracer;
     // The instrument session (closed while simulating). Tests may put a

@@ -37,9 +37,6 @@ HRESULT Quorlen731XX::OpenIo() {
 }
 
 void Quorlen731XX::CloseIo() { Core().io->Close(); }
-HRESULT Quorlen731XX::StartSession() { return S_OK; }
-void Quorlen731XX::EndSession() {}
-void Quorlen731XX::ResetChildren() {}
 
 // "*IDN?": manufacturer, model, serial number and firmware revision, each
 // trimmed; missing fields stay empty. The model replaces any earlier one.

@@ -105,9 +105,17 @@ template <class Itf, class Via = Itf>
 struct As {};
 
 namespace detail {
+// A plain interface entry, or a class that implements one interface and
+// names it as TiedInterface (served through that class).
 template <class E>
 struct EntryOf {
     using Itf = E;
+    using Via = E;
+};
+template <class E>
+    requires requires { typename E::TiedInterface; }
+struct EntryOf<E> {
+    using Itf = typename E::TiedInterface;
     using Via = E;
 };
 template <class I, class V>

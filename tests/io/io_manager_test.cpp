@@ -10,7 +10,10 @@
 namespace qn::test {
 namespace {
 
-constexpr const char* kIdn = "QUORLEN TECHNOLOGIES,QDS4032A,SN0001,2.10\n";
+// An early-family model: its channel counts and features need no queries,
+// so a session starts with just the two identity queries (instance lists,
+// then identification).
+constexpr const char* kIdn = "QUORLEN TECHNOLOGIES,73141D,SN0001,2.10\n";
 
 class IoManagerTest : public ::testing::Test {
 protected:
@@ -20,7 +23,7 @@ protected:
         auto p = std::make_unique<ScriptedProvider>();
         io_ = p.get();
         driver_->Core().io = std::move(p);
-        io_->Expect("*IDN?\n", kIdn);
+        io_->Expect("*IDN?\n", kIdn).Expect("*IDN?\n", kIdn);
     }
     void TearDown() override {
         if (!HasFailure()) {
@@ -45,12 +48,12 @@ TEST_F(IoManagerTest, InitializeIdentifiesTheInstrument) {
     Open();
     const InstrumentIdentity& id = driver_->Core().session.identity;
     EXPECT_EQ(id.manufacturer, "QUORLEN TECHNOLOGIES");
-    EXPECT_EQ(id.model, "QDS4032A");
+    EXPECT_EQ(id.model, "73141D");
     EXPECT_EQ(id.serial_number, "SN0001");
     EXPECT_EQ(id.firmware_revision, "2.10");
     com::Bstr model;
     driver_->get_InstrumentModel(model.Out());
-    EXPECT_EQ(model.utf8(), "QDS4032A");
+    EXPECT_EQ(model.utf8(), "73141D");
 }
 
 TEST_F(IoManagerTest, StatusCheckFailsOnErrorBitsOnly) {
