@@ -77,6 +77,9 @@ HRESULT Quorlen731XX::BuildInstanceLists() {
                 analog = 2;
             } else if (IsOneOf(model, {"73141A", "73141D", "73142A", "73142D"})) {
                 analog = 4;
+            } else if (IsEarlyFamilyModel(model)) {
+                // The other early models have no system-data queries either.
+                analog = FixedFeatures(model).analog_channel_count;
             } else {
                 hr = io.InstrQuery("SYST:DATA:VAL? \"COUN:CHAN\"", &n);
                 analog = n;
