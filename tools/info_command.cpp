@@ -1,9 +1,11 @@
-// qn731xx info: opens a session and prints its flags, the instrument identity
-// and the option tables.
+// qn731xx info: opens a session and prints the driver and instrument
+// identity, the session flags, the feature record, the collections, the
+// option tables and the instrument's error queue head (ErrorQuery).
 #include <cstdio>
 #include <string>
 #include <vector>
 
+#include "Quorlen731XX.h"
 #include "core/inherent.h"
 #include "core/session_core.h"
 #include "tools/commands.h"
@@ -30,11 +32,108 @@ constexpr FlagRow kFlags[] = {
     {"Simulate", "simulate", &SessionFlags::simulate},
 };
 
-std::string SettingText(const InitialSetting& v) {
-    if (const auto* s = std::get_if<std::string>(&v)) return *s;
-    if (const auto* l = std::get_if<long>(&v)) return std::to_string(*l);
-    if (const auto* d = std::get_if<double>(&v)) return std::to_string(*d);
-    return std::get<bool>(v) ? "true" : "false";
+// The feature record as rows: label, JSON key, and the value as text or number.
+struct FeatureRow {
+    const char* label;
+    const char* json;
+    bool FeatureRecord::*flag;
+    LONG FeatureRecord::*count;
+    double FeatureRecord::*real;
+};
+constexpr FeatureRow kFeatures[] = {
+    {"AnalogChannelCount", "analog_channel_count", nullptr, &FeatureRecord::analog_channel_count, nullptr},
+    {"DigitalChannelCount", "digital_channel_count", nullptr, &FeatureRecord::digital_channel_count, nullptr},
+    {"Bandwidth", "bandwidth", nullptr, nullptr, &FeatureRecord::bandwidth},
+    {"BandwidthLimit", "bandwidth_limit", nullptr, nullptr, &FeatureRecord::bandwidth_limit},
+    {"GroundCoupling", "ground_coupling", &FeatureRecord::ground_coupling, nullptr, nullptr},
+    {"FiftyOhmInput", "fifty_ohm_input", &FeatureRecord::fifty_ohm_input, nullptr, nullptr},
+    {"ChannelProtection", "channel_protection", &FeatureRecord::channel_protection, nullptr, nullptr},
+    {"ProbeSkew", "probe_skew", &FeatureRecord::probe_skew, nullptr, nullptr},
+    {"AutoLevelSweep", "auto_level_sweep", &FeatureRecord::auto_level_sweep, nullptr, nullptr},
+    {"ExternalTriggerInput", "external_trigger_input", &FeatureRecord::external_trigger_input, nullptr, nullptr},
+    {"SequenceTrigger", "sequence_trigger", &FeatureRecord::sequence_trigger, nullptr, nullptr},
+    {"DigitizeCommand", "digitize_command", &FeatureRecord::digitize_command, nullptr, nullptr},
+    {"EarlyFamily", "early_family", &FeatureRecord::early_family, nullptr, nullptr},
+    {"WaveformPointLimit", "waveform_point_limit", nullptr, &FeatureRecord::waveform_point_limit, nullptr},
+    {"CountedMaximumPoints", "counted_maximum_points", &FeatureRecord::counted_maximum_points, nullptr, nullptr},
+    {"DisplayLabels", "display_labels", &FeatureRecord::display_labels, nullptr, nullptr},
+};
+
+std::string FeatureText(const FeatureRecord& f, const FeatureRow& r) {
+    if (r.flag) return f.*r.flag ? "yes" : "no";
+    if (r.count) return std::to_string(f.*r.count);
+    char buf[32];
+    std::snprintf(buf, sizeof buf, "%g Hz", f.*r.real);
+    return buf;
+}
+
+// Everything info shows, read through the driver's interfaces where they
+// exist.
+struct Info {
+    std::string description, identifier, revision, vendor, group_capabilities;
+    std::string model, manufacturer, firmware;
+    std::vector<std::string> supported_models;
+    std::vector<std::pair<std::string, std::vector<std::string>>> collections;
+    LONG error_code = 0;
+    std::string error_message;
+};
+
+std::string Text(IIviDriverIdentity* id, HRESULT (IIviDriverIdentity::*get)(BSTR*)) {
+    com::Bstr s;
+    return SUCCEEDED((id->*get)(s.Out())) ? s.utf8() : std::string();
+}
+
+template <class Collection>
+std::vector<std::string> Names(Quorlen731XX* driver) {
+    ComPtr<Collection> c;
+    std::vector<std::string> names;
+    if (FAILED(ComPtr<IIviDriver>(driver).As(c))) return names;
+    LONG n = 0;
+    if (FAILED(c->get_Count(&n))) return names;
+    for (LONG i = 1; i <= n; ++i) {
+        com::Bstr s;
+        if (SUCCEEDED(c->get_Name(i, s.Out()))) names.push_back(s.utf8());
+    }
+    return names;
+}
+
+Info Gather(Quorlen731XX* driver) {
+    Info info;
+    IIviDriverIdentity* id = driver;
+    info.description = Text(id, &IIviDriverIdentity::get_Description);
+    info.identifier = Text(id, &IIviDriverIdentity::get_Identifier);
+    info.revision = Text(id, &IIviDriverIdentity::get_Revision);
+    info.vendor = Text(id, &IIviDriverIdentity::get_Vendor);
+    info.group_capabilities = Text(id, &IIviDriverIdentity::get_GroupCapabilities);
+    info.model = Text(id, &IIviDriverIdentity::get_InstrumentModel);
+    info.manufacturer = Text(id, &IIviDriverIdentity::get_InstrumentManufacturer);
+    info.firmware = Text(id, &IIviDriverIdentity::get_InstrumentFirmwareRevision);
+    std::string list = Text(id, &IIviDriverIdentity::get_SupportedInstrumentModels);
+    for (std::size_t start = 0; start < list.size();) {
+        std::size_t comma = list.find(',', start);
+        if (comma == std::string::npos) comma = list.size();
+        info.supported_models.push_back(list.substr(start, comma - start));
+        start = comma + 1;
+    }
+    info.collections = {
+        {"IIviScopeChannels", Names<IIviScopeChannels>(driver)},
+        {"IIviScopeMeasurements", Names<IIviScopeMeasurements>(driver)},
+        {"IQuorlen731XXChannels", Names<IQuorlen731XXChannels>(driver)},
+        {"IQuorlen731XXMeasurements", Names<IQuorlen731XXMeasurements>(driver)},
+        {"IQuorlen731XXDigitalChannels", Names<IQuorlen731XXDigitalChannels>(driver)},
+    };
+    com::Bstr message;
+    if (SUCCEEDED(driver->ErrorQuery(&info.error_code, message.Out())))
+        info.error_message = message.utf8();
+    else
+        info.error_message = LastErrorText();
+    return info;
+}
+
+std::string Joined(const std::vector<std::string>& v) {
+    std::string out;
+    for (const std::string& s : v) out += (out.empty() ? "" : ", ") + s;
+    return out.empty() ? "(none)" : out;
 }
 
 void PrintTable(const char* title, const std::map<std::string, std::string>& t) {
@@ -43,38 +142,76 @@ void PrintTable(const char* title, const std::map<std::string, std::string>& t) 
     for (const auto& [k, v] : t) std::printf("  %-22s %s\n", k.c_str(), v.c_str());
 }
 
-void PrintText(const SessionCore& core) {
+void PrintText(const SessionCore& core, const Info& info) {
     const DriverSession& s = core.session;
+    std::printf("Driver\n");
+    std::printf("  %-22s %s\n", "Description", info.description.c_str());
+    std::printf("  %-22s %s %s (%s)\n", "Identifier", info.identifier.c_str(),
+                info.revision.c_str(), info.vendor.c_str());
+    std::printf("  %-22s %zu\n", "SupportedModels", info.supported_models.size());
+    std::printf("Instrument\n");
+    std::printf("  %-22s %s\n", "Model", info.model.c_str());
+    std::printf("  %-22s %s\n", "Manufacturer", info.manufacturer.c_str());
+    std::printf("  %-22s %s\n", "FirmwareRevision", info.firmware.c_str());
+    std::printf("  %-22s %ld, \"%s\"\n", "ErrorQuery", static_cast<long>(info.error_code),
+                info.error_message.c_str());
     std::printf("Session\n");
-    std::printf("  %-22s %s\n", "Initialized", s.initialized ? "yes" : "no");
     std::printf("  %-22s %s\n", "IoResourceDescriptor", s.io_resource_descriptor.c_str());
     std::printf("  %-22s %s\n", "LogicalName", s.logical_name.c_str());
     std::printf("  %-22s %s\n", "DriverSetup", s.driver_setup.c_str());
     for (const FlagRow& f : kFlags) std::printf("  %-22s %s\n", f.label, OnOff(s.flags.*f.flag));
-    std::printf("Instrument\n");
-    std::printf("  %-22s %s\n", "Model", s.model.c_str());
-    std::printf("  %-22s %s\n", "Manufacturer", InstrumentManufacturer(core).c_str());
-    std::printf("  %-22s %s\n", "FirmwareRevision", InstrumentFirmwareRevision(core).c_str());
+    std::printf("  %-22s %s\n", "Trace", OnOff(s.trace.enabled));
+    std::printf("Features\n");
+    for (const FeatureRow& r : kFeatures)
+        std::printf("  %-22s %s\n", r.label, FeatureText(core.features, r).c_str());
+    std::printf("Collections\n");
+    for (const auto& [name, items] : info.collections)
+        std::printf("  %-29s %s\n", name.c_str(), Joined(items).c_str());
     PrintTable("Init options", s.init_options);
     PrintTable("DriverSetup options", s.driver_setup_options);
-    std::map<std::string, std::string> settings;
-    for (const auto& [k, v] : s.initial_settings) settings[k] = SettingText(v);
-    PrintTable("Initial settings", settings);
-    std::printf("Trace\n  %-22s %s\n", "Trace", OnOff(s.trace.enabled));
-    if (!s.trace.name.empty()) std::printf("  %-22s %s\n", "TraceName", s.trace.name.c_str());
 }
 
-void PrintJson(const SessionCore& core) {
+void PrintJson(const SessionCore& core, const Info& info) {
     const DriverSession& s = core.session;
     JsonWriter j;
     j.BeginObject();
-    j.Field("model", s.model);
-    j.Field("manufacturer", InstrumentManufacturer(core));
-    j.Field("firmware_revision", InstrumentFirmwareRevision(core));
+    j.Field("model", info.model);
+    j.Field("manufacturer", info.manufacturer);
+    j.Field("firmware_revision", info.firmware);
     j.Field("io_resource_descriptor", s.io_resource_descriptor);
     j.Field("logical_name", s.logical_name);
     j.Field("driver_setup", s.driver_setup);
     for (const FlagRow& f : kFlags) j.Field(f.json, s.flags.*f.flag);
+    j.Key("features");
+    j.BeginObject();
+    for (const FeatureRow& r : kFeatures) {
+        if (r.flag) j.Field(r.json, core.features.*r.flag);
+        else if (r.count) j.Field(r.json, static_cast<long>(core.features.*r.count));
+        else j.Field(r.json, core.features.*r.real);
+    }
+    j.EndObject();
+    j.Key("driver");
+    j.BeginObject();
+    j.Field("description", info.description);
+    j.Field("identifier", info.identifier);
+    j.Field("revision", info.revision);
+    j.Field("vendor", info.vendor);
+    j.Field("group_capabilities", info.group_capabilities);
+    j.EndObject();
+    j.Key("supported_models");
+    j.StringList(info.supported_models);
+    j.Key("collections");
+    j.BeginObject();
+    for (const auto& [name, items] : info.collections) {
+        j.Key(name);
+        j.StringList(items);
+    }
+    j.EndObject();
+    j.Key("error_query");
+    j.BeginObject();
+    j.Field("code", static_cast<long>(info.error_code));
+    j.Field("message", info.error_message);
+    j.EndObject();
     j.Key("init_options");
     j.StringMap(s.init_options);
     j.Key("driver_setup_options");
@@ -96,11 +233,12 @@ int InfoCommand(std::span<char*> argv) {
     ToolSession session;
     HRESULT hr = OpenSession(args, &session);
     if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    ComPtr<Quorlen731XX>& driver = session.driver;
+    Quorlen731XX* driver = session.driver.get();
+    Info info = Gather(driver);
     if (args.Has("json"))
-        PrintJson(driver->Core());
+        PrintJson(driver->Core(), info);
     else
-        PrintText(driver->Core());
+        PrintText(driver->Core(), info);
     hr = driver->Close();
     if (FAILED(hr)) return ReportFailure("Close", hr);
     return 0;
