@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <span>
 
+#include "Quorlen731XXIds.h"
 #include "platform/com/types.h"
 
 namespace qn {
@@ -79,7 +80,7 @@ enum class Msg : std::uint32_t {
 };
 
 inline constexpr const char* kMessagePrefix = "Quorlen731XX: ";
-inline constexpr const char* kDriverProgId = "Quorlen731XX.Quorlen731XX.1";
+inline constexpr const char* kDriverProgId = kQuorlen731XXProgId;
 
 // The entry of a message number, or null when the table has none.
 const ErrorEntry* FindErrorEntry(std::uint32_t id);

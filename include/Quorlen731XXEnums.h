@@ -55,3 +55,57 @@ enum IviScopeVerticalCouplingEnum : LONG {
     IviScopeVerticalCouplingDC = 1,
     IviScopeVerticalCouplingGnd = 2,
 };
+
+// Status registers, service requests and acquisition control.
+enum Quorlen731XXStatusRegisterEnum : LONG {
+    Quorlen731XXStatusRegisterStatusByte = 0,
+    Quorlen731XXStatusRegisterStandardEvent = 1,
+    Quorlen731XXStatusRegisterOperation = 2,
+    Quorlen731XXStatusRegisterOverloadEvent = 3,
+    Quorlen731XXStatusRegisterTriggerEvent = 4,
+    Quorlen731XXStatusRegisterArmEvent = 5,
+};
+enum Quorlen731XXStatusSubRegisterEnum : LONG {
+    Quorlen731XXStatusSubRegisterCondition = 0,
+    Quorlen731XXStatusSubRegisterEvent = 1,
+    Quorlen731XXStatusSubRegisterEnable = 2,
+};
+enum Quorlen731XXSRQReasonEnum : LONG {
+    Quorlen731XXSRQReasonStbMAV = 1,
+    Quorlen731XXSRQReasonStbMSG = 2,
+    Quorlen731XXSRQReasonEsrOPC = 4,
+    Quorlen731XXSRQReasonEsrQueryError = 8,
+    Quorlen731XXSRQReasonEsrDeviceError = 16,
+    Quorlen731XXSRQReasonEsrExecutionError = 32,
+    Quorlen731XXSRQReasonEsrCommandError = 64,
+    Quorlen731XXSRQReasonEsrUserRequest = 128,
+    Quorlen731XXSRQReasonEsrPowerOn = 256,
+    Quorlen731XXSRQReasonStbUSR = 1024,
+    Quorlen731XXSRQReasonStbTRG = 2048,
+    Quorlen731XXSRQReasonOperRunning = 8192,
+    Quorlen731XXSRQReasonOperWaitTrig = 16384,
+    Quorlen731XXSRQReasonOverloadChan1 = 32768,
+    Quorlen731XXSRQReasonOverloadChan2 = 65536,
+    Quorlen731XXSRQReasonOverloadChan3 = 131072,
+    Quorlen731XXSRQReasonOverloadChan4 = 262144,
+    Quorlen731XXSRQReasonOverloadExternal = 524288,
+    Quorlen731XXSRQReasonFaultChan1 = 1048576,
+    Quorlen731XXSRQReasonFaultChan2 = 2097152,
+    Quorlen731XXSRQReasonFaultChan3 = 4194304,
+    Quorlen731XXSRQReasonFaultChan4 = 8388608,
+    Quorlen731XXSRQReasonFaultExternal = 16777216,
+};
+enum Quorlen731XXAcquisitionStatusEnum : LONG {
+    Quorlen731XXAcqInProgress = 0,
+    Quorlen731XXAcqComplete = 1,
+    Quorlen731XXAcqStatusUnknown = 2,
+};
+enum Quorlen731XXTimeOutEnum : LONG {
+    Quorlen731XXTimeOutImmediate = 0,
+    Quorlen731XXTimeOutInfinite = 1,
+};
+enum IviScopeAcquisitionStatusEnum : LONG {
+    IviScopeAcqInProgress = 0,
+    IviScopeAcqComplete = 1,
+    IviScopeAcqStatusUnknown = 2,
+};

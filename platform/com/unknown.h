@@ -131,7 +131,9 @@ struct BaseOf {
 };
 template <class I, class V>
 struct BaseOf<As<I, V>> {
-    struct type {};
+    // An empty base, with a name no derived class will use.
+    struct QnAsEntryTag {};
+    using type = QnAsEntryTag;
 };
 }  // namespace detail
 
