@@ -17,6 +17,8 @@
 #include "core/repcap.h"
 #include "core/session.h"
 #include "platform/com/lock.h"
+#include "scope/acquisition_control.h"
+#include "scope/acquisition_state.h"
 #include "services/coercion_log.h"
 #include "io/visa_provider.h"
 #include "services/tracer.h"
@@ -32,6 +34,8 @@ public:
     com::CriticalSection lock;
     DriverSession session;
     FeatureRecord features;
+    AcquisitionState acquisition;
+    AcquisitionControl acquisition_control;
     RepCapLists repcaps;
     CCoercionLogManager coercions;
     CTraceOwner tracer;
