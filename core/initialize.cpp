@@ -142,6 +142,7 @@ HRESULT Quorlen731XX::InitializeBody(BSTR resource, bool id_query, bool reset, B
     s.driver_setup_options.clear();
     s.initial_settings.clear();
     core.virtual_names.clear();
+    core.acquisition_control = {};
 
     HRESULT hr = ApplyConfiguration(com::BstrToUtf8(resource), s.option_string);          // 4
     if (SUCCEEDED(hr) && s.flags.simulate && s.model.empty())                             // 5
