@@ -1,0 +1,94 @@
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <map>
+
+#include "core/features.h"
+#include "core/models.h"
+#include "core/root.h"
+#include "platform/com/errorinfo.h"
+#include "tests/support/scripted_provider.h"
+
+namespace qn::test {
+namespace {
+
+TEST(SupportedModels, SixtyFiveModelsInSevenFamilies) {
+    std::map<std::string_view, int> per_family;
+    for (const CSupportedModelRow& r : SupportedModelRows()) ++per_family[r.family];
+    EXPECT_EQ(per_family, (std::map<std::string_view, int>{{"4XXXB", 14}, {"4XXXA", 16},
+                                                           {"2XXXA", 6},  {"3XXXL", 4},
+                                                           {"3XXXA", 16}, {"7314X", 4},
+                                                           {"7312X", 5}}));
+    const auto& v = CSupportedModelValidator::Instance();
+    EXPECT_TRUE(v.IsSupported("QDS4032A"));
+    EXPECT_FALSE(v.IsSupported("qds4032a"));   // exact case
+    EXPECT_FALSE(v.IsSupported("QDS4032"));    // no prefix match
+    EXPECT_FALSE(v.IsSupported(""));
+    EXPECT_TRUE(v.IsInFamily("73141D", "7314X"));
+    EXPECT_FALSE(v.IsInFamily("73141D", "7312X"));
+    // The list holds every model once, comma-separated without blanks.
+    std::string list = v.ModelList();
+    EXPECT_EQ(std::count(list.begin(), list.end(), ','), 64);
+    EXPECT_EQ(list.find(' '), std::string::npos);
+}
+
+TEST(FixedFeatures, EarlyFamilyRules) {
+    FeatureRecord a = FixedFeatures("73122A");
+    EXPECT_EQ(a.analog_channel_count, 2);
+    EXPECT_EQ(a.digital_channel_count, 0);
+    EXPECT_EQ(a.bandwidth, 1e8);
+    EXPECT_EQ(a.bandwidth_limit, 2e7);
+    EXPECT_TRUE(a.ground_coupling);
+    EXPECT_FALSE(a.fifty_ohm_input);
+    EXPECT_FALSE(a.probe_skew);
+    EXPECT_TRUE(a.external_trigger_input);
+    EXPECT_FALSE(a.display_labels);
+    EXPECT_EQ(a.waveform_point_limit, 2000);
+    EXPECT_EQ(FixedFeatures("73121D").bandwidth, 6e7);
+    FeatureRecord b = FixedFeatures("73124A");
+    EXPECT_EQ(b.analog_channel_count, 4);
+    EXPECT_FALSE(b.external_trigger_input);
+    FeatureRecord d = FixedFeatures("73141D");
+    EXPECT_EQ(d.analog_channel_count, 2);
+    EXPECT_EQ(d.digital_channel_count, 16);
+    EXPECT_EQ(d.bandwidth, 3e8);
+    EXPECT_EQ(FixedFeatures("73142A").bandwidth, 5e8);
+    // Other families keep the defaults until discovery.
+    FeatureRecord q = FixedFeatures("QDS4032A");
+    EXPECT_FALSE(q.early_family);
+    EXPECT_EQ(q.analog_channel_count, 4);
+    EXPECT_EQ(q.waveform_point_limit, 1000);
+}
+
+TEST(Discovery, AFailingQueryEndsDiscoveryButNotInitialize) {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    auto p = std::make_unique<ScriptedProvider>();
+    ScriptedProvider* io = p.get();
+    driver->Core().io = std::move(p);
+    const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
+    io->Expect("*IDN?\n", idn)
+        .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
+        .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "0\n")
+        .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "8\n")
+        .Expect("*IDN?\n", idn)
+        .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
+        .Expect(":SYST:DATA:VAL? \"DISP:LAB\"\n", "0\n")
+        .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "1\n")
+        .Expect(":SYST:DATA:VAL? \"WAV:FEAT\"\n", "DEC,SEGM\n")
+        .ExpectTimeout(":SYST:DATA:VAL? \"COUN:POD\"\n");
+    com::Bstr r("scripted"), o("");
+    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK);
+    EXPECT_TRUE(io->Done());
+    EXPECT_FALSE(com::TakeThreadError(nullptr));
+    const FeatureRecord& f = driver->Core().features;
+    EXPECT_FALSE(f.display_labels);
+    EXPECT_TRUE(f.counted_maximum_points);
+    EXPECT_EQ(f.digital_channel_count, 16);  // not reached: the default stays
+    // The instance lists were built from the instrument's own counts.
+    EXPECT_EQ(driver->Core().repcaps.List(RepCapClass::kChannel)->size(), 2u);
+    EXPECT_EQ(driver->Core().repcaps.List(RepCapClass::kUserDigitalChannel)->size(), 0u);
+}
+
+}  // namespace
+}  // namespace qn::test
