@@ -187,9 +187,14 @@ HRESULT Quorlen731XX::IQuorlen731XXAcquisition_put_Type_Body(Quorlen731XXAcquisi
     return hr;
 }
 
+// The count read is remembered for a later switch to Average, except while
+// the type is HiRes: the instrument's count of 1 then belongs to HiRes, and
+// taking it would turn the next Average into HiRes.
 HRESULT Quorlen731XX::IQuorlen731XXAcquisition_get_NumberOfAverages_Body(LONG* val) {
+    AcquisitionState& state = Core().acquisition;
     HRESULT hr = CDriverIOManager(*this).InstrQueryCommand(val);
-    if (SUCCEEDED(hr)) Core().acquisition.last_average_count = *val;
+    if (SUCCEEDED(hr) && state.last_acquisition_type != Quorlen731XXAcquisitionTypeHiRes)
+        state.last_average_count = *val;
     return hr;
 }
 

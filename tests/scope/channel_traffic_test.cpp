@@ -1,0 +1,178 @@
+// The exact SCPI traffic of the analog channel members against a strict
+// scripted provider. 73141D has the 50-ohm input, probe skew and protection
+// but no ground coupling; 73122A the reverse.
+#include <gtest/gtest.h>
+
+#include "tests/scope/scope_fixture.h"
+
+namespace qn::test {
+namespace {
+
+class ChannelTraffic : public ScriptedScopeTest {};
+
+TEST_F(ChannelTraffic, ImpedanceIsOneMegohmOrFiftyOhmWhereFitted) {
+    struct Case {
+        const char* model;
+        double ohms;
+        const char* sent;  // nullptr: refused
+    };
+    const Case cases[] = {
+        {"73141D", 50.0, ":CHAN1:IMP FIFT\n"}, {"73141D", 1e6, ":CHAN1:IMP ONEM\n"},
+        {"73141D", 49.999, nullptr},           {"73141D", 1e6 + 1e-6, nullptr},
+        {"73122A", 50.0, nullptr},             {"73122A", 49.999, nullptr},
+        {"73122A", 1e6, ":CHAN1:IMP ONEM\n"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::to_string(c.ohms) + " on " + c.model);
+        Open(c.model);
+        if (c.sent) io_->Expect(c.sent);
+        EXPECT_EQ(User(1)->put_InputImpedance(c.ohms), c.sent ? S_OK : E_IVI_INVALID_VALUE);
+        if (!c.sent) {
+            EXPECT_NE(ErrorText().find("put_InputImpedance, parameter val"), std::string::npos);
+        }
+        EXPECT_TRUE(io_->Done());
+    }
+    double ohms = 0;
+    io_->Expect(":CHAN2:IMP?\n", "FIFT\n").Expect(":CHAN2:IMP?\n", "ONEM\n");
+    EXPECT_EQ(Ivi(2)->get_InputImpedance(&ohms), S_OK);
+    EXPECT_EQ(ohms, 50.0);
+    EXPECT_EQ(User(2)->get_InputImpedance(&ohms), S_OK);
+    EXPECT_EQ(ohms, 1e6);
+    io_->Expect(":CHAN2:IMP?\n", "75\n");
+    EXPECT_EQ(User(2)->get_InputImpedance(&ohms), E_IVI_UNEXPECTED_RESPONSE);
+}
+
+TEST_F(ChannelTraffic, BandwidthLimitSwitchesAtTheFilterFrequency) {
+    Open("73141D");  // limit 25 MHz, bandwidth 300 MHz
+    io_->Expect(":CHAN2:BWL ON\n").Expect(":CHAN2:BWL OFF\n").Expect(":CHAN2:BWL ON\n");
+    EXPECT_EQ(User(2)->put_InputFrequencyMax(2.5e7), S_OK);
+    EXPECT_EQ(User(2)->put_InputFrequencyMax(2.5e7 + 1), S_OK);
+    EXPECT_EQ(Ivi(2)->put_InputFrequencyMax(1.0), S_OK);
+    double hz = 0;
+    io_->Expect(":CHAN2:BWL?\n", "1\n").Expect(":CHAN2:BWL?\n", "0\n");
+    EXPECT_EQ(User(2)->get_InputFrequencyMax(&hz), S_OK);
+    EXPECT_EQ(hz, 2.5e7);
+    EXPECT_EQ(User(2)->get_InputFrequencyMax(&hz), S_OK);
+    EXPECT_EQ(hz, 3e8);
+}
+
+TEST_F(ChannelTraffic, AutomaticProbeSensingSendsNothing) {
+    Open("73141D");
+    double attenuation = 0;
+    // A new channel asks the instrument.
+    io_->Expect(":CHAN1:PROB?\n", "10\n");
+    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
+    EXPECT_EQ(attenuation, 10.0);
+
+    EXPECT_EQ(Ivi(1)->put_ProbeAttenuation(-1.0), S_OK);
+    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
+    EXPECT_EQ(attenuation, -1.0);
+    // Channel 2 keeps its own state.
+    io_->Expect(":CHAN2:PROB?\n", "1\n");
+    EXPECT_EQ(User(2)->get_ProbeAttenuation(&attenuation), S_OK);
+    EXPECT_EQ(attenuation, 1.0);
+
+    io_->Expect(":CHAN1:PROB 100\n").Expect(":CHAN1:PROB?\n", "100\n");
+    EXPECT_EQ(User(1)->put_ProbeAttenuation(100.0), S_OK);
+    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
+    EXPECT_EQ(attenuation, 100.0);
+    // The sensed value is not remembered as an attenuation.
+    io_->Expect(":CHAN1:PROB?\n", "100\n");
+    EXPECT_EQ(User(1)->get_ProbeSense(&attenuation), S_OK);
+}
+
+TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {
+    Open("73141D");
+    EXPECT_EQ(User(1)->put_Coupling(Quorlen731XXVerticalCouplingGnd),
+              E_QUORLEN731XX_VERTICAL_GROUND_COUPLING);
+    EXPECT_EQ(User(1)->put_Coupling(static_cast<Quorlen731XXVerticalCouplingEnum>(3)),
+              E_IVI_INVALID_VALUE);
+    io_->Expect(":CHAN1:COUP AC\n").Expect(":CHAN1:COUP DC\n");
+    EXPECT_EQ(Ivi(1)->put_Coupling(IviScopeVerticalCouplingAC), S_OK);
+    EXPECT_EQ(User(1)->put_Coupling(Quorlen731XXVerticalCouplingDC), S_OK);
+
+    Open("73122A");
+    io_->Expect(":CHAN2:COUP GND\n");
+    EXPECT_EQ(Ivi(2)->put_Coupling(IviScopeVerticalCouplingGnd), S_OK);
+    IviScopeVerticalCouplingEnum coupling{};
+    io_->Expect(":CHAN2:COUP?\n", "GND\n").Expect(":CHAN2:COUP?\n", "DC\n");
+    EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), S_OK);
+    EXPECT_EQ(coupling, IviScopeVerticalCouplingGnd);
+    EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), S_OK);
+    EXPECT_EQ(coupling, IviScopeVerticalCouplingDC);
+    io_->Expect(":CHAN2:COUP?\n", "LFR\n");
+    EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), E_IVI_UNEXPECTED_RESPONSE);
+}
+
+TEST_F(ChannelTraffic, ConfigureStopsAtTheFirstFailure) {
+    Open("73141D");
+    io_->Expect(":CHAN1:PROB 10\n").Expect(":CHAN1:RANG 2\n").Expect(":CHAN1:OFFS 0.5\n");
+    EXPECT_EQ(Ivi(1)->Configure(2.0, 0.5, IviScopeVerticalCouplingGnd, 10.0, VARIANT_TRUE),
+              E_QUORLEN731XX_VERTICAL_GROUND_COUPLING);
+    EXPECT_TRUE(io_->Done());
+
+    io_->Expect(":CHAN2:RANG 4\n")
+        .Expect(":CHAN2:OFFS -1\n")
+        .Expect(":CHAN2:COUP DC\n")
+        .Expect(":CHAN2:DISP 0\n");
+    EXPECT_EQ(User(2)->Configure(4.0, -1.0, Quorlen731XXVerticalCouplingDC, -1.0, VARIANT_FALSE),
+              S_OK);
+    io_->Expect(":CHAN2:IMP ONEM\n").Expect(":CHAN2:BWL OFF\n");
+    EXPECT_EQ(Ivi(2)->ConfigureCharacteristics(1e6, 1e9), S_OK);
+    EXPECT_EQ(User(2)->ConfigureCharacteristics(75.0, 1e9), E_IVI_INVALID_VALUE);
+}
+
+TEST_F(ChannelTraffic, SkewAndProtectionNeedTheirFeatures) {
+    Open("73122A");
+    double skew = 0;
+    Quorlen731XXChannelProtectionEnum protection{};
+    EXPECT_EQ(User(1)->get_ProbeSkew(&skew), E_QUORLEN731XX_PROPERTY_NOT_SUPPORTED);
+    EXPECT_EQ(User(1)->put_ProbeSkew(1e-9), E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
+    EXPECT_NE(ErrorText().find("put_ProbeSkew"), std::string::npos);
+    EXPECT_EQ(User(1)->get_Protection(&protection), E_IVI_VALUE_NOT_SUPPORTED);
+    EXPECT_EQ(User(1)->ClearProtection(), E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
+    EXPECT_NE(ErrorText().find("ClearProtection"), std::string::npos);
+
+    Open("73141D");
+    io_->Expect(":CHAN2:PROB:SKEW 1e-09\n").Expect(":CHAN2:PROB:SKEW?\n", "1E-09\n");
+    EXPECT_EQ(User(2)->put_ProbeSkew(1e-9), S_OK);
+    EXPECT_EQ(User(2)->get_ProbeSkew(&skew), S_OK);
+    EXPECT_EQ(skew, 1e-9);
+    io_->Expect(":CHAN2:PROT?\n", "NORM\n").Expect(":CHAN2:PROT?\n", "TRIP\n");
+    EXPECT_EQ(User(2)->get_Protection(&protection), S_OK);
+    EXPECT_EQ(protection, Quorlen731XXChannelProtectionOK);
+    EXPECT_EQ(User(2)->get_Protection(&protection), S_OK);
+    EXPECT_EQ(protection, Quorlen731XXChannelProtectionTripped);
+    io_->Expect(":CHAN2:PROT:CLE\n");
+    EXPECT_EQ(User(2)->ClearProtection(), S_OK);
+}
+
+TEST_F(ChannelTraffic, LabelsWithLineBreaksOrNulAreRefused) {
+    Open("73141D");
+    const char16_t lf[] = u"\"A\nB\"";
+    const char16_t nul[] = {u'"', u'A', 0, u'B', u'"'};
+    com::Bstr with_lf{std::u16string_view(lf)};
+    com::Bstr with_nul{std::u16string_view(nul, 5)};
+    EXPECT_EQ(User(1)->put_Label(with_lf.get()), E_IVI_INVALID_VALUE);
+    EXPECT_NE(ErrorText().find("for method put_Label, parameter val"), std::string::npos);
+    EXPECT_EQ(User(1)->put_Label(with_nul.get()), E_IVI_INVALID_VALUE);
+    io_->Expect(":CHAN1:LAB \"Clock\"\n").Expect(":CHAN1:LAB?\n", "\"Clock\"\n");
+    com::Bstr label("\"Clock\"");
+    EXPECT_EQ(User(1)->put_Label(label.get()), S_OK);
+    EXPECT_EQ(User(1)->get_Label(label.Out()), S_OK);
+    EXPECT_EQ(label.utf8(), "\"Clock\"");
+}
+
+TEST_F(ChannelTraffic, UnitsUseTheirTokens) {
+    Open("73141D");
+    io_->Expect(":CHAN1:UNIT AMP\n").Expect(":CHAN1:UNIT?\n", "VOLT\n");
+    EXPECT_EQ(User(1)->put_Units(Quorlen731XXAmps), S_OK);
+    EXPECT_EQ(User(1)->put_Units(static_cast<Quorlen731XXChannelUnitsEnum>(2)),
+              E_IVI_INVALID_VALUE);
+    Quorlen731XXChannelUnitsEnum units = Quorlen731XXAmps;
+    EXPECT_EQ(User(1)->get_Units(&units), S_OK);
+    EXPECT_EQ(units, Quorlen731XXVolts);
+}
+
+}  // namespace
+}  // namespace qn::test

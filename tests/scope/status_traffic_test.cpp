@@ -1,0 +1,280 @@
+// Exact SCPI traffic of the status registers, the service-request masks, the
+// acquisition-pending protocol and the restores of the waveform data read,
+// against the strict scripted provider.
+#include <gtest/gtest.h>
+
+#include <deque>
+
+#include "Quorlen731XXErrors.h"
+#include "core/root.h"
+#include "scope/waveform_transfer.h"
+#include "tests/support/scripted_provider.h"
+
+namespace qn::test {
+namespace {
+
+// The scripted provider with a scripted status byte, a remembered
+// termination-character setting and injectable failures.
+class StatusProvider : public ScriptedProvider {
+public:
+    std::deque<SHORT> stb;
+    bool term_char = true;
+    bool fail_term_get = false, fail_term_set = false, fail_next_write = false;
+    int stb_reads = 0;
+
+protected:
+    HRESULT RawReadSTB(SHORT* v) override {
+        ++stb_reads;
+        *v = stb.empty() ? 0 : stb.front();
+        if (!stb.empty()) stb.pop_front();
+        return S_OK;
+    }
+    HRESULT RawGetBool(int which, bool* v) override {
+        if (which != 1) return ScriptedProvider::RawGetBool(which, v);
+        if (fail_term_get) return E_FAIL;
+        *v = term_char;
+        return S_OK;
+    }
+    HRESULT RawSetBool(int which, bool v) override {
+        if (which != 1) return S_OK;
+        if (fail_term_set && !v) return E_FAIL;
+        term_char = v;
+        return S_OK;
+    }
+    HRESULT RawWrite(const BYTE* data, LONG count, LONG* written) override {
+        if (std::exchange(fail_next_write, false)) return E_FAIL;
+        return ScriptedProvider::RawWrite(data, count, written);
+    }
+};
+
+class StatusTraffic : public ::testing::Test {
+protected:
+    void Open(const char* model, const char* options = "") {
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        driver_ = com::MakeComObject<Quorlen731XX>();
+        auto p = std::make_unique<StatusProvider>();
+        io_ = p.get();
+        driver_->Core().io = std::move(p);
+        const std::string idn = std::string("QUORLEN TECHNOLOGIES,") + model + ",SN1,1.0\n";
+        io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
+        if (std::string_view(options).find("QueryInstrStatus") != std::string_view::npos)
+            io_->AnswerStatusWith("+0");
+        com::Bstr r("scripted"), o(options);
+        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    }
+    void TearDown() override {
+        if (!HasFailure() && io_) {
+            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
+        }
+    }
+    IQuorlen731XXStatus* Status() { return driver_.get(); }
+    IQuorlen731XXMeasurements* Measurements() { return driver_.get(); }
+    static std::string ErrorText() {
+        com::ErrorRecord rec;
+        return com::TakeThreadError(&rec) ? rec.description : std::string();
+    }
+
+    ComPtr<Quorlen731XX> driver_;
+    StatusProvider* io_ = nullptr;
+};
+
+// 73141D has channel protection, 73121D has not; neither has the digitize
+// feature.
+constexpr const char* kProtected = "73141D";
+constexpr const char* kUnprotected = "73121D";
+
+TEST_F(StatusTraffic, ServiceRequestMasksCombineTheReasonBits) {
+    Open(kProtected);
+    const std::pair<LONG, const char*> cases[] = {
+        {0, "*CLS; *SRE 0; *ESE 0; :OPEE 0; :OVL 0"},
+        {Quorlen731XXSRQReasonStbMAV | Quorlen731XXSRQReasonEsrOPC,
+         "*CLS; *SRE 48; *ESE 1; :OPEE 0; :OVL 0"},
+        {Quorlen731XXSRQReasonOperRunning | Quorlen731XXSRQReasonOperWaitTrig,
+         "*CLS; *SRE 128; *ESE 0; :OPEE 40; :OVL 0"},
+        {Quorlen731XXSRQReasonOverloadChan1 | Quorlen731XXSRQReasonOverloadChan2,
+         "*CLS; *SRE 128; *ESE 0; :OPEE 2048; :OVL 3"},
+        {Quorlen731XXSRQReasonEsrPowerOn | Quorlen731XXSRQReasonStbTRG |
+             Quorlen731XXSRQReasonStbUSR | Quorlen731XXSRQReasonFaultExternal,
+         "*CLS; *SRE 35; *ESE 128; :OPEE 0; :OVL 0"},
+    };
+    for (auto [reason, command] : cases) {
+        io_->Expect(std::string(command) + "\n");
+        EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(reason)), S_OK);
+    }
+    for (LONG bad : {0x2000000L, -1L}) {
+        EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(bad)),
+                  E_IVI_INVALID_VALUE);
+        EXPECT_NE(ErrorText().find("ConfigureServiceRequest, parameter Reason"), std::string::npos);
+    }
+}
+
+TEST_F(StatusTraffic, WithoutChannelProtectionOverloadIsRefusedAndThreeMasksSent) {
+    Open(kUnprotected);
+    EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonOverloadChan3),
+              E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
+    EXPECT_NE(ErrorText().find("Quorlen731XXSRQReasonOverloadChan3"), std::string::npos);
+    io_->Expect("*CLS; *SRE 16; *ESE 0; :OPEE 0\n");
+    EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonStbMAV), S_OK);
+    io_->Expect("*CLS;:OPEE 31\n").Expect("*CLS\n");
+    EXPECT_EQ(Status()->Preset(), S_OK);
+    EXPECT_EQ(Status()->Clear(), S_OK);
+    EXPECT_EQ(Status()->put_Register(Quorlen731XXStatusRegisterOverloadEvent,
+                                     Quorlen731XXStatusSubRegisterEnable, 1),
+              E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
+    EXPECT_NE(ErrorText().find("Quorlen731XXStatusRegisterOverloadEvent"), std::string::npos);
+}
+
+TEST_F(StatusTraffic, RegisterReadsUseTheEarlyDialect) {
+    Open(kProtected);
+    io_->Expect("*STB?\n", "+68\n").Expect("OPER?\n", "8\n").Expect(":OPEE?\n", "31\n")
+        .Expect("OVL?\n", "3\n").Expect(":AER?\n", "1\n");
+    const std::tuple<LONG, LONG, LONG> reads[] = {
+        {Quorlen731XXStatusRegisterStatusByte, Quorlen731XXStatusSubRegisterEvent, 68},
+        {Quorlen731XXStatusRegisterOperation, Quorlen731XXStatusSubRegisterCondition, 8},
+        {Quorlen731XXStatusRegisterOperation, Quorlen731XXStatusSubRegisterEnable, 31},
+        {Quorlen731XXStatusRegisterOverloadEvent, Quorlen731XXStatusSubRegisterEnable, 3},
+        {Quorlen731XXStatusRegisterArmEvent, Quorlen731XXStatusSubRegisterEvent, 1},
+        {Quorlen731XXStatusRegisterTriggerEvent, Quorlen731XXStatusSubRegisterEnable, 1},  // no I/O
+    };
+    for (auto [reg, sub, expected] : reads) {
+        LONG v = 0;
+        EXPECT_EQ(Status()->get_Register(Quorlen731XXStatusRegisterEnum(reg),
+                                         Quorlen731XXStatusSubRegisterEnum(sub), &v),
+                  S_OK);
+        EXPECT_EQ(v, expected) << reg << "/" << sub;
+    }
+}
+
+TEST_F(StatusTraffic, RejectedRegisterAccessNamesWhatWasRejected) {
+    Open(kProtected);
+    struct Case {
+        bool put;
+        LONG reg, sub;
+        const char* text;
+    };
+    const Case cases[] = {
+        {false, Quorlen731XXStatusRegisterOperation, Quorlen731XXStatusSubRegisterEvent,
+         "Invalid value (Quorlen731XXStatusSubRegisterEvent) for method get_Register, parameter "
+         "SubRegister."},
+        {false, Quorlen731XXStatusRegisterStatusByte, Quorlen731XXStatusSubRegisterCondition,
+         "(Quorlen731XXStatusSubRegisterCondition) for method get_Register"},
+        {true, Quorlen731XXStatusRegisterStandardEvent, Quorlen731XXStatusSubRegisterCondition,
+         "(Quorlen731XXStatusSubRegisterCondition) for method put_Register"},
+        {true, Quorlen731XXStatusRegisterTriggerEvent, Quorlen731XXStatusSubRegisterEnable,
+         "Invalid value (4) for method put_Register, parameter Register."},
+        {true, Quorlen731XXStatusRegisterArmEvent, Quorlen731XXStatusSubRegisterEnable,
+         "Invalid value (5) for method put_Register"},
+        {false, Quorlen731XXStatusRegisterOperation, 3,
+         "Invalid value (Unknown Quorlen731XXStatusSubRegisterEnum) for method "
+         "ReturnInvalidSubRegister, parameter eSubRegister."},
+        {true, 6, Quorlen731XXStatusSubRegisterEnable, "Invalid value (6) for method put_Register"},
+    };
+    for (const Case& c : cases) {
+        LONG v = 0;
+        const auto reg = Quorlen731XXStatusRegisterEnum(c.reg);
+        const auto sub = Quorlen731XXStatusSubRegisterEnum(c.sub);
+        HRESULT hr = c.put ? Status()->put_Register(reg, sub, 1) : Status()->get_Register(reg, sub, &v);
+        EXPECT_EQ(hr, E_IVI_INVALID_VALUE) << c.text;
+        EXPECT_NE(ErrorText().find(c.text), std::string::npos) << c.text;
+    }
+}
+
+TEST_F(StatusTraffic, RegisterWritesMaskTheValueAndPresetClearsOverload) {
+    Open(kProtected);
+    io_->Expect("*SRE 255\n").Expect("*ESE 1\n").Expect(":OPEE 65535\n").Expect(":OVL 4095\n");
+    const std::pair<LONG, LONG> writes[] = {{Quorlen731XXStatusRegisterStatusByte, 0x1FF},
+                                            {Quorlen731XXStatusRegisterStandardEvent, 0x101},
+                                            {Quorlen731XXStatusRegisterOperation, -1},
+                                            {Quorlen731XXStatusRegisterOverloadEvent, 0xFFFF}};
+    for (auto [reg, value] : writes)
+        EXPECT_EQ(Status()->put_Register(Quorlen731XXStatusRegisterEnum(reg),
+                                         Quorlen731XXStatusSubRegisterEnable, value),
+                  S_OK);
+    io_->Expect("*CLS;:OPEE 31;:OVL 0\n");
+    EXPECT_EQ(Status()->Preset(), S_OK);
+    io_->stb = {0x44};
+    LONG stb = 0;
+    EXPECT_EQ(Status()->get_SerialPoll(&stb), S_OK);
+    EXPECT_EQ(stb, 0x44);
+}
+
+TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEvent) {
+    Open(kProtected);
+    // Initiate: the abort sequence, the type (Average), the saved enable,
+    // operation complete only, the old events read, then digitize.
+    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n")
+        .Expect("*ESE?\n", "36\n").Expect("*ESE 1\n").Expect("*ESR?\n", "0\n")
+        .Expect(":DIG;*OPC\n");
+    EXPECT_EQ(Measurements()->Initiate(), S_OK);
+    EXPECT_TRUE(driver_->Core().acquisition_control.pending);
+
+    // Status reads only the status byte while pending; the event ends it and
+    // puts the saved enable back.
+    io_->stb = {0x00, 0x20};
+    Quorlen731XXAcquisitionStatusEnum s = Quorlen731XXAcqStatusUnknown;
+    EXPECT_EQ(Measurements()->Status(&s), S_OK);
+    EXPECT_EQ(s, Quorlen731XXAcqInProgress);
+    io_->Expect("*ESE 36\n");
+    EXPECT_EQ(Measurements()->Status(&s), S_OK);
+    EXPECT_EQ(s, Quorlen731XXAcqComplete);
+    EXPECT_FALSE(driver_->Core().acquisition_control.pending);
+
+    // Not pending: the run bit of the operation condition decides.
+    io_->Expect("OPER?\n", "8\n").Expect("OPER?\n", "0\n");
+    EXPECT_EQ(Measurements()->Status(&s), S_OK);
+    EXPECT_EQ(s, Quorlen731XXAcqInProgress);
+    IviScopeAcquisitionStatusEnum cs = IviScopeAcqStatusUnknown;
+    EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver_.get())->Status(&cs), S_OK);
+    EXPECT_EQ(cs, IviScopeAcqComplete);
+}
+
+TEST_F(StatusTraffic, AbortEndsAPendingAcquisition) {
+    Open(kProtected);
+    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "4\n")
+        .Expect("*ESE?\n", "0\n").Expect("*ESE 1\n").Expect("*ESR?\n", "1\n")
+        .Expect(":DIG;*OPC\n");
+    ASSERT_EQ(Measurements()->Initiate(), S_OK);
+    const int clears = io_->Clears();
+    io_->Expect("*ESE 0\n").Expect(":STOP\n");
+    EXPECT_EQ(Measurements()->Abort(), S_OK);
+    EXPECT_EQ(io_->stb_reads, 2);
+    EXPECT_EQ(io_->Clears(), clears + 1);
+    EXPECT_FALSE(driver_->Core().acquisition_control.pending);
+}
+
+TEST_F(StatusTraffic, NormalAcquisitionWithoutDigitizeSendsSingle) {
+    Open(kProtected);
+    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "NORM\n").Expect(":SING\n");
+    EXPECT_EQ(Measurements()->Initiate(), S_OK);
+    EXPECT_FALSE(driver_->Core().acquisition_control.pending);
+    EXPECT_EQ(io_->stb_reads, 0);
+    io_->Expect(":AUT\n");
+    EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver_.get())->AutoSetup(), S_OK);
+}
+
+// Every way the data read can fail leaves the status check and the
+// termination character as they were.
+TEST_F(StatusTraffic, WaveformDataReadRestoresPollingAndTermCharOnEveryPath) {
+    enum Fault { kWrite, kTermGet, kTermSet, kBlock };
+    for (Fault f : {kWrite, kTermGet, kTermSet, kBlock}) {
+        SCOPED_TRACE(f);
+        Open(kProtected, "QueryInstrStatus=true");
+        const std::size_t before = io_->Written().size();
+        if (f == kWrite) io_->fail_next_write = true;
+        else io_->Expect(":WAV:DATA?\n");
+        io_->fail_term_get = f == kTermGet;
+        io_->fail_term_set = f == kTermSet;
+        com::SafeArray data;
+        EXPECT_TRUE(FAILED(ReadWaveformData(*driver_.get(), 2, &data)));
+        EXPECT_TRUE(driver_->Core().session.flags.query_instrument_status);
+        EXPECT_TRUE(io_->term_char);
+        // No status query was sent in the middle of the block's message.
+        for (std::size_t i = before; i < io_->Written().size(); ++i)
+            EXPECT_NE(io_->Written()[i], "*ESR?\n");
+        EXPECT_TRUE(io_->Done());
+        driver_->Close();
+    }
+}
+
+}  // namespace
+}  // namespace qn::test
