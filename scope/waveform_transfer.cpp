@@ -4,11 +4,13 @@
 
 #include <cctype>
 #include <cstring>
+#include <utility>
 #include <vector>
 
 #include "Quorlen731XXErrors.h"
 #include "core/children.h"
 #include "io/io_manager.h"
+#include "platform/com/errorinfo.h"
 #include "platform/visa/visa.h"
 #include "scope/waveform_source.h"
 
@@ -33,6 +35,20 @@ bool IsByteSource(std::string_view source) {
            source.find("POD") != std::string_view::npos;
 }
 
+// Keeps the thread's error information across a clean-up step: the restores
+// below run I/O operations, which clear it, after the failure that the
+// caller is to see was reported.
+class KeepErrorInfo {
+public:
+    KeepErrorInfo() { GetErrorInfo(0, info_.Out()); }
+    ~KeepErrorInfo() {
+        if (info_) SetErrorInfo(0, info_.get());
+    }
+
+private:
+    ComPtr<IErrorInfo> info_;
+};
+
 // The session timeout for the duration of a transfer, put back on every path.
 class TimeoutScope {
 public:
@@ -45,7 +61,9 @@ public:
         return io.SetIOTimeout(timeout);
     }
     ~TimeoutScope() {
-        if (active_) CDriverIOManager(node_).SetIOTimeout(saved_);
+        if (!active_) return;
+        KeepErrorInfo keep;
+        CDriverIOManager(node_).SetIOTimeout(saved_);
     }
 
 private:
@@ -84,8 +102,13 @@ public:
         restore_ = SUCCEEDED(hr);
         return hr;
     }
+    HRESULT Restore() {
+        if (!std::exchange(restore_, false)) return S_OK;
+        return CDriverIOManager(node_).SetTerminationCharacterEnabled(true);
+    }
     ~TermCharOff() {
-        if (restore_) CDriverIOManager(node_).SetTerminationCharacterEnabled(true);
+        KeepErrorInfo keep;
+        Restore();
     }
 
 private:
@@ -147,7 +170,13 @@ HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* o
     hr = term.Disable();
     if (FAILED(hr)) return hr;
     com::Variant block;
-    hr = io.FormattedReadIEEEBlock(element_type, false, true, &block);
+    hr = io.FormattedReadIEEEBlock(element_type, false, false, &block);
+    if (FAILED(hr)) return hr;
+    // The rest of the message (its terminator, or bytes beyond the declared
+    // length) is discarded with the termination character enabled again: a
+    // transport without an end-of-message signal ends the message only there.
+    hr = term.Restore();
+    if (SUCCEEDED(hr)) hr = io.FormattedFlushRead();
     if (FAILED(hr)) return hr;
     const VARTYPE expected =
         element_type == visa::BinaryType_UI1 ? VARTYPE(VT_ARRAY | VT_UI1) : VARTYPE(VT_ARRAY | VT_I2);

@@ -156,6 +156,16 @@ HRESULT FormattedIO::ReadField(LONG type, const Deadline& deadline, VARIANT* out
 }
 
 HRESULT FormattedIO::DrainMessage(const Deadline& deadline) {
+    // Bytes buffered while the termination character was disabled may hold
+    // the message's terminator: with it enabled again, that terminator ends
+    // the message (a transport without END would otherwise wait for more).
+    VARIANT_BOOL term_enabled = VARIANT_FALSE;
+    BYTE term = '\n';
+    if (open_message_ && rpos_ < rend_ && io_ &&
+        SUCCEEDED(io_->get_TerminationCharacterEnabled(&term_enabled)) && term_enabled &&
+        SUCCEEDED(io_->get_TerminationCharacter(&term)) &&
+        std::memchr(rbuf_.data() + rpos_, term, rend_ - rpos_))
+        open_message_ = false;
     rpos_ = rend_ = 0;
     BYTE scratch[4096];
     while (open_message_) {
