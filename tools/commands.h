@@ -6,5 +6,7 @@
 namespace qn::tools {
 
 int InfoCommand(std::span<char*> args);
+int FetchCommand(std::span<char*> args);
+int DemoCommand(std::span<char*> args);
 
 }  // namespace qn::tools

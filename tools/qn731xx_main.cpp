@@ -17,6 +17,10 @@ struct Command {
 constexpr Command kCommands[] = {
     {"info", qn::tools::InfoCommand,
      "open a session and print its flags, the instrument identity and the option tables"},
+    {"fetch", qn::tools::FetchCommand,
+     "fetch one channel's waveform: --channel N [--points P] [--csv FILE] [--plot FILE.svg]"},
+    {"demo", qn::tools::DemoCommand,
+     "identify, reset, configure two channels, acquire, fetch, summarise, write CSV and SVG"},
 };
 
 int Usage(FILE* to) {
