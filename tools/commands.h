@@ -8,5 +8,7 @@ namespace qn::tools {
 int InfoCommand(std::span<char*> args);
 int FetchCommand(std::span<char*> args);
 int DemoCommand(std::span<char*> args);
+int ChannelCommand(std::span<char*> args);
+int TimebaseCommand(std::span<char*> args);
 
 }  // namespace qn::tools

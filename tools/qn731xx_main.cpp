@@ -21,6 +21,10 @@ constexpr Command kCommands[] = {
      "fetch one channel's waveform: --channel N [--points P] [--csv FILE] [--plot FILE.svg]"},
     {"demo", qn::tools::DemoCommand,
      "identify, reset, configure two channels, acquire, fetch, summarise, write CSV and SVG"},
+    {"channel", qn::tools::ChannelCommand,
+     "set and print the settings of analog channel N (qn731xx channel N --help)"},
+    {"timebase", qn::tools::TimebaseCommand,
+     "set and print the horizontal record and acquisition mode"},
 };
 
 int Usage(FILE* to) {

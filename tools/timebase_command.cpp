@@ -1,0 +1,84 @@
+// qn731xx timebase [--time-per-record S ...]: writes the given horizontal
+// and acquisition settings and prints them as the instrument reports them.
+#include <cstdio>
+#include <string>
+
+#include "tools/commands.h"
+#include "tools/session_util.h"
+#include "tools/setting_table.h"
+
+namespace qn::tools {
+
+namespace {
+
+using Acq = IQuorlen731XXAcquisition;
+
+constexpr Choice kInterpolations[] = {{"NONE", Quorlen731XXInterpolationNone},
+                                      {"SINEX", Quorlen731XXInterpolationSineX},
+                                      {"LINEAR", Quorlen731XXInterpolationLinear}};
+constexpr Choice kTypes[] = {{"NORMAL", Quorlen731XXAcquisitionTypeNormal},
+                             {"PEAK", Quorlen731XXAcquisitionTypePeakDetect},
+                             {"HIRES", Quorlen731XXAcquisitionTypeHiRes},
+                             {"ENVELOPE", Quorlen731XXAcquisitionTypeEnvelope},
+                             {"AVERAGE", Quorlen731XXAcquisitionTypeAverage}};
+constexpr Choice kSampleModes[] = {{"REALTIME", Quorlen731XXSampleModeRealTime},
+                                   {"EQUIVALENT", Quorlen731XXSampleModeEquivalentTime}};
+
+// Written in this order: the record as ConfigureRecord writes it, then the
+// average count before the type, so that Average starts with that count.
+constexpr Setting<Acq> kTimebaseSettings[] = {
+    {"time-per-record", "TimePerRecord", "record duration in s", SettingKind::kReal, {},
+     Read<Acq, double, &Acq::get_TimePerRecord>, Write<Acq, double, &Acq::put_TimePerRecord>},
+    {"points", "NumberOfPointsMin", "minimum number of points", SettingKind::kInteger, {},
+     Read<Acq, LONG, &Acq::get_NumberOfPointsMin>, Write<Acq, LONG, &Acq::put_NumberOfPointsMin>},
+    {"start-time", "StartTime", "time of the first point relative to the trigger in s",
+     SettingKind::kReal, {}, Read<Acq, double, &Acq::get_StartTime>,
+     Write<Acq, double, &Acq::put_StartTime>},
+    {"interpolation", "Interpolation", "interpolation between samples", SettingKind::kChoice,
+     kInterpolations, Read<Acq, Quorlen731XXInterpolationEnum, &Acq::get_Interpolation>,
+     Write<Acq, Quorlen731XXInterpolationEnum, &Acq::put_Interpolation>},
+    {"averages", "NumberOfAverages", "acquisitions averaged", SettingKind::kInteger, {},
+     Read<Acq, LONG, &Acq::get_NumberOfAverages>, Write<Acq, LONG, &Acq::put_NumberOfAverages>},
+    {"type", "Type", "acquisition type", SettingKind::kChoice, kTypes,
+     Read<Acq, Quorlen731XXAcquisitionTypeEnum, &Acq::get_Type>,
+     Write<Acq, Quorlen731XXAcquisitionTypeEnum, &Acq::put_Type>},
+    {"record-length", "RecordLength", "", SettingKind::kInteger, {},
+     Read<Acq, LONG, &Acq::get_RecordLength>, nullptr},
+    {"sample-rate", "SampleRate", "", SettingKind::kReal, {},
+     Read<Acq, double, &Acq::get_SampleRate>, nullptr},
+    {"sample-mode", "SampleMode", "", SettingKind::kChoice, kSampleModes,
+     Read<Acq, Quorlen731XXSampleModeEnum, &Acq::get_SampleMode>, nullptr},
+};
+
+}  // namespace
+
+int TimebaseCommand(std::span<char*> argv) {
+    SettingTable<Acq> table(kTimebaseSettings);
+    if (WantsHelp(argv)) {
+        std::printf("usage: qn731xx timebase [options]\n%s", table.Help().c_str());
+        return 0;
+    }
+    const std::vector<OptionSpec> options = table.Options();
+    CliArgs args;
+    std::string error;
+    if (!args.Parse(options, argv, &error) || !args.Positionals().empty() ||
+        !table.ParseRequests(args, &error)) {
+        if (error.empty()) error = "unexpected word " + args.Positionals().front();
+        std::fprintf(stderr, "qn731xx timebase: %s\nusage: qn731xx timebase [options]\n%s",
+                     error.c_str(), table.Help().c_str());
+        return 2;
+    }
+    ToolSession session;
+    HRESULT hr = OpenSession(args, &session);
+    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    Acq* acquisition = session.driver.get();
+    std::string failed;
+    hr = table.Apply(acquisition, &failed);
+    if (FAILED(hr)) return ReportFailure(failed.c_str(), hr);
+    PrintReadings("Timebase", table.ReadAll(acquisition), args.Has("json"), "", 0);
+    hr = session.driver->Close();
+    if (FAILED(hr)) return ReportFailure("Close", hr);
+    return 0;
+}
+
+}  // namespace qn::tools
