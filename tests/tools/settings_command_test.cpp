@@ -1,0 +1,101 @@
+// qn731xx channel and timebase against the embedded emulator, and the
+// parsing of their option values.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "tools/commands.h"
+#include "tools/setting_table.h"
+
+namespace qn::tools {
+namespace {
+
+struct Result {
+    int rc;
+    std::string out;
+};
+
+Result Invoke(int (*command)(std::span<char*>), std::vector<std::string> words) {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    std::vector<char*> argv;
+    for (std::string& w : words) argv.push_back(w.data());
+    ::testing::internal::CaptureStdout();
+    ::testing::internal::CaptureStderr();
+    const int rc = command(argv);
+    std::string out = ::testing::internal::GetCapturedStdout();
+    ::testing::internal::GetCapturedStderr();
+    return {rc, out};
+}
+
+TEST(SettingsCommand, ChannelSetsAndPrintsTheInstrumentsValues) {
+    Result r = Invoke(ChannelCommand, {"2", "--model", "QMS3104A", "--probe", "10", "--range", "4",
+                                    "--coupling", "dc", "--label", "Clock", "--json"});
+    ASSERT_EQ(r.rc, 0) << r.out;
+    for (const char* field : {"\"channel\":2", "\"probe\":10", "\"range\":4", "\"coupling\":\"DC\"",
+                              "\"label\":\"\\\"Clock\\\"\"", "\"protection\":\"OK\""})
+        EXPECT_NE(r.out.find(field), std::string::npos) << field << " in " << r.out;
+
+    // A model without protection or skew prints them as not available.
+    r = Invoke(ChannelCommand, {"1", "--model", "QDS2012A", "--coupling", "GND"});
+    ASSERT_EQ(r.rc, 0);
+    EXPECT_NE(r.out.find("Coupling             GND"), std::string::npos) << r.out;
+    EXPECT_NE(r.out.find("Protection           n/a"), std::string::npos) << r.out;
+}
+
+TEST(SettingsCommand, TimebaseSetsAndPrintsTheInstrumentsValues) {
+    Result r = Invoke(TimebaseCommand, {"--time-per-record", "1e-3", "--points", "500", "--start-time",
+                                     "0", "--averages", "16", "--type", "average", "--json"});
+    ASSERT_EQ(r.rc, 0) << r.out;
+    for (const char* field : {"\"time-per-record\":0.001", "\"points\":500", "\"start-time\":0",
+                              "\"averages\":16", "\"type\":\"AVERAGE\"", "\"record-length\":500",
+                              "\"sample-rate\":500000"})
+        EXPECT_NE(r.out.find(field), std::string::npos) << field << " in " << r.out;
+}
+
+TEST(SettingsCommand, BadInputIsRefusedBeforeOrByTheDriver) {
+    const std::vector<std::vector<std::string>> usage_errors = {
+        {"0"}, {"1", "2"}, {"1", "--range", "4V"}, {"--coupling", "LF"}, {"--enabled", "maybe"},
+        {"--no-such-option"}};
+    for (const auto& words : usage_errors) EXPECT_EQ(Invoke(ChannelCommand, words).rc, 2);
+    EXPECT_EQ(Invoke(TimebaseCommand, {"--points", "1.5"}).rc, 2);
+    EXPECT_EQ(Invoke(TimebaseCommand, {"extra"}).rc, 2);
+    // Values the driver or the instrument refuses fail the command.
+    EXPECT_EQ(Invoke(ChannelCommand, {"3"}).rc, 1);  // QDS4032A has two channels
+    EXPECT_EQ(Invoke(ChannelCommand, {"1", "--impedance", "75"}).rc, 1);
+    EXPECT_EQ(Invoke(TimebaseCommand, {"--type", "envelope"}).rc, 1);
+    EXPECT_EQ(Invoke(TimebaseCommand, {"--help"}).rc, 0);
+}
+
+TEST(SettingsCommand, ValuesParseByKind) {
+    constexpr Choice kChoices[] = {{"AC", 0}, {"DC", 1}};
+    struct Case {
+        SettingKind kind;
+        const char* text;
+        bool ok;
+        const char* printed;
+    };
+    const Case cases[] = {
+        {SettingKind::kReal, "1e-3", true, "0.001"},  {SettingKind::kReal, "", false, ""},
+        {SettingKind::kReal, "2 V", false, ""},       {SettingKind::kInteger, "-7", true, "-7"},
+        {SettingKind::kInteger, "9999999999", false, ""},
+        {SettingKind::kSwitch, "ON", true, "on"},     {SettingKind::kSwitch, "0", true, "off"},
+        {SettingKind::kChoice, "dc", true, "DC"},     {SettingKind::kChoice, "D", false, ""},
+        {SettingKind::kQuotedText, "A B", true, "\"A B\""},
+        {SettingKind::kQuotedText, "\"Q\"", true, "\"Q\""},
+    };
+    for (const Case& c : cases) {
+        const SettingInfo info{"x", "X", "", c.kind, kChoices, true};
+        SettingValue v;
+        std::string error;
+        EXPECT_EQ(ParseSetting(info, c.text, &v, &error), c.ok) << c.text;
+        if (c.ok) {
+            EXPECT_EQ(FormatSetting(info, v), c.printed) << c.text;
+        }
+        EXPECT_EQ(error.empty(), c.ok) << c.text;
+    }
+}
+
+}  // namespace
+}  // namespace qn::tools
