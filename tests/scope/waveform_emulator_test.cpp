@@ -59,6 +59,15 @@ protected:
         if (x0) *x0 = initial;
         return hr;
     }
+    // The messages received, after a round trip so that commands sent
+    // without a reply have surely arrived; the round trip itself is left out.
+    std::vector<std::string> Received() {
+        std::string idn;
+        EXPECT_EQ(Io().InstrQuery("*IDN?", &idn, 256), S_OK);
+        auto all = emu_->ReceivedMessages();
+        all.pop_back();
+        return all;
+    }
     static std::string ErrorText() {
         com::ErrorRecord rec;
         return com::TakeThreadError(&rec) ? rec.description : std::string();
@@ -82,7 +91,7 @@ protected:
 TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
     Start("QDS4032A");
     ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:DIG"), S_OK);
-    emu_->ServeWaveformData(WordBlock({0, 8000, -32768, -8000}) + "\n");
+    emu_->ServeWaveformData(WordBlock({0, 8000, -32768, -8000}));
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel1", &v), S_IVISCOPE_INVALID_WFM_ELEMENT) << ErrorText();
     EXPECT_NE(ErrorText().find("At least one element in the retrieved waveform was invalid."),
@@ -130,7 +139,7 @@ TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:ACQ:TYPE PEAK;:DIG"), S_OK);
     std::vector<std::int16_t> raw(2001);
     for (std::size_t i = 0; i < raw.size(); ++i) raw[i] = static_cast<std::int16_t>(i);
-    emu_->ServeWaveformData(WordBlock(raw) + "\n");
+    emu_->ServeWaveformData(WordBlock(raw));
     SAFEARRAY *lo = nullptr, *hi = nullptr;
     double x0 = 0, dx = 0;
     auto m = Measurement("Channel1");
@@ -158,7 +167,7 @@ TEST_F(WaveformOnEmulator, HiddenSourceIsRefusedAndDigitalChannelsReadTheirBit) 
     ASSERT_EQ(Io().InstrWrite(":CHAN2:DISP 0;:POD2:DISP 1;:DIG"), S_OK);
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel2", &v), E_IVISCOPE_CHANNEL_NOT_ENABLED);
-    emu_->ServeWaveformData(std::string("#13\x04\x00\xFB\n", 7));
+    emu_->ServeWaveformData(std::string("#13\x04\x00\xFB", 6));
     ASSERT_EQ(Fetch("UserDigitalChannel10", &v), S_OK) << ErrorText();
     EXPECT_EQ(v, (std::vector<double>{1, 0, 0}));
     const auto sent = emu_->ReceivedMessages();
@@ -182,19 +191,19 @@ TEST_F(WaveformOnEmulator, InitiateWithDigitizeCompletesThroughStatus) {
     EXPECT_EQ(Io().InstrQuery("*ESE?", &ese), S_OK);
     EXPECT_EQ(ese, 36);
     EXPECT_EQ(coll->Abort(), S_OK);
-    EXPECT_EQ(emu_->ReceivedMessages().back(), ":STOP");
+    EXPECT_EQ(Received().back(), ":STOP");
 }
 
 TEST_F(WaveformOnEmulator, InitiateWithoutDigitizeStartsASingleAcquisition) {
     Start("73141D");
     auto* coll = static_cast<IQuorlen731XXMeasurements*>(driver_.get());
     ASSERT_EQ(coll->Initiate(), S_OK) << ErrorText();
-    EXPECT_EQ(emu_->ReceivedMessages().back(), ":SING");
+    EXPECT_EQ(Received().back(), ":SING");
     EXPECT_FALSE(driver_->Core().acquisition_control.pending);
     Quorlen731XXAcquisitionStatusEnum s = Quorlen731XXAcqStatusUnknown;
     EXPECT_EQ(coll->Status(&s), S_OK);
     EXPECT_NE(s, Quorlen731XXAcqStatusUnknown);
-    EXPECT_EQ(emu_->ReceivedMessages().back(), "OPER?");
+    EXPECT_EQ(Received().back(), "OPER?");
 }
 
 // Faults in the data block: each ends in an error within the timeout, with
@@ -210,11 +219,11 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
         HRESULT expected;
     };
     const Case cases[] = {
-        {"cut short", "#42000" + payload + "\n", E_QUORLEN731XX_IO_TIMEOUT},
-        {"header lies about its digit count", "#9" + payload + "\n", E_QUORLEN731XX_IO_GENERAL},
-        {"header beyond any record", "#9999999999" + payload + "\n", E_QUORLEN731XX_IO_GENERAL},
-        {"odd byte count for words", "#13abc\n", E_QUORLEN731XX_IO_GENERAL},
-        {"not a block", "1,2,3\n", E_QUORLEN731XX_IO_GENERAL},
+        {"cut short", "#42000" + payload, E_QUORLEN731XX_IO_TIMEOUT},
+        {"header lies about its digit count", "#9" + payload, E_QUORLEN731XX_IO_GENERAL},
+        {"header beyond any record", "#9999999999" + payload, E_QUORLEN731XX_IO_GENERAL},
+        {"odd byte count for words", "#13abc", E_QUORLEN731XX_IO_GENERAL},
+        {"not a block", "1,2,3", E_QUORLEN731XX_IO_GENERAL},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
@@ -230,7 +239,7 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
     }
     // A block longer than it declares: the declared part is the record and
     // the rest of the message is discarded.
-    emu_->ServeWaveformData(WordBlock({1, 2}) + "extra bytes\n");
+    emu_->ServeWaveformData(WordBlock({1, 2}) + "extra bytes");
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
     EXPECT_EQ(v.size(), 2u);
