@@ -40,19 +40,6 @@ TEST_F(AcquisitionTraffic, PointCountsAboveTheModelLimitAskForTheMaximum) {
     }
 }
 
-TEST_F(AcquisitionTraffic, PointReadsSelectADisplayedSourceFirst) {
-    Open("73141D");
-    ExpectSourceDisplayed("CHAN2");
-    io_->Expect(":WAV:POIN?\n", "500\n");
-    LONG n = 0;
-    EXPECT_EQ(Acq()->get_NumberOfPointsMin(&n), S_OK);
-    EXPECT_EQ(n, 500);
-    ExpectSourceDisplayed("CHAN2");
-    io_->Expect(":WAV:POIN?\n", "2000\n");
-    EXPECT_EQ(IviAcq()->get_RecordLength(&n), S_OK);
-    EXPECT_EQ(n, 2000);
-}
-
 TEST_F(AcquisitionTraffic, StartTimeFollowsTheReferencePoint) {
     const std::pair<const char*, double> cases[] = {
         {"LEFT", -0.0001}, {"CENT", -0.0005}, {"RIGHT", -0.0009}, {"RIGH", -0.0009}};

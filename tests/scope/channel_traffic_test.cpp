@@ -87,6 +87,8 @@ TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {
               E_QUORLEN731XX_VERTICAL_GROUND_COUPLING);
     EXPECT_EQ(User(1)->put_Coupling(static_cast<Quorlen731XXVerticalCouplingEnum>(3)),
               E_IVI_INVALID_VALUE);
+    EXPECT_EQ(User(1)->put_Units(static_cast<Quorlen731XXChannelUnitsEnum>(2)),
+              E_IVI_INVALID_VALUE);
     io_->Expect(":CHAN1:COUP AC\n").Expect(":CHAN1:COUP DC\n");
     EXPECT_EQ(Ivi(1)->put_Coupling(IviScopeVerticalCouplingAC), S_OK);
     EXPECT_EQ(User(1)->put_Coupling(Quorlen731XXVerticalCouplingDC), S_OK);
@@ -161,17 +163,6 @@ TEST_F(ChannelTraffic, LabelsWithLineBreaksOrNulAreRefused) {
     EXPECT_EQ(User(1)->put_Label(label.get()), S_OK);
     EXPECT_EQ(User(1)->get_Label(label.Out()), S_OK);
     EXPECT_EQ(label.utf8(), "\"Clock\"");
-}
-
-TEST_F(ChannelTraffic, UnitsUseTheirTokens) {
-    Open("73141D");
-    io_->Expect(":CHAN1:UNIT AMP\n").Expect(":CHAN1:UNIT?\n", "VOLT\n");
-    EXPECT_EQ(User(1)->put_Units(Quorlen731XXAmps), S_OK);
-    EXPECT_EQ(User(1)->put_Units(static_cast<Quorlen731XXChannelUnitsEnum>(2)),
-              E_IVI_INVALID_VALUE);
-    Quorlen731XXChannelUnitsEnum units = Quorlen731XXAmps;
-    EXPECT_EQ(User(1)->get_Units(&units), S_OK);
-    EXPECT_EQ(units, Quorlen731XXVolts);
 }
 
 }  // namespace
