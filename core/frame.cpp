@@ -10,6 +10,19 @@ HRESULT CheckOut(CDriverNode& node, const MemberInfo& m, std::size_t index, cons
     return node.Errors().NullPointer(m.entry, param);
 }
 
+std::string VisibleText(std::string_view text) {
+    std::string out;
+    for (char c : text) {
+        if (c == '\n')
+            out += "\\n";
+        else if (c == '\0')
+            out += "\\0";
+        else
+            out += c;
+    }
+    return out;
+}
+
 HRESULT OutOfMemory(CDriverNode& node) { return node.Errors().Error(Msg::E_IVI_OUT_OF_MEMORY); }
 
 HRESULT InternalError(CDriverNode& node, const char* what) {

@@ -116,6 +116,8 @@ void Preset(T* p) {
 }
 
 HRESULT CheckOut(CDriverNode& node, const MemberInfo& m, std::size_t index, const void* p);
+// The text with line feeds and NULs shown as \n and \0, for error messages.
+std::string VisibleText(std::string_view text);
 HRESULT InternalError(CDriverNode& node, const char* what);
 HRESULT OutOfMemory(CDriverNode& node);
 
@@ -129,7 +131,7 @@ HRESULT AddCommandArg(CDriverNode& node, const MemberInfo& m, std::size_t index,
     } else if constexpr (std::is_same_v<T, BSTR>) {
         std::string text = com::BstrToUtf8(v);
         if (text.find('\n') != std::string::npos || text.find('\0') != std::string::npos)
-            return node.Errors().InvalidValue(m.entry, m.params[index], std::string_view(text));
+            return node.Errors().InvalidValue(m.entry, m.params[index], VisibleText(text));
         list.AddText(std::move(text));
     } else if constexpr (std::is_floating_point_v<T>) {
         list.Add(CommandArg(static_cast<double>(v)));

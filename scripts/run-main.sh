@@ -5,5 +5,5 @@ set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 "$root/scripts/setup.sh"
 "$root/scripts/build.sh" build >/dev/null
-if [ $# -eq 0 ]; then set -- info; fi
+if [ $# -eq 0 ]; then set -- demo; fi
 exec "$root/build/tools/qn731xx" "$@"
