@@ -11,7 +11,9 @@
 #include <string>
 
 #include "IviDriver.h"
+#include "IviScope.h"
 #include "Quorlen731XXIds.h"
+#include "emulator/emulator.h"
 
 namespace {
 
@@ -91,6 +93,36 @@ TEST_F(DriverActivation, CreatesTheDriverByProgIdAndByClsid) {
     ASSERT_EQ(unknown.As(driver), S_OK);
     unknown.reset();
     UseSimulatedSession(driver.get());
+}
+
+// The whole client flow: by ProgID, against an instrument (the emulator on a
+// loopback socket), reading a collection and the identity.
+TEST_F(DriverActivation, AClientDrivesAnInstrumentThroughTheProgId) {
+    qn::emu::Emulator emu("QMS3104A");
+    const std::uint16_t port = emu.Start();
+    CLSID clsid = GUID_NULL;
+    ASSERT_EQ(CLSIDFromProgID(u"Quorlen731XX.Quorlen731XX", &clsid), S_OK);
+    ComPtr<IIviDriver> driver;
+    ASSERT_EQ(CoCreateInstance(clsid, nullptr, CLSCTX_ALL, iid_of<IIviDriver>, driver.OutVoid()),
+              S_OK);
+    qn::com::Bstr resource("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), options("");
+    ASSERT_EQ(driver->Initialize(resource.get(), VARIANT_TRUE, VARIANT_FALSE, options.get()), S_OK);
+    ComPtr<IIviScopeChannels> channels;
+    ASSERT_EQ(driver->QueryInterface(iid_of<IIviScopeChannels>, channels.OutVoid()), S_OK);
+    LONG count = 0;
+    EXPECT_EQ(channels->get_Count(&count), S_OK);
+    EXPECT_EQ(count, 4);
+    qn::com::Bstr name;
+    EXPECT_EQ(channels->get_Name(1, name.Out()), S_OK);
+    EXPECT_EQ(name.utf8(), "Channel1");
+    ComPtr<IIviDriverIdentity> identity;
+    ASSERT_EQ(driver->QueryInterface(iid_of<IIviDriverIdentity>, identity.OutVoid()), S_OK);
+    qn::com::Bstr model, maker;
+    EXPECT_EQ(identity->get_InstrumentModel(model.Out()), S_OK);
+    EXPECT_EQ(model.utf8(), "QMS3104A");
+    EXPECT_EQ(identity->get_InstrumentManufacturer(maker.Out()), S_OK);
+    EXPECT_EQ(maker.utf8(), "QUORLEN TECHNOLOGIES");
+    EXPECT_EQ(driver->Close(), S_OK);
 }
 
 TEST_F(DriverActivation, AnUnregisteredDriverIsNotFound) {
