@@ -1,5 +1,7 @@
 #include "services/tracer.h"
 
+#include <algorithm>
+
 #include <unistd.h>
 
 #include <cstdio>
@@ -212,6 +214,9 @@ HRESULT CTraceOwner::Save() {
         HRESULT hr = WriteDocument(*doc_, &size);
         lastSave_ = Now();
         if (FAILED(hr)) return hr;
+        savedBytes_ = size;
+        savedRecords_ += recordsSinceSave_;
+        recordsSinceSave_ = 0;
         if (enabled_ && static_cast<long long>(size) > static_cast<long long>(sizeLimit_))
             state_ = kFull;
         return S_OK;
@@ -224,9 +229,16 @@ HRESULT CTraceOwner::Save() {
 
 HRESULT CTraceOwner::OnCallEnd() {
     if (state_ != kRecording) return S_FALSE;
+    ++recordsSinceSave_;
     std::int64_t elapsed = Now() - lastSave_;
     // A clock set back also saves, rather than waiting for it to catch up.
     if (elapsed < 0 || elapsed / 60 >= saveInterval_) return Save();
+    constexpr std::uintmax_t kFirstRecordGuess = 256;  // bytes, before any measure
+    const std::uintmax_t per_record =
+        savedRecords_ ? std::max<std::uintmax_t>(savedBytes_ / savedRecords_, 1) : kFirstRecordGuess;
+    if (sizeLimit_ >= 0 &&
+        savedBytes_ + recordsSinceSave_ * per_record > static_cast<std::uintmax_t>(sizeLimit_))
+        return Save();
     return S_FALSE;
 }
 

@@ -109,6 +109,11 @@ class CTracer {
     std::string filePath_;
     std::string transform_;
     std::int64_t lastSave_ = 0;
+    // What the last save wrote, and the calls recorded since: together they
+    // estimate the document's size between saves.
+    std::uintmax_t savedBytes_ = 0;
+    std::uintmax_t savedRecords_ = 0;
+    std::uintmax_t recordsSinceSave_ = 0;
     Clock clock_ = nullptr;
 };
 
@@ -141,7 +146,9 @@ class CTraceOwner : public CTracer {
     // turns the state to full.
     HRESULT Save();
     // The save rule after each traced call: saves when at least the save
-    // interval (minutes) has passed since the last save.
+    // interval (minutes) has passed since the last save, or earlier when the
+    // records made since would take the file past the size limit (so the
+    // document in memory stays bounded by the limit, not by the interval).
     HRESULT OnCallEnd();
 
     const std::shared_ptr<TraceDocument>& Document() const { return doc_; }

@@ -272,6 +272,19 @@ TEST_F(TracerTest, SizeLimitStopsRecording) {
     EXPECT_EQ(CountMethods(t.GetFilePath()), 2u);
 }
 
+TEST_F(TracerTest, SizeLimitBoundsTheTraceBetweenIntervalSaves) {
+    CTraceOwner t;
+    Start(t, "bounded", 60);  // an hour between interval saves
+    t.SetSizeLimit(4000);
+    int calls = 0;
+    while (t.GetState() == CTracer::kRecording && calls < 10000) TracedCall(t, ++calls, 0, "");
+    // The limit was reached within the hour: the file was saved early and the
+    // trace is full, instead of growing in memory until the next save.
+    EXPECT_EQ(t.GetState(), CTracer::kFull);
+    EXPECT_LT(calls, 100);
+    EXPECT_GT(fs::file_size(t.GetFilePath()), 4000u);
+}
+
 TEST_F(TracerTest, SessionsInTheSameSecondShareOneFile) {
     std::string path;
     {
