@@ -41,6 +41,9 @@ void Run(benchmark::State& state, bool recording) {
         qn::CTraceOwner tracer;
         tracer.SetTraceName((dir / "bench.xml").string());
         tracer.SetSaveInterval(1);
+        // A limit above what the calls produce, so every call is recorded
+        // (at the default limit the trace turns full after a few thousand).
+        tracer.SetSizeLimit(2000000000);
         if (recording) {
             tracer.SetEnabled(true);
             if (FAILED(tracer.StartSessionTracing())) state.SkipWithError("trace did not start");
