@@ -213,33 +213,6 @@ HRESULT FormatValue(const VARIANT& value, VARTYPE vt, std::string* out, std::str
     return S_OK;
 }
 
-void SwapBytes(void* data, std::size_t bytes, std::size_t elem) {
-    auto* p = static_cast<unsigned char*>(data);
-    const std::size_t n = bytes / elem;
-    if (elem == 2) {
-        for (std::size_t i = 0; i < n; ++i) {
-            std::uint16_t x;
-            std::memcpy(&x, p + 2 * i, 2);
-            x = std::uint16_t((x << 8) | (x >> 8));
-            std::memcpy(p + 2 * i, &x, 2);
-        }
-    } else if (elem == 4) {
-        for (std::size_t i = 0; i < n; ++i) {
-            std::uint32_t x;
-            std::memcpy(&x, p + 4 * i, 4);
-            x = __builtin_bswap32(x);
-            std::memcpy(p + 4 * i, &x, 4);
-        }
-    } else if (elem == 8) {
-        for (std::size_t i = 0; i < n; ++i) {
-            std::uint64_t x;
-            std::memcpy(&x, p + 8 * i, 8);
-            x = __builtin_bswap64(x);
-            std::memcpy(p + 8 * i, &x, 8);
-        }
-    }
-}
-
 bool NeedsSwap(bool instrument_big_endian) {
     return instrument_big_endian != (std::endian::native == std::endian::big);
 }
