@@ -240,7 +240,7 @@ void Emulator::GarbleReplies(int count) {
 
 void Emulator::ServeWaveformData(std::string raw_bytes) {
     std::lock_guard lock(mutex_);
-    faults_.waveform_data = std::move(raw_bytes);
+    faults_.waveform_data = std::make_shared<const std::string>(std::move(raw_bytes));
 }
 
 void Emulator::ClearWaveformData() {

@@ -65,7 +65,7 @@ class Emulator {
         int suppress = 0;
         bool drop_on_query = false;
         int garble = 0;
-        std::optional<std::string> waveform_data;
+        std::shared_ptr<const std::string> waveform_data;
         std::uint8_t forced_events = 0;
     };
 

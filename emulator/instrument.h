@@ -6,6 +6,7 @@
 #include <chrono>
 #include <cstdint>
 #include <optional>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -59,10 +60,13 @@ class Instrument {
     const AcquiredRecord& record() const { return record_; }
 
     // Test hook: raw bytes served verbatim as the reply to :WAV:DATA? while set.
-    void set_waveform_override(std::optional<std::string> bytes) {
+    // Shared, not copied: a large block costs nothing on the other messages.
+    void set_waveform_override(std::shared_ptr<const std::string> bytes) {
         waveform_override_ = std::move(bytes);
     }
-    const std::optional<std::string>& waveform_override() const { return waveform_override_; }
+    const std::shared_ptr<const std::string>& waveform_override() const {
+        return waveform_override_;
+    }
 
   private:
     using Clock = std::chrono::steady_clock;
@@ -85,7 +89,7 @@ class Instrument {
     Clock::time_point done_at_{};
     AcquiredRecord record_;
     std::uint32_t acquisitions_ = 0;
-    std::optional<std::string> waveform_override_;
+    std::shared_ptr<const std::string> waveform_override_;
 };
 
 }  // namespace qn::emu
