@@ -143,11 +143,9 @@ HRESULT AddCommandArg(CDriverNode& node, const MemberInfo& m, std::size_t index,
 
 }  // namespace frame_detail
 
-// Runs `body` (a callable returning HRESULT) inside the frame of member `m`
-// on object `node`. `args` are the member's parameters wrapped in In / Out, in
-// the order of m.params.
+// The frame's steps; RunFrame below is the entry every member uses.
 template <class Body, class... Args>
-HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... args) noexcept {
+HRESULT RunFrameSteps(CDriverNode& node, const MemberInfo& m, Body&& body, Args&... args) {
     using namespace frame_detail;
     SessionCore& core = node.Core();
     std::lock_guard<com::CriticalSection> lock(core.lock);                        // 1
@@ -237,5 +235,19 @@ HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... ar
         return InternalError(node, "unknown exception");
     }
 }                                                                                 // 12
+
+// Runs `body` (a callable returning HRESULT) inside the frame of member `m`
+// on object `node`. `args` are the member's parameters wrapped in In / Out, in
+// the order of m.params. Nothing thrown anywhere in the frame leaves it.
+template <class Body, class... Args>
+HRESULT RunFrame(CDriverNode& node, const MemberInfo& m, Body&& body, Args... args) noexcept {
+    try {
+        return RunFrameSteps(node, m, std::forward<Body>(body), args...);
+    } catch (const std::bad_alloc&) {
+        return frame_detail::OutOfMemory(node);
+    } catch (...) {
+        return frame_detail::InternalError(node, "the method frame could not be entered");
+    }
+}
 
 }  // namespace qn
