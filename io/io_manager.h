@@ -7,8 +7,10 @@
 // Timeouts: -1 no timeout, -2 (kTimeoutSession) keeps the session timeout.
 #pragma once
 
+#include <cstring>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 #include "core/node.h"
 #include "io/command_format.h"
@@ -117,6 +119,63 @@ public:
                                        bool seek_to_block, bool flush_to_end,
                                        LONG timeout = kTimeoutSession, bool poll = true);
     HRESULT FormattedFlushWrite(bool send_end, LONG timeout = kTimeoutSession);
+    // Typed and counted-array forms of the formatted operations (element
+    // types SHORT, LONG, float, double; BYTE for blocks).
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedWriteNumber(T val, bool flush_and_end, LONG timeout = kTimeoutSession) {
+        com::Variant v = ValueVariant(val);
+        return FormattedWriteNumber(v, TypeCode<T>(), flush_and_end, timeout);
+    }
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedReadNumber(T* val, bool flush_to_end, LONG timeout = kTimeoutSession) {
+        if (!val) return E_POINTER;
+        com::Variant v;
+        HRESULT hr =
+            FormattedReadNumber(TypeCode<T>(), flush_to_end, static_cast<VARIANT*>(&v), timeout);
+        if (SUCCEEDED(hr)) *val = FromVariant<T>(v);
+        return hr;
+    }
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedWriteList(const T* values, LONG length, std::string_view separator,
+                               bool flush_and_end, LONG timeout = kTimeoutSession) {
+        com::Variant v;
+        HRESULT hr = ArrayVariant(values, length, &v);
+        if (FAILED(hr)) return hr;
+        return FormattedWriteList(static_cast<VARIANT*>(&v), TypeCode<T>(), separator,
+                                  flush_and_end, timeout);
+    }
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedWriteIEEEBlock(std::string_view command, const T* values, LONG length,
+                                    bool flush_and_end, LONG timeout = kTimeoutSession) {
+        com::Variant v;
+        HRESULT hr = ArrayVariant(values, length, &v);
+        if (FAILED(hr)) return hr;
+        return FormattedWriteIEEEBlock(command, v, flush_and_end, timeout);
+    }
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedReadList(T* values, LONG max_length, LONG* actual,
+                              std::string_view separator = ",", LONG timeout = kTimeoutSession) {
+        if (!values || !actual) return E_POINTER;
+        *actual = 0;
+        if (max_length < 0) return E_INVALIDARG;
+        com::Variant v;
+        HRESULT hr = FormattedReadList(TypeCode<T>(), separator, static_cast<VARIANT*>(&v), timeout);
+        if (FAILED(hr)) return hr;
+        return CopyOut(v, values, max_length, actual);
+    }
+    template <class T>
+        requires std::is_arithmetic_v<T>
+    HRESULT FormattedReadIEEEBlock(T* values, LONG max_length, LONG* actual, bool seek_to_block,
+                                   bool flush_to_end, LONG timeout = kTimeoutSession) {
+        return FormattedReadIEEEBlockInto(TypeCode<T>(), values, max_length, actual,
+                                          seek_to_block, flush_to_end, timeout);
+    }
+
     HRESULT FormattedFlushRead(LONG timeout = kTimeoutSession);
     HRESULT FormattedSetBufferSize(LONG mask, LONG size);  // no poll, no error handler
 
@@ -134,6 +193,85 @@ public:
     static LONG BinaryType(LONG type);  // 2,3,4,5,17 pass, anything else 2
 
 private:
+    template <class T>
+    static constexpr LONG TypeCode() {
+        if constexpr (std::is_same_v<T, SHORT>) return visa::ASCIIType_I2;
+        else if constexpr (std::is_same_v<T, LONG>) return visa::ASCIIType_I4;
+        else if constexpr (std::is_same_v<T, float>) return visa::ASCIIType_R4;
+        else if constexpr (std::is_same_v<T, double>) return visa::ASCIIType_R8;
+        else {
+            static_assert(std::is_same_v<T, BYTE>, "SHORT, LONG, float, double or BYTE");
+            return visa::ASCIIType_UI1;
+        }
+    }
+    template <class T>
+    static constexpr VARTYPE VarType() {
+        constexpr LONG c = TypeCode<T>();
+        return c == visa::ASCIIType_I2 ? VARTYPE(VT_I2)
+             : c == visa::ASCIIType_I4 ? VARTYPE(VT_I4)
+             : c == visa::ASCIIType_R4 ? VARTYPE(VT_R4)
+             : c == visa::ASCIIType_R8 ? VARTYPE(VT_R8) : VARTYPE(VT_UI1);
+    }
+    template <class T>
+    static com::Variant ValueVariant(T val) {
+        com::Variant v;
+        v.vt = VarType<T>();
+        std::memcpy(&v.llVal, &val, sizeof(T));
+        return v;
+    }
+    template <class T>
+    static T FromVariant(const VARIANT& v) {
+        switch (v.vt) {
+            case VT_I2: return static_cast<T>(v.iVal);
+            case VT_I4: return static_cast<T>(v.lVal);
+            case VT_R4: return static_cast<T>(v.fltVal);
+            case VT_R8: return static_cast<T>(v.dblVal);
+            case VT_UI1: return static_cast<T>(v.bVal);
+            default: return T{};
+        }
+    }
+    template <class T>
+    static HRESULT ArrayVariant(const T* values, LONG length, com::Variant* out) {
+        if (!values && length > 0) return E_POINTER;
+        if (length < 0) return E_INVALIDARG;
+        com::SafeArray a = com::SafeArray::Vector(VarType<T>(), static_cast<ULONG>(length));
+        if (!a) return E_OUTOFMEMORY;
+        if (length) std::memcpy(a.data<T>(), values, sizeof(T) * static_cast<std::size_t>(length));
+        out->vt = VT_ARRAY | VarType<T>();
+        out->parray = a.Detach();
+        return S_OK;
+    }
+    // Copies an array (or single value) read into VARIANT v into the caller's
+    // counted buffer; more elements than fit is E_INVALIDARG after filling it.
+    template <class T>
+    static HRESULT CopyOut(const VARIANT& v, T* values, LONG max_length, LONG* actual) {
+        if (!(v.vt & VT_ARRAY)) {
+            if (max_length < 1) return E_INVALIDARG;
+            values[0] = FromVariant<T>(v);
+            *actual = 1;
+            return S_OK;
+        }
+        const ULONG n = com::SafeArrayCount(v.parray);
+        const ULONG take = n < static_cast<ULONG>(max_length) ? n : static_cast<ULONG>(max_length);
+        const VARTYPE element = static_cast<VARTYPE>(v.vt & ~VT_ARRAY);
+        const char* data = static_cast<const char*>(v.parray->pvData);
+        const std::size_t size = v.parray->cbElements;
+        for (ULONG i = 0; i < take; ++i) {
+            if (element == VT_VARIANT) {
+                values[i] = FromVariant<T>(reinterpret_cast<const VARIANT*>(data)[i]);
+                continue;
+            }
+            if (size > sizeof(LONGLONG)) return E_UNEXPECTED;
+            VARIANT e;
+            VariantInit(&e);
+            e.vt = element;
+            std::memcpy(&e.llVal, data + std::size_t(i) * size, size);
+            values[i] = FromVariant<T>(e);
+        }
+        *actual = static_cast<LONG>(take);
+        return take < n ? E_INVALIDARG : S_OK;
+    }
+
     const std::string& CurrentCommand() const;
     CDriverIOProvider& Provider() const;
     HRESULT Write(const char* op, std::string cmd, LONG timeout, bool poll);

@@ -99,6 +99,59 @@ TEST_F(DriverOnEmulator, MissingReplyTimesOutAndTheSessionRecovers) {
     EXPECT_EQ(reply, "0");
 }
 
+TEST_F(DriverOnEmulator, TypedFormattedOperations) {
+    Start("QDS4032A");
+    ASSERT_EQ(Init(), S_OK) << ErrorText();
+    // A number written after a command text, read back as a number.
+    ASSERT_EQ(Io().FormattedWriteString("*ESE ", false), S_OK);
+    ASSERT_EQ(Io().FormattedWriteNumber(LONG{36}, false), S_OK);
+    ASSERT_EQ(Io().FormattedWriteString("\n", true), S_OK);  // nothing is appended
+    ASSERT_EQ(Io().FormattedWriteString("*ESE?\n", true), S_OK);
+    LONG ese = 0;
+    ASSERT_EQ(Io().FormattedReadNumber(&ese, true), S_OK);
+    EXPECT_EQ(ese, 36);
+    // A list into a counted buffer: the preamble's ten fields, and a buffer
+    // too short for them.
+    double fields[10] = {};
+    LONG n = 0;
+    ASSERT_EQ(Io().FormattedWriteString(":WAV:PRE?\n", true), S_OK);
+    ASSERT_EQ(Io().FormattedReadList(fields, 10, &n), S_OK);
+    EXPECT_EQ(n, 10);
+    EXPECT_GT(fields[4], 0.0);  // x increment
+    ASSERT_EQ(Io().FormattedWriteString(":WAV:PRE?\n", true), S_OK);
+    EXPECT_EQ(Io().FormattedReadList(fields, 3, &n), E_INVALIDARG);
+    EXPECT_EQ(n, 3);
+    // A list written after a command text sets a value the instrument reports.
+    const double range[] = {0.002};
+    ASSERT_EQ(Io().FormattedWriteString(":TIM:RANG ", false), S_OK);
+    ASSERT_EQ(Io().FormattedWriteList(range, 1, ",", false), S_OK);
+    ASSERT_EQ(Io().FormattedWriteString("\n", true), S_OK);
+    double read_back = 0;
+    ASSERT_EQ(Io().InstrQuery(":TIM:RANG?", &read_back), S_OK);
+    EXPECT_EQ(read_back, 0.002);
+    // A block written after a command: the bytes arrive as a definite block
+    // (this instrument has no command taking one, so it reports -113 for it).
+    const BYTE bytes[] = {1, 2, 10, 3};
+    emu_->ClearReceivedMessages();
+    ASSERT_EQ(Io().FormattedWriteIEEEBlock(":NO:BLOCk ", bytes, 4, false), S_OK);
+    ASSERT_EQ(Io().FormattedWriteString("\n", true), S_OK);
+    LONG code = 0;
+    com::Bstr msg;
+    ASSERT_EQ(driver_->ErrorQuery(&code, msg.Out()), S_OK);
+    EXPECT_EQ(code, -113);
+    ASSERT_FALSE(emu_->ReceivedMessages().empty());
+    EXPECT_EQ(emu_->ReceivedMessages().front(), std::string(":NO:BLOCk #14\x01\x02\n\x03", 17));
+    // A block of 16-bit words into a counted buffer, big-endian on the wire.
+    emu_->ServeWaveformData(std::string("#16\x00\x01\xff\xfe\x80\x00", 9));
+    ASSERT_EQ(Io().FormattedWriteString(":WAV:DATA?\n", true), S_OK);
+    SHORT words[8] = {};
+    ASSERT_EQ(Io().FormattedReadIEEEBlock(words, 8, &n, false, true), S_OK);
+    ASSERT_EQ(n, 3);
+    EXPECT_EQ(words[0], 1);
+    EXPECT_EQ(words[1], -2);
+    EXPECT_EQ(words[2], -32768);
+}
+
 TEST_F(DriverOnEmulator, DroppedConnectionIsAnIoError) {
     Start("QDS4032A");
     ASSERT_EQ(Init(), S_OK) << ErrorText();
