@@ -1,6 +1,8 @@
 // The object model of a session: building the instance lists of the
 // repeated capabilities, the session notifications, and the collections.
 
+#include <algorithm>
+
 #include "Quorlen731XXErrors.h"
 #include "core/children.h"
 #include "core/features.h"
@@ -43,6 +45,11 @@ void ForEachChild(SessionCore& core, F&& f) {
         if (const auto* list = core.repcaps.List(static_cast<RepCapClass>(c)))
             for (const RepCapInstance& r : *list) f(static_cast<RepCapClass>(c), r);
 }
+
+// The most instances of one kind a session builds. The instruments have at
+// most four analog and sixteen digital channels; a larger count reported by
+// the instrument is a bad reply, not a reason to create millions of objects.
+constexpr long kMaxInstanceCount = 1024;
 
 bool IsOneOf(std::string_view model, std::initializer_list<std::string_view> models) {
     for (std::string_view m : models)
@@ -93,13 +100,17 @@ HRESULT Quorlen731XX::BuildInstanceLists() {
             } else {
                 hr = io.InstrQuery("SYST:DATA:VAL? \"COUN:POD\"", &pods);
                 if (SUCCEEDED(hr)) hr = io.InstrQuery("SYST:DATA:VAL? \"POD:SIZE\"", &size);
-                digital = static_cast<long>(pods) * size;
+                // Each factor on its own: two negative replies must not
+                // multiply into a large positive count.
+                digital = static_cast<long>(std::max<LONG>(pods, 0)) * std::max<LONG>(size, 0);
             }
         }
         qis = saved;
         if (FAILED(hr)) return hr;
         if (analog < 0) analog = 0;
         if (digital < 0) digital = 0;
+        if (analog > kMaxInstanceCount || digital > kMaxInstanceCount)
+            return Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
     }
     const std::shared_ptr<SessionCore>& cp = CorePtr();
     core.repcaps.Clear();

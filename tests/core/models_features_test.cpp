@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <map>
 
+#include "Quorlen731XXErrors.h"
 #include "core/features.h"
 #include "core/models.h"
 #include "core/root.h"
@@ -88,6 +89,42 @@ TEST(Discovery, AFailingQueryEndsDiscoveryButNotInitialize) {
     // The instance lists were built from the instrument's own counts.
     EXPECT_EQ(driver->Core().repcaps.List(RepCapClass::kChannel)->size(), 2u);
     EXPECT_EQ(driver->Core().repcaps.List(RepCapClass::kUserDigitalChannel)->size(), 0u);
+}
+
+// Channel counts the instrument reports are bounded before any instance is
+// created: a hostile count fails Initialize instead of allocating without
+// end, and two negative pod replies do not multiply into a large count.
+TEST(Discovery, HostileChannelCountsAreBounded) {
+    struct Case {
+        const char* chan;
+        const char* pods;
+        const char* size;
+        bool fails;
+    };
+    const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
+    for (const Case& c : {Case{"2147483647", "0", "8", true}, Case{"4", "2147483647", "8", true},
+                          Case{"4", "-2147483648", "-2147483648", false},
+                          Case{"4", "-65536", "-65536", false}}) {
+        SCOPED_TRACE(std::string(c.chan) + " " + c.pods + " " + c.size);
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+        auto p = std::make_unique<ScriptedProvider>();
+        ScriptedProvider* io = p.get();
+        driver->Core().io = std::move(p);
+        io->Expect("*IDN?\n", idn)
+            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", std::string(c.chan) + "\n")
+            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", std::string(c.pods) + "\n")
+            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", std::string(c.size) + "\n");
+        if (!c.fails)  // a timeout ends feature discovery
+            io->Expect("*IDN?\n", idn).ExpectTimeout(":SYST:DATA:VER? \"DISP:LAB\"\n");
+        com::Bstr r("scripted"), o("");
+        EXPECT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()),
+                  c.fails ? E_IVI_UNEXPECTED_RESPONSE : S_OK);
+        EXPECT_TRUE(io->Done());
+        if (!c.fails) {
+            EXPECT_EQ(driver->Core().repcaps.List(RepCapClass::kUserDigitalChannel)->size(), 0u);
+        }
+    }
 }
 
 }  // namespace
