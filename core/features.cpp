@@ -31,6 +31,8 @@ HRESULT QueryVersioned(CDriverIOManager& io, std::string_view key, bool* present
     return hr;
 }
 
+bool InRange(LONG count) { return count >= 0 && count <= kMaxChannelCount; }
+
 }  // namespace
 
 bool IsEarlyFamilyModel(std::string_view model) {
@@ -90,8 +92,13 @@ FeatureRecord DiscoverFeatures(CDriverNode& root, std::string_view model) {
     LONG pods = 0, pod_size = 0;
     if (FAILED(io.InstrQuery(KeyQuery("VAL", "COUN:POD"), &pods))) return f;
     if (FAILED(io.InstrQuery(KeyQuery("VAL", "POD:SIZE"), &pod_size))) return f;
+    // Counts outside 0..kMaxChannelCount are bad replies: they end
+    // discovery like a failed query (and are never multiplied unchecked).
+    if (!InRange(pods) || !InRange(pod_size) || !InRange(pods * pod_size)) return f;
     f.digital_channel_count = pods * pod_size;
-    if (FAILED(io.InstrQuery(KeyQuery("VAL", "COUN:CHAN"), &f.analog_channel_count))) return f;
+    LONG analog = 0;
+    if (FAILED(io.InstrQuery(KeyQuery("VAL", "COUN:CHAN"), &analog)) || !InRange(analog)) return f;
+    f.analog_channel_count = analog;
     if (FAILED(io.InstrQuery(KeyQuery("VAL", "CHAN:BAND"), &f.bandwidth))) return f;
     if (FAILED(io.InstrQuery(KeyQuery("VAL", "CHAN:BWL"), &f.bandwidth_limit))) return f;
     if (FAILED(QueryText(io, "CHAN:FEAT", &text))) return f;

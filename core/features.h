@@ -29,6 +29,11 @@ struct FeatureRecord {
     bool counted_maximum_points = false;  // set only by discovery
 };
 
+// The largest channel count of either kind a session accepts from the
+// instrument; the real models have at most four analog and sixteen digital
+// channels, so a larger reply is a bad one.
+inline constexpr LONG kMaxChannelCount = 1024;
+
 // True for the models of the "7312X" and "7314X" families.
 bool IsEarlyFamilyModel(std::string_view model);
 

@@ -46,11 +46,6 @@ void ForEachChild(SessionCore& core, F&& f) {
             for (const RepCapInstance& r : *list) f(static_cast<RepCapClass>(c), r);
 }
 
-// The most instances of one kind a session builds. The instruments have at
-// most four analog and sixteen digital channels; a larger count reported by
-// the instrument is a bad reply, not a reason to create millions of objects.
-constexpr long kMaxInstanceCount = 1024;
-
 bool IsOneOf(std::string_view model, std::initializer_list<std::string_view> models) {
     for (std::string_view m : models)
         if (m == model) return true;
@@ -109,7 +104,8 @@ HRESULT Quorlen731XX::BuildInstanceLists() {
         if (FAILED(hr)) return hr;
         if (analog < 0) analog = 0;
         if (digital < 0) digital = 0;
-        if (analog > kMaxInstanceCount || digital > kMaxInstanceCount)
+        // A larger count is a bad reply, not a reason to create millions of objects.
+        if (analog > kMaxChannelCount || digital > kMaxChannelCount)
             return Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
     }
     const std::shared_ptr<SessionCore>& cp = CorePtr();

@@ -127,5 +127,42 @@ TEST(Discovery, HostileChannelCountsAreBounded) {
     }
 }
 
+// Discovery asks for the counts again; replies that would overflow or are
+// out of any sensible range end discovery with the defaults kept.
+TEST(Discovery, HostileCountsEndDiscovery) {
+    struct Case {
+        const char* pods;
+        const char* size;
+        const char* chan;
+    };
+    for (const Case& c : {Case{"65536", "65536", "4"}, Case{"-65536", "65536", "4"},
+                          Case{"2", "8", "2147483647"}, Case{"2", "8", "-1"}}) {
+        SCOPED_TRACE(std::string(c.pods) + " " + c.size + " " + c.chan);
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+        auto p = std::make_unique<ScriptedProvider>();
+        ScriptedProvider* io = p.get();
+        driver->Core().io = std::move(p);
+        const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
+        io->Expect("*IDN?\n", idn)
+            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
+            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "2\n")
+            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "8\n")
+            .Expect("*IDN?\n", idn)
+            .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "0\n")
+            .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "0\n")
+            .Expect(":SYST:DATA:VAL? \"COUN:POD\"\n", std::string(c.pods) + "\n")
+            .Expect(":SYST:DATA:VAL? \"POD:SIZE\"\n", std::string(c.size) + "\n");
+        const bool pods_ok = std::string(c.chan) != "4";
+        if (pods_ok) io->Expect(":SYST:DATA:VAL? \"COUN:CHAN\"\n", std::string(c.chan) + "\n");
+        com::Bstr r("scripted"), o("");
+        ASSERT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+        EXPECT_TRUE(io->Done());
+        const FeatureRecord& f = driver->Core().features;
+        EXPECT_EQ(f.digital_channel_count, pods_ok ? 16 : FeatureRecord{}.digital_channel_count);
+        EXPECT_EQ(f.analog_channel_count, FeatureRecord{}.analog_channel_count);
+    }
+}
+
 }  // namespace
 }  // namespace qn::test
