@@ -10,6 +10,9 @@ constexpr int kSendEnd = 0;
 constexpr int kTermCharEnabled = 1;
 constexpr LONG kStatusReplyChars = 100;
 constexpr long kStatusErrorMask = 0x3C;  // query, device-dependent, execution, command error
+// The most of an over-long reply that is read and dropped before the reply
+// counts as never ending.
+constexpr std::size_t kMaxDroppedReply = std::size_t{64} << 20;
 
 // Leading white space, an optional sign, then digits up to the first non-digit.
 long ParseStatusInteger(std::string_view s) {
@@ -51,6 +54,35 @@ HRESULT CDriverIOProvider::ReadRaw(std::string* out, LONG max_chars, bool strip)
     return S_OK;
 }
 
+HRESULT CDriverIOProvider::ReadReply(std::string* out, LONG max_chars, bool strip) {
+    HRESULT hr = ReadRaw(out, max_chars, false);
+    if (FAILED(hr)) return hr;
+    const std::string_view term = read_term_;
+    const bool ended = term.empty() || max_chars <= 0 ||
+                       out->size() < static_cast<std::size_t>(max_chars) ||
+                       std::string_view(*out).ends_with(term);
+    // Each read of the rest ends at the terminator, at the end of the
+    // message or when the chunk is full; only a full chunk that does not end
+    // in the terminator leaves more to read.
+    for (std::size_t dropped = 0; !ended;) {
+        BYTE chunk[4096];
+        LONG actual = 0;
+        hr = RawRead(chunk, static_cast<LONG>(sizeof chunk), &actual);
+        if (FAILED(hr)) return hr;
+        const std::size_t n = static_cast<std::size_t>(actual > 0 ? actual : 0);
+        if (n < sizeof chunk || chunk[n - 1] == static_cast<BYTE>(term.back())) break;
+        dropped += n;
+        if (dropped > kMaxDroppedReply) {
+            com::SetThreadError(GUID_NULL, "VISA", "the reply does not end");
+            return E_FAIL;
+        }
+    }
+    if (strip && out->size() >= term.size() && !term.empty() &&
+        std::string_view(*out).ends_with(term))
+        out->resize(out->size() - term.size());
+    return S_OK;
+}
+
 HRESULT CDriverIOProvider::StatusCheck() {
     static constexpr std::string_view kEsr = "*ESR?\n";
     LONG written = 0;
@@ -60,7 +92,7 @@ HRESULT CDriverIOProvider::StatusCheck() {
         return hr;
     }
     std::string reply;
-    hr = ReadRaw(&reply, kStatusReplyChars, false);
+    hr = ReadReply(&reply, kStatusReplyChars, false);
     if (FAILED(hr)) {
         RawClear();
         return hr;
@@ -166,7 +198,7 @@ HRESULT CDriverIOProvider::Query(const CErrorManagerBase& err, std::string_view 
                                  std::string* reply, LONG max_chars, LONG timeout, bool poll) {
     return Run(err, timeout, poll, [&] {
         HRESULT hr = WriteWithTerminator(cmd);
-        return SUCCEEDED(hr) ? ReadRaw(reply, max_chars, true) : hr;
+        return SUCCEEDED(hr) ? ReadReply(reply, max_chars, true) : hr;
     });
 }
 

@@ -119,6 +119,9 @@ private:
     HRESULT StatusCheck();  // sub-steps 2 to 5 of the check: S_OK or a failure
     HRESULT WriteWithTerminator(std::string_view cmd);
     HRESULT ReadRaw(std::string* out, LONG max_chars, bool strip);
+    // The reply of a query, at most max_chars of it; a longer reply's rest
+    // is read and dropped so that it cannot pass for the next reply.
+    HRESULT ReadReply(std::string* out, LONG max_chars, bool strip);
 
     const SessionFlags* flags_ = nullptr;
     std::string read_term_ = "\n";

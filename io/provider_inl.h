@@ -40,7 +40,7 @@ HRESULT CDriverIOProvider::QueryNumber(const CErrorManagerBase& err, std::string
     return Run(err, timeout, true, [&] {
         std::string reply;
         HRESULT h = WriteWithTerminator(cmd);
-        if (SUCCEEDED(h)) h = ReadRaw(&reply, 100, true);
+        if (SUCCEEDED(h)) h = ReadReply(&reply, 100, true);
         if (FAILED(h)) return h;
         ReplyNumber n = ParseReplyNumber(reply);
         if constexpr (std::is_same_v<T, double>) *out = ReplyToDouble(n);

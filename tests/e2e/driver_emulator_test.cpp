@@ -152,6 +152,28 @@ TEST_F(DriverOnEmulator, TypedFormattedOperations) {
     EXPECT_EQ(words[2], -32768);
 }
 
+// A reply longer than the caller's limit is cut there and the rest of that
+// reply is dropped: it must never be read as the reply to the next query.
+TEST_F(DriverOnEmulator, OverlongReplyDoesNotLeakIntoTheNextQuery) {
+    Start("QDS4032A");
+    ASSERT_EQ(Init(), S_OK) << ErrorText();
+    std::string reply;  // the instrument ends each reply with a line feed
+    emu_->ServeWaveformData(std::string(70000, '7'));
+    EXPECT_EQ(Io().InstrQuery(":WAV:DATA?", &reply, 255), S_OK) << ErrorText();
+    EXPECT_EQ(reply, std::string(255, '7'));
+    emu_->ServeWaveformData("2.5" + std::string(200, '0'));
+    double value = 0;
+    EXPECT_EQ(Io().InstrQuery(":WAV:DATA?", &value), S_OK) << ErrorText();
+    EXPECT_EQ(value, 2.5);
+    EXPECT_EQ(Io().InstrQuery("*IDN?", &reply, 255), S_OK) << ErrorText();
+    EXPECT_EQ(reply.rfind("QUORLEN TECHNOLOGIES,QDS4032A,", 0), 0u) << reply;
+    // The status check reads its own reply, not the rest of the query's.
+    driver_->Core().session.flags.query_instrument_status = true;
+    emu_->ServeWaveformData(std::string(300, '4'));
+    EXPECT_EQ(Io().InstrQuery(":WAV:DATA?", &reply, 10), S_OK) << ErrorText();
+    EXPECT_EQ(reply, std::string(10, '4'));
+}
+
 TEST_F(DriverOnEmulator, DroppedConnectionIsAnIoError) {
     Start("QDS4032A");
     ASSERT_EQ(Init(), S_OK) << ErrorText();
