@@ -28,6 +28,10 @@ private:
     std::optional<CMethodTrace> trace_;
 };
 
+// True when a query's reply was read: the query succeeded, or only the
+// status check after it failed (the reply is then still delivered).
+bool ReplyWasRead(HRESULT hr) { return SUCCEEDED(hr) || hr == E_IVI_INSTRUMENT_STATUS; }
+
 BSTR Narrow(std::string_view s, com::Bstr& holder) {
     holder = com::Bstr(s);
     return holder.get();
@@ -180,11 +184,11 @@ HRESULT CDriverIOManager::InstrQueryCommandBool(VARIANT_BOOL* out, LONG timeout)
     *out = VARIANT_FALSE;
     std::string reply;
     HRESULT hr = QueryText("InstrQueryCommandBool", CurrentCommand(), &reply, 1024, timeout);
-    if (FAILED(hr)) return hr;
+    if (!ReplyWasRead(hr)) return hr;
     std::string_view v = TrimBlanks(reply);
     if (v == "1") {
         *out = VARIANT_TRUE;
-    } else if (v != "0") {
+    } else if (v != "0" && SUCCEEDED(hr)) {
         return node_.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
     }
     return hr;
@@ -195,10 +199,10 @@ HRESULT CDriverIOManager::InstrQueryCommandEnum(const CEnumCommandTable& table, 
     if (!out) return E_POINTER;
     std::string reply;
     HRESULT hr = QueryText("InstrQueryCommandEnum", CurrentCommand(), &reply, 1024, timeout);
-    if (FAILED(hr)) return hr;
+    if (!ReplyWasRead(hr)) return hr;
     auto value = table.ValueOf(node_.Core().Model(), TrimBlanks(reply));
-    if (!value) return node_.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
-    *out = *value;
+    if (value) *out = *value;
+    if (!value && SUCCEEDED(hr)) return node_.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
     return hr;
 }
 

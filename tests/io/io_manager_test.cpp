@@ -158,6 +158,27 @@ TEST_F(IoManagerTest, CommandStackQueries) {
     driver_->Commands().PopCommand();
 }
 
+// A reply read before the status check failed is still delivered, by the
+// boolean and enumeration queries as by the numeric ones.
+TEST_F(IoManagerTest, CommandStackQueriesDeliverTheReplyWhenTheStatusCheckFails) {
+    Open();
+    driver_->Core().session.flags.query_instrument_status = true;
+    io_->AnswerStatusWith("+32");
+    driver_->Commands().PushCommand(":CHAN1:DISP?");
+    io_->Expect(":CHAN1:DISP?\n", "1\n");
+    VARIANT_BOOL b = VARIANT_FALSE;
+    EXPECT_EQ(Io().InstrQueryCommandBool(&b), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(b, VARIANT_TRUE);
+    driver_->Commands().PopCommand();
+    static const CEnumCommandTable kUnits{{"", 0, "VOLT"}, {"", 1, "AMP"}};
+    driver_->Commands().PushCommand(":CHAN1:UNIT?");
+    io_->Expect(":CHAN1:UNIT?\n", "AMP\n");
+    LONG units = -1;
+    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(units, 1);
+    driver_->Commands().PopCommand();
+}
+
 TEST_F(IoManagerTest, ErrorQueryParsesTheReplyWithoutCheckingStatus) {
     io_->AnswerStatusWith("+0");
     Open("QueryInstrStatus=true");
