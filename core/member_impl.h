@@ -21,6 +21,7 @@
 #include <type_traits>
 
 #include "QnMemberTable.h"
+#include "Quorlen731XXErrors.h"
 #include "core/frame.h"
 #include "io/io_manager.h"
 #include "platform/com/com.h"
@@ -60,7 +61,8 @@ HRESULT DefaultGetBody(CDriverNode& node, T* val) {
     } else if constexpr (std::is_same_v<T, BSTR>) {
         std::string reply;
         HRESULT hr = io.InstrQueryCommand(&reply);
-        if (FAILED(hr)) return hr;
+        // A reply read before a failing status check is delivered with it.
+        if (FAILED(hr) && hr != E_IVI_INSTRUMENT_STATUS) return hr;
         *val = com::Utf8ToBstr(reply);
         if (!*val) throw std::bad_alloc();
         return hr;

@@ -165,5 +165,20 @@ TEST_F(ChannelTraffic, LabelsWithLineBreaksOrNulAreRefused) {
     EXPECT_EQ(label.utf8(), "\"Clock\"");
 }
 
+// A text read before the status check failed is delivered with the failure,
+// as numbers are.
+TEST_F(ChannelTraffic, TextReadBeforeAFailedStatusCheckIsDelivered) {
+    Open("73141D");
+    driver_->Core().session.flags.query_instrument_status = true;
+    io_->AnswerStatusWith("+16");
+    io_->Expect(":CHAN1:LAB?\n", "\"Clock\"\n").Expect(":CHAN1:RANG?\n", "8\n");
+    com::Bstr label;
+    EXPECT_EQ(User(1)->get_Label(label.Out()), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(label.utf8(), "\"Clock\"");
+    double range = 0;
+    EXPECT_EQ(User(1)->get_Range(&range), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(range, 8.0);
+}
+
 }  // namespace
 }  // namespace qn::test
