@@ -8,6 +8,7 @@
 #pragma once
 
 #include <cstring>
+#include <limits>
 #include <string>
 #include <string_view>
 #include <type_traits>
@@ -219,15 +220,29 @@ private:
         std::memcpy(&v.llVal, &val, sizeof(T));
         return v;
     }
+    // A value of any numeric VARIANT as T; floating values going into an
+    // integer type saturate at its range (NaN gives 0).
     template <class T>
     static T FromVariant(const VARIANT& v) {
         switch (v.vt) {
             case VT_I2: return static_cast<T>(v.iVal);
             case VT_I4: return static_cast<T>(v.lVal);
-            case VT_R4: return static_cast<T>(v.fltVal);
-            case VT_R8: return static_cast<T>(v.dblVal);
+            case VT_R4: return FromDouble<T>(v.fltVal);
+            case VT_R8: return FromDouble<T>(v.dblVal);
             case VT_UI1: return static_cast<T>(v.bVal);
             default: return T{};
+        }
+    }
+    template <class T>
+    static T FromDouble(double d) {
+        if constexpr (std::is_floating_point_v<T>) {
+            return static_cast<T>(d);
+        } else {
+            if (!(d == d)) return T{};
+            constexpr double lo = static_cast<double>(std::numeric_limits<T>::min());
+            constexpr double hi = static_cast<double>(std::numeric_limits<T>::max());
+            return d <= lo ? std::numeric_limits<T>::min()
+                 : d >= hi ? std::numeric_limits<T>::max() : static_cast<T>(d);
         }
     }
     template <class T>

@@ -103,7 +103,9 @@ HRESULT CVisaComIOProvider::RawRead(BYTE* buf, LONG count, LONG* actual) {
     com::SafeArray arr;
     HRESULT hr = Translate(message_->Read(count, arr.Out()));
     if (FAILED(hr)) return hr;
-    *actual = static_cast<LONG>(arr.size());
+    // Never more than the caller's buffer holds, whatever the session returned.
+    const ULONG got = arr.size();
+    *actual = static_cast<LONG>(got < static_cast<ULONG>(count) ? got : static_cast<ULONG>(count));
     if (*actual) std::memcpy(buf, arr.data<BYTE>(), static_cast<std::size_t>(*actual));
     return hr;
 }
