@@ -8,7 +8,7 @@
 #include "core/models.h"
 #include "core/root.h"
 #include "platform/com/errorinfo.h"
-#include "tests/support/scripted_provider.h"
+#include "tests/support/scripted_driver.h"
 
 namespace qn::test {
 namespace {
@@ -62,11 +62,8 @@ TEST(FixedFeatures, EarlyFamilyRules) {
 }
 
 TEST(Discovery, AFailingQueryEndsDiscoveryButNotInitialize) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-    auto p = std::make_unique<ScriptedProvider>();
-    ScriptedProvider* io = p.get();
-    driver->Core().io = std::move(p);
+    ScriptedProvider* io = nullptr;
+    ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
     const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
     io->Expect("*IDN?\n", idn)
         .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
@@ -106,11 +103,8 @@ TEST(Discovery, HostileChannelCountsAreBounded) {
                           Case{"4", "-2147483648", "-2147483648", false},
                           Case{"4", "-65536", "-65536", false}}) {
         SCOPED_TRACE(std::string(c.chan) + " " + c.pods + " " + c.size);
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-        auto p = std::make_unique<ScriptedProvider>();
-        ScriptedProvider* io = p.get();
-        driver->Core().io = std::move(p);
+        ScriptedProvider* io = nullptr;
+        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
         io->Expect("*IDN?\n", idn)
             .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", std::string(c.chan) + "\n")
             .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", std::string(c.pods) + "\n")
@@ -138,11 +132,8 @@ TEST(Discovery, HostileCountsEndDiscovery) {
     for (const Case& c : {Case{"65536", "65536", "4"}, Case{"-65536", "65536", "4"},
                           Case{"2", "8", "2147483647"}, Case{"2", "8", "-1"}}) {
         SCOPED_TRACE(std::string(c.pods) + " " + c.size + " " + c.chan);
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-        auto p = std::make_unique<ScriptedProvider>();
-        ScriptedProvider* io = p.get();
-        driver->Core().io = std::move(p);
+        ScriptedProvider* io = nullptr;
+        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
         const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
         io->Expect("*IDN?\n", idn)
             .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")

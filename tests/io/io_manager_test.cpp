@@ -5,7 +5,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
-#include "tests/support/scripted_provider.h"
+#include "tests/support/scripted_driver.h"
 
 namespace qn::test {
 namespace {
@@ -18,11 +18,7 @@ constexpr const char* kIdn = "QUORLEN TECHNOLOGIES,73141D,SN0001,2.10\n";
 class IoManagerTest : public ::testing::Test {
 protected:
     void SetUp() override {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        auto p = std::make_unique<ScriptedProvider>();
-        io_ = p.get();
-        driver_->Core().io = std::move(p);
+        driver_ = DriverOnScript(&io_);
         io_->Expect("*IDN?\n", kIdn).Expect("*IDN?\n", kIdn);
     }
     void TearDown() override {

@@ -10,7 +10,7 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
-#include "tests/support/scripted_provider.h"
+#include "tests/support/scripted_driver.h"
 
 namespace qn::test {
 
@@ -39,10 +39,7 @@ protected:
     }
     // Opens a session on `model` (7312X or 7314X).
     void Open(const std::string& model) {
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        auto p = std::make_unique<ScriptedProvider>();
-        io_ = p.get();
-        driver_->Core().io = std::move(p);
+        driver_ = DriverOnScript(&io_);
         const std::string idn = "QUORLEN TECHNOLOGIES," + model + ",SN0001,2.10\n";
         io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
         com::Bstr r("scripted"), o("");

@@ -8,7 +8,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "scope/waveform_transfer.h"
-#include "tests/support/scripted_provider.h"
+#include "tests/support/scripted_driver.h"
 
 namespace qn::test {
 namespace {
@@ -50,11 +50,7 @@ protected:
 class StatusTraffic : public ::testing::Test {
 protected:
     void Open(const char* model, const char* options = "") {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        auto p = std::make_unique<StatusProvider>();
-        io_ = p.get();
-        driver_->Core().io = std::move(p);
+        driver_ = DriverOnScript(&io_);
         const std::string idn = std::string("QUORLEN TECHNOLOGIES,") + model + ",SN1,1.0\n";
         io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
         if (std::string_view(options).find("QueryInstrStatus") != std::string_view::npos)
