@@ -6,6 +6,7 @@
 #include <cstring>
 #include <limits>
 
+#include "platform/visa/errors.h"
 #include "platform/visa/ieee488.h"
 
 namespace qn::visa::fmt {
@@ -211,6 +212,18 @@ HRESULT FormatValue(const VARIANT& value, VARTYPE vt, std::string* out, std::str
     }
     *out = vt == VT_R4 ? Printf(7, double(float(v))) : Printf(15, v);
     return S_OK;
+}
+
+HRESULT AsciiTypeOrError(LONG type, VARTYPE* vt) {
+    *vt = AsciiElementType(type);
+    if (*vt != VT_EMPTY) return S_OK;
+    return Report(E_INVALIDARG, iid_of<IFormattedIO488>, "unknown ASCII type " + std::to_string(type));
+}
+
+HRESULT BinaryTypeOrError(LONG type, VARTYPE* vt) {
+    *vt = BinaryElementType(type);
+    if (*vt != VT_EMPTY) return S_OK;
+    return Report(E_INVALIDARG, iid_of<IFormattedIO488>, "unknown binary type " + std::to_string(type));
 }
 
 bool NeedsSwap(bool instrument_big_endian) {

@@ -15,6 +15,10 @@ namespace qn::visa::fmt {
 // code is not one of them (Any gives VT_VARIANT).
 VARTYPE AsciiElementType(LONG type);
 VARTYPE BinaryElementType(LONG type);
+// The same, reporting an unknown code (E_INVALIDARG, with the code in the
+// thread's error information).
+HRESULT AsciiTypeOrError(LONG type, VARTYPE* vt);
+HRESULT BinaryTypeOrError(LONG type, VARTYPE* vt);
 // Bytes of one element of a plain (non-BSTR, non-VARIANT) VARTYPE, 0 otherwise.
 std::size_t PlainElementSize(VARTYPE vt);
 

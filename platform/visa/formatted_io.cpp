@@ -122,9 +122,8 @@ HRESULT FormattedIO::SkipSeparators(const Deadline& deadline, bool* at_end) {
 // stops where the number does), a blank- or separator-delimited token for
 // BSTR and Any.
 HRESULT FormattedIO::ReadField(LONG type, const Deadline& deadline, VARIANT* out) {
-    const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY)
-        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    VARTYPE vt = VT_EMPTY;
+    if (HRESULT bad = fmt::AsciiTypeOrError(type, &vt); FAILED(bad)) return bad;
     bool at_end = false;
     HRESULT hr = SkipSeparators(deadline, &at_end);
     if (FAILED(hr)) return hr;
@@ -289,9 +288,8 @@ HRESULT FormattedIO::ReadBlock(std::size_t elem, bool seek, bool flush, BlockTar
 HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND,
                                    VARIANT* pData) {
     if (!pData) return E_POINTER;
-    const VARTYPE vt = fmt::BinaryElementType(type);
-    if (vt == VT_EMPTY)
-        return Report(E_INVALIDARG, kFormattedIid, "unknown binary type " + std::to_string(type));
+    VARTYPE vt = VT_EMPTY;
+    if (HRESULT bad = fmt::BinaryTypeOrError(type, &vt); FAILED(bad)) return bad;
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -393,9 +391,8 @@ HRESULT FormattedIO::ReadNumber(LONG type, VARIANT_BOOL flushToEND, VARIANT* pDa
 
 HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
     if (!pData) return E_POINTER;
-    const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY)
-        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    VARTYPE vt = VT_EMPTY;
+    if (HRESULT bad = fmt::AsciiTypeOrError(type, &vt); FAILED(bad)) return bad;
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;

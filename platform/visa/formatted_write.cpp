@@ -45,9 +45,8 @@ HRESULT FormattedIO::WriteString(BSTR data, VARIANT_BOOL flushAndEND) {
 }
 
 HRESULT FormattedIO::WriteNumber(VARIANT data, LONG type, VARIANT_BOOL flushAndEND) {
-    const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY)
-        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    VARTYPE vt = VT_EMPTY;
+    if (HRESULT bad = fmt::AsciiTypeOrError(type, &vt); FAILED(bad)) return bad;
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
@@ -64,9 +63,8 @@ HRESULT FormattedIO::WriteNumber(VARIANT data, LONG type, VARIANT_BOOL flushAndE
 HRESULT FormattedIO::WriteList(VARIANT* data, LONG type, BSTR listSeparator,
                                VARIANT_BOOL flushAndEND) {
     if (!data) return E_POINTER;
-    const VARTYPE vt = fmt::AsciiElementType(type);
-    if (vt == VT_EMPTY)
-        return Report(E_INVALIDARG, kFormattedIid, "unknown ASCII type " + std::to_string(type));
+    VARTYPE vt = VT_EMPTY;
+    if (HRESULT bad = fmt::AsciiTypeOrError(type, &vt); FAILED(bad)) return bad;
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
