@@ -1,5 +1,5 @@
 // Driver source names to instrument source names and back, on a mixed-signal
-// model with two analog channels and sixteen digital channels.
+// model with four analog channels and sixteen digital channels.
 #include <gtest/gtest.h>
 
 #include "scope/source_names.h"
@@ -22,7 +22,7 @@ TEST_F(SourceNamesTest, DriverNamesToInstrumentNames) {
     } cases[] = {
         {"UserChannel1", none, "CHAN1"},       {"userchannel2", none, "CHAN2"},
         {"Channel2", none, "CHAN2"},           {"probe", none, "CHAN2"},
-        {"UserChannel3", all, nullptr},        {"UserChannel0", all, nullptr},
+        {"UserChannel5", all, nullptr},        {"UserChannel0", all, nullptr},
         {"UserDigitalChannel0", digital, "DIG0"},
         {"UserDigitalChannel15", all, "DIG15"}, {"clk", digital, "DIG15"},
         {"UserDigitalChannel16", all, nullptr}, {"UserDigitalChannel3", external, nullptr},
@@ -31,14 +31,16 @@ TEST_F(SourceNamesTest, DriverNamesToInstrumentNames) {
     };
     for (const Case& c : cases) {
         std::string scpi = "unchanged";
-        HRESULT hr = VirtualToSCPI(*driver_, c.name, c.rules, &scpi);
+        HRESULT hr = VirtualToSCPI(*driver_.get(), c.name, c.rules, &scpi);
         if (c.scpi) {
             EXPECT_EQ(hr, S_OK) << c.name;
             EXPECT_EQ(scpi, c.scpi) << c.name;
         } else {
             EXPECT_EQ(hr, E_IVI_INVALID_VALUE) << c.name;
             EXPECT_EQ(scpi, "unchanged") << c.name;
-            EXPECT_NE(ErrorText().find(std::string("VirtualToSCPI")), std::string::npos)
+            const std::string text = ErrorText();
+            EXPECT_NE(text.find("VirtualToSCPI"), std::string::npos) << text;
+            EXPECT_NE(text.find(c.name), std::string::npos)
                 << c.name;
         }
     }
