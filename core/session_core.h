@@ -19,6 +19,7 @@
 #include "platform/com/lock.h"
 #include "scope/acquisition_control.h"
 #include "scope/acquisition_state.h"
+#include "scope/measurement_settings.h"
 #include "services/coercion_log.h"
 #include "io/visa_provider.h"
 #include "services/tracer.h"
@@ -36,6 +37,7 @@ public:
     FeatureRecord features;
     AcquisitionState acquisition;
     AcquisitionControl acquisition_control;
+    MeasurementSettings measurement;
     RepCapLists repcaps;
     CCoercionLogManager coercions;
     CTraceOwner tracer;

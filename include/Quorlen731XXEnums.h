@@ -109,3 +109,66 @@ enum IviScopeAcquisitionStatusEnum : LONG {
     IviScopeAcqComplete = 1,
     IviScopeAcqStatusUnknown = 2,
 };
+
+// Automatic measurements. The class-compliant function values 0 to 19 are
+// the same numbers.
+enum Quorlen731XXMeasurementEnum : LONG {
+    Quorlen731XXMeasurementRiseTime = 0,
+    Quorlen731XXMeasurementFallTime = 1,
+    Quorlen731XXMeasurementFrequency = 2,
+    Quorlen731XXMeasurementPeriod = 3,
+    Quorlen731XXMeasurementVoltageRMS = 4,
+    Quorlen731XXMeasurementVoltagePeakToPeak = 5,
+    Quorlen731XXMeasurementVoltageMax = 6,
+    Quorlen731XXMeasurementVoltageMin = 7,
+    Quorlen731XXMeasurementVoltageHigh = 8,
+    Quorlen731XXMeasurementVoltageLow = 9,
+    Quorlen731XXMeasurementVoltageAverage = 10,
+    Quorlen731XXMeasurementWidthNeg = 11,
+    Quorlen731XXMeasurementWidthPos = 12,
+    Quorlen731XXMeasurementDutyCycleNeg = 13,
+    Quorlen731XXMeasurementDutyCyclePos = 14,
+    Quorlen731XXMeasurementAmplitude = 15,
+    Quorlen731XXMeasurementVoltageCycleRMS = 16,
+    Quorlen731XXMeasurementVoltageCycleAverage = 17,
+    Quorlen731XXMeasurementOverShoot = 18,
+    Quorlen731XXMeasurementPreshoot = 19,
+    Quorlen731XXMeasurementFrequencyCounter = 20,
+    Quorlen731XXMeasurementTimeAtMax = 21,
+    Quorlen731XXMeasurementTimeAtMin = 22,
+    Quorlen731XXMeasurementDelay = 23,
+    Quorlen731XXMeasurementPhase = 24,
+    Quorlen731XXMeasurementValueAtTime = 25,
+    Quorlen731XXMeasurementTimeAtValue = 26,
+    Quorlen731XXMeasurementTimeOfEdge = 27,
+};
+enum IviScopeMeasurementFunctionEnum : LONG {
+    IviScopeMeasurementRiseTime = 0,
+    IviScopeMeasurementFallTime = 1,
+    IviScopeMeasurementFrequency = 2,
+    IviScopeMeasurementPeriod = 3,
+    IviScopeMeasurementVoltageRMS = 4,
+    IviScopeMeasurementVoltagePeakToPeak = 5,
+    IviScopeMeasurementVoltageMax = 6,
+    IviScopeMeasurementVoltageMin = 7,
+    IviScopeMeasurementVoltageHigh = 8,
+    IviScopeMeasurementVoltageLow = 9,
+    IviScopeMeasurementVoltageAverage = 10,
+    IviScopeMeasurementWidthNeg = 11,
+    IviScopeMeasurementWidthPos = 12,
+    IviScopeMeasurementDutyCycleNeg = 13,
+    IviScopeMeasurementDutyCyclePos = 14,
+    IviScopeMeasurementAmplitude = 15,
+    IviScopeMeasurementVoltageCycleRMS = 16,
+    IviScopeMeasurementVoltageCycleAverage = 17,
+    IviScopeMeasurementOvershoot = 18,
+    IviScopeMeasurementPreshoot = 19,
+};
+enum Quorlen731XXMeasurementSlopeEnum : LONG {
+    Quorlen731XXMeasurementSlopePositive = 0,
+    Quorlen731XXMeasurementSlopeNegative = 1,
+};
+enum Quorlen731XXMeasurementReferenceModeEnum : LONG {
+    Quorlen731XXMeasurementReferenceModePercent = 0,
+    Quorlen731XXMeasurementReferenceModeAbsolute = 1,
+};

@@ -12,6 +12,7 @@
 #include "io/io_manager.h"
 #include "platform/com/errorinfo.h"
 #include "platform/visa/visa.h"
+#include "scope/timeout_scope.h"
 #include "scope/waveform_source.h"
 
 namespace qn {
@@ -34,43 +35,6 @@ bool IsByteSource(std::string_view source) {
     return source.find("DIG") != std::string_view::npos ||
            source.find("POD") != std::string_view::npos;
 }
-
-// Keeps the thread's error information across a clean-up step: the restores
-// below run I/O operations, which clear it, after the failure that the
-// caller is to see was reported.
-class KeepErrorInfo {
-public:
-    KeepErrorInfo() { GetErrorInfo(0, info_.Out()); }
-    ~KeepErrorInfo() {
-        if (info_) SetErrorInfo(0, info_.get());
-    }
-
-private:
-    ComPtr<IErrorInfo> info_;
-};
-
-// The session timeout for the duration of a transfer, put back on every path.
-class TimeoutScope {
-public:
-    explicit TimeoutScope(CDriverNode& node) : node_(node) {}
-    HRESULT Set(LONG timeout) {
-        CDriverIOManager io(node_);
-        HRESULT hr = io.GetIOTimeout(&saved_);
-        if (FAILED(hr)) return hr;
-        active_ = true;
-        return io.SetIOTimeout(timeout);
-    }
-    ~TimeoutScope() {
-        if (!active_) return;
-        KeepErrorInfo keep;
-        CDriverIOManager(node_).SetIOTimeout(saved_);
-    }
-
-private:
-    CDriverNode& node_;
-    LONG saved_ = 0;
-    bool active_ = false;
-};
 
 // The instrument-status check after each operation, off for a binary read
 // (its "*ESR?" would be sent in the middle of the block's message) and put
@@ -116,14 +80,6 @@ private:
     bool restore_ = false;
 };
 
-HRESULT ReadPreamble(CDriverNode& node, WaveformScaling* s) {
-    std::string reply;
-    HRESULT hr = Io(node).InstrQuery(":WAV:PRE?", &reply, 255);
-    if (FAILED(hr)) return hr;
-    if (!ParsePreamble(reply, s)) return node.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
-    return S_OK;
-}
-
 HRESULT ReadFactors(CDriverNode& node, WaveformScaling* s) {
     CDriverIOManager io(node);
     HRESULT hr = io.InstrQuery(":WAV:YINC?", &s->y_increment);
@@ -159,6 +115,21 @@ std::string MeasurementSourceName(const Quorlen731XXUserMeasurement& m) {
     if (r.math_measurements.Contains(index)) return "MATH";
     const long channel = TrailingNumber(m.Name());
     return "CHAN" + std::to_string(channel > 0 ? channel : index);
+}
+
+HRESULT ReadPreamble(CDriverNode& node, WaveformScaling* s) {
+    std::string reply;
+    HRESULT hr = Io(node).InstrQuery(":WAV:PRE?", &reply, 255);
+    if (FAILED(hr)) return hr;
+    if (!ParsePreamble(reply, s)) return node.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
+    return S_OK;
+}
+
+std::string MeasurementSCPISource(const Quorlen731XXUserMeasurement& m) {
+    const RepCapLists& r = m.Core().repcaps;
+    if (r.digital_measurements.Contains(m.Position()))
+        return "DIG" + std::to_string(m.Position() - r.digital_measurements.first);
+    return MeasurementSourceName(m);
 }
 
 HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* out) {

@@ -30,6 +30,11 @@ struct RawWaveform {
 // otherwise "CHAN%i" with the channel number its name carries.
 std::string MeasurementSourceName(const Quorlen731XXUserMeasurement& m);
 
+// The name the measurement subsystem gives the same source: "DIG%i" with
+// the digital channel's index for a digital measurement, otherwise as
+// above.
+std::string MeasurementSCPISource(const Quorlen731XXUserMeasurement& m);
+
 // The transfer core: selects the source, sets the data format, reads the
 // scaling factors and the record type under `timeout` (restored afterwards,
 // on every path), and reads the data. A record whose type differs from the
@@ -37,6 +42,10 @@ std::string MeasurementSourceName(const Quorlen731XXUserMeasurement& m);
 // E_IVISCOPE_INVALID_ACQ_TYPE.
 HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak,
                          ScalingQuery scaling, RawWaveform* out);
+
+// Sends ":WAV:PRE?" and reads the scaling factors from the preamble; a
+// preamble that does not parse is E_IVI_UNEXPECTED_RESPONSE.
+HRESULT ReadPreamble(CDriverNode& node, WaveformScaling* s);
 
 // Sends ":WAV:DATA?" and reads the binary block of `element_type`
 // (BinaryType_I2 or BinaryType_UI1) with the instrument-status check and the
