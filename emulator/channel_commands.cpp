@@ -175,7 +175,12 @@ bool* PodDisplay(Instrument& inst, const Call& call) {
 void SetPodDisplay(Instrument& inst, Call& call) {
     bool* display = PodDisplay(inst, call);
     if (!display || !ExpectArgs(inst, call, 1)) return;
-    if (auto v = BoolArg(inst, call.arg(0))) *display = *v;
+    const auto v = BoolArg(inst, call.arg(0));
+    if (!v) return;
+    *display = *v;
+    // The pod's eight channels follow it.
+    const std::size_t first = static_cast<std::size_t>(call.suffix(0) - 1) * 8;
+    for (std::size_t d = first; d < first + 8; ++d) inst.settings().digital[d].display = *v;
 }
 void QueryPodDisplay(Instrument& inst, Call& call) {
     bool* display = PodDisplay(inst, call);

@@ -14,8 +14,9 @@ std::string Upper(std::string_view s) {
 
 // Splits "CHANnel#" into short "CHAN", long "CHANNEL" and the suffix flag.
 void ParsePattern(std::string_view word, CommandTree::Node& node) {
-    if (!word.empty() && word.back() == '#') {
+    if (!word.empty() && (word.back() == '#' || word.back() == '&')) {
         node.takes_suffix = true;
+        node.suffix_from_zero = word.back() == '&';
         word.remove_suffix(1);
     }
     std::size_t n = 0;
@@ -87,7 +88,8 @@ CommandTree::Match CommandTree::Resolve(const Node* from,
         }
         if (!next) return Match{};
         if (next->takes_suffix) {
-            if (suffix == 0 || suffix > 99) match.suffix_out_of_range = true;
+            if ((suffix == 0 && !next->suffix_from_zero) || suffix > 99)
+                match.suffix_out_of_range = true;
             match.suffixes.push_back(suffix < 0 ? 1 : static_cast<int>(suffix));
         }
         node = next;

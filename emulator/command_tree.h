@@ -1,8 +1,8 @@
 // Table-driven SCPI command tree.
 //
 // Commands are declared as data: a path such as "CHANnel#:PROBe:SKEW" (upper-case letters are
-// the short form, the whole word the long form, "#" allows a numeric suffix), a set handler, a
-// query handler and the model features the command needs. The tree is built per instrument from
+// the short form, the whole word the long form, "#" allows a numeric suffix from 1, "&" one
+// from 0), a set handler, a query handler and the model features the command needs. The tree is built per instrument from
 // the rows whose features the model has, so a missing feature makes an undefined header.
 #pragma once
 
@@ -46,6 +46,7 @@ class CommandTree {
         std::string short_name;  // upper case
         std::string long_name;   // upper case
         bool takes_suffix = false;
+        bool suffix_from_zero = false;  // "&" in the pattern: numbered from 0
         Handler set = nullptr;
         Handler query = nullptr;
         Node* parent = nullptr;

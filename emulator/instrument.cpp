@@ -11,7 +11,8 @@ namespace {
 
 std::vector<std::span<const CommandSpec>> AllTables() {
     return {CommonCommands(), SystemDataCommands(), ScopeCommands(),
-            StatusCommands(), ChannelCommands(),    WaveformCommands()};
+            StatusCommands(), ChannelCommands(),    WaveformCommands(),
+            MeasureCommands(), DigitalCommands()};
 }
 
 CommandTree BuildTree(const ModelInfo& model) {
@@ -28,7 +29,8 @@ std::chrono::milliseconds AcquisitionTime(const ScopeSettings& s) {
 
 }  // namespace
 
-Instrument::Instrument(ModelInfo model) : model_(std::move(model)), tree_(BuildTree(model_)) {
+Instrument::Instrument(ModelInfo model)
+    : model_(std::move(model)), tree_(BuildTree(model_)), inputs_(DefaultInputs()) {
     base_ = tree_.root();
 }
 
@@ -150,7 +152,7 @@ void Instrument::Tick() {
 }
 
 void Instrument::Capture() {
-    record_ = SynthesizeRecord(settings_, model_, ++acquisitions_);
+    record_ = SynthesizeRecord(settings_, model_, inputs_, ++acquisitions_);
 }
 
 }  // namespace qn::emu

@@ -26,6 +26,8 @@ std::span<const CommandSpec> ScopeCommands();
 std::span<const CommandSpec> StatusCommands();
 std::span<const CommandSpec> ChannelCommands();
 std::span<const CommandSpec> WaveformCommands();
+std::span<const CommandSpec> MeasureCommands();
+std::span<const CommandSpec> DigitalCommands();
 
 class Instrument {
   public:
@@ -58,6 +60,12 @@ class Instrument {
     void WaitForCompletion();  // *OPC?: returns when no single acquisition is running
     void Tick();               // completes an acquisition whose time has passed
     const AcquiredRecord& record() const { return record_; }
+    std::uint32_t acquisitions() const { return acquisitions_; }
+
+    // The signals at the analog inputs (*RST keeps them).
+    std::array<InputSignal, kMaxAnalogChannels>& inputs() { return inputs_; }
+    // The acquisition count when :ACT last cleared the activity edges.
+    std::optional<std::uint32_t>& activity_reset() { return activity_reset_; }
 
     // Test hook: raw bytes served verbatim as the reply to :WAV:DATA? while set.
     // Shared, not copied: a large block costs nothing on the other messages.
@@ -90,6 +98,8 @@ class Instrument {
     AcquiredRecord record_;
     std::uint32_t acquisitions_ = 0;
     std::shared_ptr<const std::string> waveform_override_;
+    std::array<InputSignal, kMaxAnalogChannels> inputs_;
+    std::optional<std::uint32_t> activity_reset_;
 };
 
 }  // namespace qn::emu

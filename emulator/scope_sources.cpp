@@ -31,6 +31,10 @@ std::optional<std::string> SourceArg(Instrument& inst, const Argument& arg) {
             return "CHAN" + std::to_string(n);
         }
         if (letters == "POD" && n >= 1 && n <= m.pods) return "POD" + std::to_string(n);
+        if ((letters == "DIG" || letters == "DIGITAL") && n >= 0 && n < 8 * m.pods &&
+            std::isdigit(static_cast<unsigned char>(arg.value.back()))) {
+            return "DIG" + std::to_string(n);
+        }
         if ((letters == "MATH" || letters == "FUNC" || letters == "FUNCTION") && n == 0) {
             return std::string("MATH");
         }
@@ -41,6 +45,7 @@ std::optional<std::string> SourceArg(Instrument& inst, const Argument& arg) {
 
 bool IsDisplayed(Instrument& inst, const std::string& source) {
     const ScopeSettings& s = inst.settings();
+    if (source.starts_with("DIG")) return s.digital[static_cast<std::size_t>(std::stoi(source.substr(3)))].display;
     const int n = source.back() - '0';
     if (source.starts_with("CHAN")) return s.channels[static_cast<std::size_t>(n - 1)].display;
     if (source.starts_with("POD")) return s.pod_display[static_cast<std::size_t>(n - 1)];

@@ -9,7 +9,7 @@
 
 namespace qn::emu {
 
-// Canonical source ("CHAN<n>", "POD<n>", "MATH") from CHANnel<n>/POD<n>/MATH/FUNCtion,
+// Canonical source ("CHAN<n>", "POD<n>", "DIG<d>", "MATH") from CHANnel<n>/POD<n>/DIGital<d>/MATH/FUNCtion,
 // refused with -224 when the model has no such source.
 std::optional<std::string> SourceArg(Instrument& inst, const Argument& arg);
 bool IsDisplayed(Instrument& inst, const std::string& source);

@@ -11,6 +11,35 @@ namespace qn::emu {
 
 inline constexpr int kMaxAnalogChannels = 4;
 inline constexpr int kMaxPods = 2;
+inline constexpr int kMaxDigitalChannels = 8 * kMaxPods;
+
+// The signal at an analog input: a sine or a square wave of the given
+// frequency and peak amplitude, lagging by `phase` degrees. Not a setting of
+// the scope: *RST keeps it.
+struct InputSignal {
+    bool square = false;
+    double frequency = 1e3;  // Hz
+    double amplitude = 1.0;  // V, peak
+    double phase = 0.0;      // degrees of lag
+};
+
+struct DigitalSettings {
+    bool display = false;
+    std::string label;
+    double threshold = 1.4;  // V
+};
+
+// The measurement subsystem: sources, reference levels and delay edges.
+struct MeasureSettings {
+    std::string source1 = "CHAN1";
+    std::string source2 = "CHAN2";
+    std::string mode = "PERC";  // "PERC" or "ABS"
+    double high = 90.0;
+    double mid = 50.0;
+    double low = 10.0;
+    int edge1 = 1;  // negative: falling edge
+    int edge2 = 1;
+};
 
 struct ChannelSettings {
     bool display = false;
@@ -36,6 +65,8 @@ struct ScopeSettings {
     bool vectors = true;
     std::array<ChannelSettings, kMaxAnalogChannels> channels{};
     std::array<bool, kMaxPods> pod_display{};
+    std::array<DigitalSettings, kMaxDigitalChannels> digital{};
+    MeasureSettings measure;
     bool math_display = false;
     std::string waveform_source = "CHAN1";
     std::string waveform_format = "WORD";
@@ -48,6 +79,7 @@ struct ScopeSettings {
         for (std::size_t i = 0; i < channels.size(); ++i) {
             channels[i].label = std::string(1, static_cast<char>('1' + i));
         }
+        for (std::size_t d = 0; d < digital.size(); ++d) digital[d].label = "D" + std::to_string(d);
     }
 };
 

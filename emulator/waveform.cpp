@@ -34,24 +34,24 @@ class Noise {
     std::uint32_t state_;
 };
 
-SourceRecord AnalogRecord(const ScopeSettings& s, int channel, int length, std::uint32_t seed) {
+SourceRecord AnalogRecord(const ScopeSettings& s, const InputSignal& in, int channel, int length,
+                          std::uint32_t seed) {
     const ChannelSettings& c = s.channels[static_cast<std::size_t>(channel - 1)];
     SourceRecord r;
     r.source = "CHAN" + std::to_string(channel);
     r.y_increment = c.range / kCodesPerScreen;
     r.y_origin = c.offset;
     r.raw.resize(static_cast<std::size_t>(length));
-    const double amplitude = 0.3 * c.range;
-    const double frequency = (1.0 + channel) / s.time_range;
     double noise_level = 0.01 * c.range;
     if (s.acquire_type == "AVER") noise_level /= std::sqrt(std::max(1, s.acquire_count));
     if (s.acquire_type == "HRES") noise_level /= 4.0;
     Noise noise(seed + static_cast<std::uint32_t>(channel));
     const double dt = s.time_range / length;
     for (int i = 0; i < length; ++i) {
-        const double phase = 2.0 * std::numbers::pi * frequency * (StartTime(s) + i * dt);
-        double v = channel % 2 == 1 ? std::sin(phase) : (std::sin(phase) >= 0 ? 1.0 : -1.0);
-        v = v * amplitude + noise.Next() * noise_level;
+        const double phase = 2.0 * std::numbers::pi * in.frequency * (StartTime(s) + i * dt) -
+                             in.phase * std::numbers::pi / 180.0;
+        double v = in.square ? (std::sin(phase) >= 0 ? 1.0 : -1.0) : std::sin(phase);
+        v = v * in.amplitude + noise.Next() * noise_level;
         if (c.invert) v = -v;
         if (c.coupling == "GND") v = 0.0;
         const double code =
@@ -66,14 +66,17 @@ SourceRecord PodRecord(int pod, int length) {
     SourceRecord r;
     r.source = "POD" + std::to_string(pod);
     r.y_increment = 1.0;
-    r.raw.resize(static_cast<std::size_t>(length));
-    const int step = std::max(1, length / 256);
-    for (int i = 0; i < length; ++i) {
-        const int count = (i / step) & 0xFF;
-        r.raw[static_cast<std::size_t>(i)] =
-            static_cast<std::int16_t>(pod == 1 ? count : 0xFF - count);
-    }
+    r.raw = PodPattern(pod, length);
     return r;
+}
+
+// The level of the serial line in bit period `n`: frames of ten bits.
+int SerialBit(int n) {
+    static constexpr char kText[] = {'Q', 'N'};
+    const int frame = n / 10, bit = n % 10;
+    if (bit == 0) return 0;  // start bit
+    if (bit == 9) return 1;  // stop bit
+    return (kText[frame % 2] >> (bit - 1)) & 1;
 }
 
 const SourceRecord* FindSource(const AcquiredRecord& record, const std::string& source) {
@@ -121,8 +124,27 @@ bool IsPod(const std::string& source) {
 
 }  // namespace
 
+std::vector<std::int16_t> PodPattern(int pod, int length) {
+    std::vector<std::int16_t> raw(static_cast<std::size_t>(std::max(0, length)));
+    const int step = std::max(1, length / 256);
+    for (int i = 0; i < length; ++i) {
+        const int count = (i / step) & 0xFF;
+        int bits = count;
+        if (pod != 1) bits = ((0xFF - count) & 0xFC) | ((i / step) & 1) | (SerialBit(i / step) << 1);
+        raw[static_cast<std::size_t>(i)] = static_cast<std::int16_t>(bits);
+    }
+    return raw;
+}
+
+std::array<InputSignal, kMaxAnalogChannels> DefaultInputs() {
+    std::array<InputSignal, kMaxAnalogChannels> in{};
+    for (int ch = 1; ch <= kMaxAnalogChannels; ++ch)
+        in[static_cast<std::size_t>(ch - 1)] = {ch % 2 == 0, (1.0 + ch) * 1e3, 2.4, 0.0};
+    return in;
+}
+
 AcquiredRecord SynthesizeRecord(const ScopeSettings& s, const ModelInfo& model,
-                                std::uint32_t acquisition) {
+                                std::span<const InputSignal> inputs, std::uint32_t acquisition) {
     AcquiredRecord record;
     record.valid = true;
     record.type = s.acquire_type;
@@ -131,7 +153,8 @@ AcquiredRecord SynthesizeRecord(const ScopeSettings& s, const ModelInfo& model,
     record.x_origin = StartTime(s);
     for (int ch = 1; ch <= model.analog_channels; ++ch) {
         if (s.channels[static_cast<std::size_t>(ch - 1)].display) {
-            record.sources.push_back(AnalogRecord(s, ch, record.points, acquisition));
+            record.sources.push_back(AnalogRecord(s, inputs[static_cast<std::size_t>(ch - 1)], ch,
+                                                  record.points, acquisition));
         }
     }
     for (int pod = 1; pod <= model.pods; ++pod) {

@@ -8,7 +8,9 @@
 #pragma once
 
 #include <cstdint>
+#include <array>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -18,8 +20,20 @@
 namespace qn::emu {
 
 // `acquisition` numbers the acquisition and seeds its noise.
+// The signal of each analog input is `inputs[channel - 1]`.
 AcquiredRecord SynthesizeRecord(const ScopeSettings& settings, const ModelInfo& model,
-                                std::uint32_t acquisition);
+                                std::span<const InputSignal> inputs, std::uint32_t acquisition);
+
+// The inputs of a fresh emulator: odd channels a sine, even channels a square
+// wave, channel n at (n + 1) kHz with 2.4 V peak (4.8 V peak-to-peak).
+std::array<InputSignal, kMaxAnalogChannels> DefaultInputs();
+
+// One byte per point of pod `pod`: pod 1 counts (bit 0 is a clock at half
+// the count rate, bit 7 the slowest), pod 2 carries a clock on bit 0, a
+// serial line sending "QN" repeatedly (idle high, start bit, eight data bits
+// least significant first, stop bit) on bit 1 and the inverted count on the
+// other bits.
+std::vector<std::int16_t> PodPattern(int pod, int length);
 
 // Scaling of a transfer in the current :WAV:FORM/UNS settings.
 struct TransferScale {

@@ -10,5 +10,7 @@ int FetchCommand(std::span<char*> args);
 int DemoCommand(std::span<char*> args);
 int ChannelCommand(std::span<char*> args);
 int TimebaseCommand(std::span<char*> args);
+int MeasureCommand(std::span<char*> args);
+int DigitalCommand(std::span<char*> args);
 
 }  // namespace qn::tools

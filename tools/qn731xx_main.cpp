@@ -25,6 +25,10 @@ constexpr Command kCommands[] = {
      "set and print the settings of analog channel N (qn731xx channel N --help)"},
     {"timebase", qn::tools::TimebaseCommand,
      "set and print the horizontal record and acquisition mode"},
+    {"measure", qn::tools::MeasureCommand,
+     "one measurement of a channel, or all with --all: --channel N (--function F | --all)"},
+    {"digital", qn::tools::DigitalCommand,
+     "set and print the settings of digital channel D (qn731xx digital --channel D --help)"},
 };
 
 int Usage(FILE* to) {

@@ -12,6 +12,7 @@
 #include "Quorlen731XX.h"
 #include "Quorlen731XXErrors.h"
 #include "tools/commands.h"
+#include "tools/measure_util.h"
 #include "tools/session_util.h"
 #include "tools/waveform_files.h"
 
@@ -23,6 +24,7 @@ namespace {
 std::vector<OptionSpec> WaveformOptions() {
     std::vector<OptionSpec> o(std::begin(kSessionOptions), std::end(kSessionOptions));
     o.push_back({"channel", true, "analog channel number (fetch; default 1)"});
+    o.push_back({"digital", true, "digital channel number from 0 (fetch: its states)"});
     o.push_back({"points", true, "minimum number of points of the record"});
     o.push_back({"csv", true, "write the waveform(s) to this CSV file"});
     o.push_back({"plot", true, "write an SVG plot to this file"});
@@ -50,6 +52,48 @@ HRESULT FetchChannel(Quorlen731XX* driver, long channel, Trace* trace) {
     if (FAILED(hr)) return hr;
     trace->y.assign(data.data<double>(), data.data<double>() + data.size());
     return hr;  // S_IVISCOPE_INVALID_WFM_ELEMENT: delivered, some points NaN
+}
+
+// The states of digital channel `d` (0/1 per point) from its pod's bytes.
+HRESULT FetchDigital(Quorlen731XX* driver, long d, Trace* trace) {
+    trace->name = "UserDigitalChannel" + std::to_string(d);
+    ComPtr<IQuorlen731XXDigitalChannel> ch;
+    com::Bstr name(trace->name);
+    HRESULT hr =
+        static_cast<IQuorlen731XXDigitalChannels*>(driver)->get_Item(name.get(), ch.Out());
+    if (FAILED(hr)) return hr;
+    SAFEARRAY* raw = nullptr;
+    hr = ch->FetchDigitalWaveform(&raw, &trace->initial_x, &trace->x_increment);
+    com::SafeArray bytes(raw);
+    if (FAILED(hr)) return hr;
+    trace->y.clear();
+    for (std::size_t i = 0; i < bytes.size(); ++i)
+        trace->y.push_back((bytes.data<std::uint8_t>()[i] >> (d % 8)) & 1);
+    return hr;
+}
+
+// Frequency, peak-to-peak and RMS of analog channel `channel`; a value the
+// instrument could not measure is shown with its reason.
+void PrintMeasurements(Quorlen731XX* driver, long channel) {
+    ComPtr<IQuorlen731XXMeasurement> m;
+    if (FAILED(MeasurementNamed(driver, "UserChannel" + std::to_string(channel), &m))) return;
+    struct Row {
+        Quorlen731XXMeasurementEnum function;
+        const char* label;
+        const char* unit;
+    };
+    constexpr Row kRows[] = {{Quorlen731XXMeasurementFrequency, "frequency", "Hz"},
+                             {Quorlen731XXMeasurementVoltagePeakToPeak, "peak-to-peak", "V"},
+                             {Quorlen731XXMeasurementVoltageRMS, "RMS", "V"}};
+    std::printf("Channel%-3ld", channel);
+    for (const Row& r : kRows) {
+        double v = 0;
+        if (SUCCEEDED(m->FetchWaveformMeasurement(r.function, &v)))
+            std::printf("  %s %.6g %s", r.label, v, r.unit);
+        else
+            std::printf("  %s: %s", r.label, LastErrorText().c_str());
+    }
+    std::printf("\n");
 }
 
 void PrintSummary(const Trace& t) {
@@ -131,6 +175,25 @@ int FetchCommand(std::span<char*> argv) {
     HRESULT hr = OpenSession(args, &session);
     if (FAILED(hr)) return ReportFailure("Initialize", hr);
     Quorlen731XX* driver = session.driver.get();
+    if (auto digital = args.Value("digital")) {
+        std::vector<Trace> traces(1);
+        const long d = std::stol(*digital);
+        if (session.emulator) {
+            // The embedded emulator starts with its pods off and no record.
+            ComPtr<IQuorlen731XXDigitalChannel> ch;
+            com::Bstr name("UserDigitalChannel" + std::to_string(d));
+            hr = static_cast<IQuorlen731XXDigitalChannels*>(driver)->get_Item(name.get(), ch.Out());
+            if (SUCCEEDED(hr)) hr = ch->put_Enabled(VARIANT_TRUE);
+            if (SUCCEEDED(hr)) hr = AcquireOnce(driver);
+            if (FAILED(hr)) return ReportFailure("Acquire", hr);
+        }
+        hr = FetchDigital(driver, d, &traces[0]);
+        if (FAILED(hr)) return ReportFailure("FetchDigitalWaveform", hr);
+        PrintSummary(traces[0]);
+        const int rc = WriteFiles(args.Value("csv"), args.Value("plot"), traces);
+        hr = driver->Close();
+        return FAILED(hr) ? ReportFailure("Close", hr) : rc;
+    }
     if (session.emulator) {
         // The embedded emulator has no record until something acquired one.
         hr = ConfigureChannel(driver, channel, 8.0, 0.0);
@@ -179,6 +242,7 @@ int DemoCommand(std::span<char*> argv) {
         if (FAILED(hr = FetchChannel(driver, ch, &traces[std::size_t(ch - 1)])))
             return ReportFailure("FetchWaveform", hr);
     for (const Trace& t : traces) PrintSummary(t);
+    for (long ch = 1; ch <= 2; ++ch) PrintMeasurements(driver, ch);
     const int rc = WriteFiles(args.Value("csv").value_or("qn731xx-demo.csv"),
                               args.Value("plot").value_or("qn731xx-demo.svg"), traces);
     if (FAILED(hr = driver->Close())) return ReportFailure("Close", hr);

@@ -1,0 +1,122 @@
+// qn731xx measure, digital and fetch --digital against the embedded emulator.
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "tools/commands.h"
+
+namespace qn::tools {
+namespace {
+
+struct Result {
+    int rc;
+    std::string out;
+    std::string err;
+};
+
+Result Invoke(int (*command)(std::span<char*>), std::vector<std::string> words) {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    std::vector<char*> argv;
+    for (std::string& w : words) argv.push_back(w.data());
+    ::testing::internal::CaptureStdout();
+    ::testing::internal::CaptureStderr();
+    const int rc = command(argv);
+    std::string out = ::testing::internal::GetCapturedStdout();
+    std::string err = ::testing::internal::GetCapturedStderr();
+    return {rc, out, err};
+}
+
+TEST(MeasureCommand, AllMeasurementsOfAChannelWithUnits) {
+    Result r = Invoke(MeasureCommand, {"--channel", "1", "--all"});
+    ASSERT_EQ(r.rc, 0) << r.out << r.err;
+    // The fresh emulator's channel 1: a 2 kHz sine of 4.8 V peak-to-peak
+    // (plus noise).
+    const auto value = [&](const std::string& label) {
+        const std::size_t at = r.out.find("\n" + label + " ");
+        return at == std::string::npos ? 0.0 : std::strtod(r.out.c_str() + at + 20, nullptr);
+    };
+    EXPECT_NEAR(value("Frequency"), 2000.0, 20.0) << r.out;
+    EXPECT_NEAR(value("Peak-To-Peak"), 4.8, 0.2) << r.out;
+    EXPECT_NEAR(value("Neg Duty Cycle"), 50.0, 2.0) << r.out;
+    for (const char* unit : {" Hz\n", " V\n", " %\n", " s\n"})
+        EXPECT_NE(r.out.find(unit), std::string::npos) << unit << " in\n" << r.out;
+    // Channel 2 is off: the two-source measurements say so.
+    EXPECT_NE(r.out.find("Delay              Quorlen731XX: Specified channel is not enabled."),
+              std::string::npos)
+        << r.out;
+}
+
+TEST(MeasureCommand, OneMeasurementByNameOrNumber) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"DutyCycleNeg", "\"name\":\"Neg Duty Cycle\""}, {"frequencycounter", "\"unit\":\"Hz\""},
+        {"14", "\"function\":\"DutyCyclePos\""}};
+    for (const auto& [function, field] : cases) {
+        Result r = Invoke(MeasureCommand, {"--channel", "2", "--function", function, "--json"});
+        ASSERT_EQ(r.rc, 0) << r.out << r.err;
+        EXPECT_NE(r.out.find(field), std::string::npos) << r.out;
+        EXPECT_NE(r.out.find("\"channel\":2"), std::string::npos) << r.out;
+    }
+}
+
+TEST(MeasureCommand, ImpossibleMeasurementsAndBadArgumentsFail) {
+    // Channel 2 is not shown for channel 1's delay measurement.
+    Result r = Invoke(MeasureCommand, {"--channel", "1", "--function", "Delay"});
+    EXPECT_EQ(r.rc, 1);
+    EXPECT_NE(r.out.find("Specified channel is not enabled"), std::string::npos) << r.out;
+    const std::vector<std::vector<std::string>> usage = {
+        {"--channel", "1"},
+        {"--channel", "1", "--all", "--function", "Period"},
+        {"--channel", "0", "--all"},
+        {"--channel", "1x", "--all"},
+        {"--function", "Frequency2"},
+        {"--function", "28"},
+        {"--function", ""}};
+    for (const auto& words : usage) EXPECT_EQ(Invoke(MeasureCommand, words).rc, 2);
+    EXPECT_EQ(Invoke(MeasureCommand, {"--channel", "3", "--all"}).rc, 1);  // two channels
+}
+
+TEST(DigitalCommand, SetsAndPrintsADigitalChannel) {
+    Result r = Invoke(DigitalCommand, {"--channel", "9", "--model", "QMS4034A", "--enabled", "on",
+                                       "--threshold", "-0.5", "--label", "CLK", "--json"});
+    ASSERT_EQ(r.rc, 0) << r.out << r.err;
+    for (const char* field : {"\"channel\":9", "\"enabled\":true", "\"threshold\":-0.5",
+                              "\"label\":\"\\\"CLK\\\"\""})
+        EXPECT_NE(r.out.find(field), std::string::npos) << field << " in " << r.out;
+    // The default model has no digital channels.
+    EXPECT_EQ(Invoke(DigitalCommand, {"--channel", "0"}).rc, 1);
+    EXPECT_EQ(Invoke(DigitalCommand, {"--channel", "-1"}).rc, 2);
+}
+
+TEST(FetchCommand, DigitalStatesGoToTheCsvFile) {
+    const std::string path = ::testing::TempDir() + "qn-digital.csv";
+    std::remove(path.c_str());
+    Result r = Invoke(FetchCommand, {"--digital", "8", "--model", "QMS4034A", "--csv", path});
+    ASSERT_EQ(r.rc, 0) << r.out << r.err;
+    std::ifstream in(path);
+    std::stringstream text;
+    text << in.rdbuf();
+    const std::string csv = text.str();
+    // Bit 0 of pod 2 is a clock: both states appear, nothing else does.
+    std::size_t zeros = 0, ones = 0, lines = 0;
+    std::istringstream rows(csv);
+    std::string line;
+    std::getline(rows, line);  // header
+    while (std::getline(rows, line)) {
+        ++lines;
+        const std::string state = line.substr(line.rfind(',') + 1);
+        zeros += state == "0";
+        ones += state == "1";
+    }
+    EXPECT_GT(lines, 100u);
+    EXPECT_EQ(zeros + ones, lines) << csv.substr(0, 200);
+    EXPECT_GT(zeros, 0u);
+    EXPECT_GT(ones, 0u);
+}
+
+}  // namespace
+}  // namespace qn::tools
