@@ -3,6 +3,7 @@
 // failures reported; the placeholder processor.
 #include "com/registration.h"
 
+#include <dlfcn.h>
 #include <gtest/gtest.h>
 #include <stdlib.h>
 
@@ -28,6 +29,21 @@ const std::string kLibId = GuidToString(LIBID_Quorlen731XXLib);
 const std::string kCat1 = GuidToString(CATID_Quorlen731XXIviDrivers);
 const std::string kCat2 = GuidToString(CATID_Quorlen731XXIviScopeDrivers);
 const std::string kClassKey = "HKCR\\CLSID\\" + kClsid;
+
+// The entry points of the built driver library rather than of the driver code
+// linked into this test, so that the module path registration writes is the
+// library's own.
+HRESULT ModuleEntry(const char* name) {
+    static void* module = ::dlopen(QN_DRIVER_MODULE_PATH, RTLD_NOW | RTLD_LOCAL);
+    void* entry = module ? ::dlsym(module, name) : nullptr;
+    if (!entry) {
+        ADD_FAILURE() << "no " << name << " in " << QN_DRIVER_MODULE_PATH;
+        return E_FAIL;
+    }
+    return reinterpret_cast<HRESULT (*)()>(entry)();
+}
+HRESULT RegisterModule() { return ModuleEntry("DllRegisterServer"); }
+HRESULT UnregisterModule() { return ModuleEntry("DllUnregisterServer"); }
 
 // A key written by registration; a null name means the key alone.
 struct Expected {
@@ -119,7 +135,7 @@ void ExpectPresent(const RegistryTree& tree, const std::vector<Expected>& entrie
 
 TEST_F(Registration, WritesEveryEntryAndRemovesThemAgain) {
     Write(ForeignEntries());
-    ASSERT_EQ(DllRegisterServer(), S_OK);
+    ASSERT_EQ(RegisterModule(), S_OK);
     RegistryTree tree = Load();
     ExpectPresent(tree, ExpectedEntries());
     ExpectPresent(tree, ForeignEntries());
@@ -136,7 +152,7 @@ TEST_F(Registration, WritesEveryEntryAndRemovesThemAgain) {
               (std::vector<std::string>{"Implemented Categories", "InprocServer32", "ProgID",
                                         "Programmable", "TypeLib", "VersionIndependentProgID"}));
 
-    ASSERT_EQ(DllUnregisterServer(), S_OK);
+    ASSERT_EQ(UnregisterModule(), S_OK);
     tree = Load();
     for (const std::string& key : std::vector<std::string>{
              kClassKey, "HKCR\\AppID\\" + kAppId, "HKCR\\AppID\\Quorlen731XX.DLL",
@@ -149,25 +165,25 @@ TEST_F(Registration, WritesEveryEntryAndRemovesThemAgain) {
 }
 
 TEST_F(Registration, IsIdempotentAndReplacesStaleEntries) {
-    ASSERT_EQ(DllRegisterServer(), S_OK);
+    ASSERT_EQ(RegisterModule(), S_OK);
     const std::string once = FileText();
-    ASSERT_EQ(DllRegisterServer(), S_OK);
+    ASSERT_EQ(RegisterModule(), S_OK);
     EXPECT_EQ(FileText(), once);
 
     // A registration of an older build left entries that no longer apply.
     Write({{kClassKey + "\\LocalServer32", "", "/old/server"},
            {"HKCR\\Quorlen731XX.Quorlen731XX\\CurVer", "", "Quorlen731XX.Quorlen731XX.0"},
            {kClassKey + "\\InprocServer32", "", "/old/libquorlen731xx.so"}});
-    ASSERT_EQ(DllRegisterServer(), S_OK);
+    ASSERT_EQ(RegisterModule(), S_OK);
     EXPECT_EQ(FileText(), once);
 }
 
 TEST_F(Registration, UnregisteringWhatIsNotThereSucceeds) {
-    EXPECT_EQ(DllUnregisterServer(), S_OK);
+    EXPECT_EQ(UnregisterModule(), S_OK);
     EXPECT_FALSE(fs::exists(file_));
     Write(ForeignEntries());
-    EXPECT_EQ(DllUnregisterServer(), S_OK);
-    EXPECT_EQ(DllUnregisterServer(), S_OK);
+    EXPECT_EQ(UnregisterModule(), S_OK);
+    EXPECT_EQ(UnregisterModule(), S_OK);
     ExpectPresent(Load(), ForeignEntries());
 }
 
@@ -175,7 +191,7 @@ TEST_F(Registration, AMalformedStoreFailsWithoutChangingIt) {
     std::ofstream(file_) << "[HKEY_CLASSES_ROOT\\AppID]\nnot a value line\n";
     const std::string before = FileText();
     qn::com::TakeThreadError(nullptr);
-    for (HRESULT (*entry)() : {&DllRegisterServer, &DllUnregisterServer}) {
+    for (HRESULT (*entry)() : {&RegisterModule, &UnregisterModule}) {
         EXPECT_EQ(entry(), SELFREG_E_CLASS);
         qn::com::ErrorRecord error;
         ASSERT_TRUE(qn::com::TakeThreadError(&error));
