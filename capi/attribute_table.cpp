@@ -1,0 +1,153 @@
+// The attribute rows: ID constant, interface, property and scope. The lookup
+// table joining each row to its property is built once.
+#include "capi/attribute_table.h"
+
+#include <array>
+#include <unordered_map>
+
+#include "Qn731XX.h"
+
+namespace qn::capi {
+
+namespace {
+
+#define QN_ATTR(Id, Itf, Prop, Where) AttributeRow{Id, #Id, #Itf "." #Prop, Scope::Where}
+
+constexpr auto kRows = std::to_array<AttributeRow>({
+    QN_ATTR(IVI_ATTR_RANGE_CHECK, IIviDriverOperation, RangeCheck, kSession),
+    QN_ATTR(IVI_ATTR_QUERY_INSTRUMENT_STATUS, IIviDriverOperation, QueryInstrumentStatus, kSession),
+    QN_ATTR(IVI_ATTR_CACHE, IIviDriverOperation, Cache, kSession),
+    QN_ATTR(IVI_ATTR_SIMULATE, IIviDriverOperation, Simulate, kSession),
+    QN_ATTR(IVI_ATTR_RECORD_COERCIONS, IIviDriverOperation, RecordCoercions, kSession),
+    QN_ATTR(IVI_ATTR_DRIVER_SETUP, IIviDriverOperation, DriverSetup, kSession),
+    QN_ATTR(IVI_ATTR_INTERCHANGE_CHECK, IIviDriverOperation, InterchangeCheck, kSession),
+    QN_ATTR(IVI_ATTR_CHANNEL_COUNT, IIviScopeChannels, Count, kSession),
+    QN_ATTR(IVI_ATTR_IO_RESOURCE_DESCRIPTOR, IIviDriverOperation, IoResourceDescriptor, kSession),
+    QN_ATTR(IVI_ATTR_LOGICAL_NAME, IIviDriverOperation, LogicalName, kSession),
+    QN_ATTR(IVI_ATTR_SUPPORTED_INSTRUMENT_MODELS, IIviDriverIdentity, SupportedInstrumentModels, kSession),
+    QN_ATTR(IVI_ATTR_GROUP_CAPABILITIES, IIviDriverIdentity, GroupCapabilities, kSession),
+    QN_ATTR(IVI_ATTR_INSTRUMENT_FIRMWARE_REVISION, IIviDriverIdentity, InstrumentFirmwareRevision, kSession),
+    QN_ATTR(IVI_ATTR_INSTRUMENT_MANUFACTURER, IIviDriverIdentity, InstrumentManufacturer, kSession),
+    QN_ATTR(IVI_ATTR_INSTRUMENT_MODEL, IIviDriverIdentity, InstrumentModel, kSession),
+    QN_ATTR(IVI_ATTR_SPECIFIC_DRIVER_VENDOR, IIviComponentIdentity, Vendor, kSession),
+    QN_ATTR(IVI_ATTR_SPECIFIC_DRIVER_DESCRIPTION, IIviComponentIdentity, Description, kSession),
+    QN_ATTR(IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MAJOR_VERSION, IIviDriverIdentity, SpecificationMajorVersion, kSession),
+    QN_ATTR(IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MINOR_VERSION, IIviDriverIdentity, SpecificationMinorVersion, kSession),
+    QN_ATTR(IVI_ATTR_SPECIFIC_DRIVER_REVISION, IIviComponentIdentity, Revision, kSession),
+
+    QN_ATTR(IVISCOPE_ATTR_VERTICAL_RANGE, IIviScopeChannel, Range, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_VERTICAL_OFFSET, IIviScopeChannel, Offset, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_VERTICAL_COUPLING, IIviScopeChannel, Coupling, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_PROBE_ATTENUATION, IIviScopeChannel, ProbeAttenuation, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_CHANNEL_ENABLED, IIviScopeChannel, Enabled, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_MAX_INPUT_FREQUENCY, IIviScopeChannel, InputFrequencyMax, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_HORZ_TIME_PER_RECORD, IIviScopeAcquisition, TimePerRecord, kSession),
+    QN_ATTR(IVISCOPE_ATTR_HORZ_RECORD_LENGTH, IIviScopeAcquisition, RecordLength, kSession),
+    QN_ATTR(IVISCOPE_ATTR_HORZ_MIN_NUM_PTS, IIviScopeAcquisition, NumberOfPointsMin, kSession),
+    QN_ATTR(IVISCOPE_ATTR_HORZ_SAMPLE_RATE, IIviScopeAcquisition, SampleRate, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_TYPE, IIviScopeTrigger, Type, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_SOURCE, IIviScopeTrigger, Source, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_COUPLING, IIviScopeTrigger, Coupling, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_HOLDOFF, IIviScopeTrigger, Holdoff, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_LEVEL, IIviScopeTrigger, Level, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_SLOPE, IIviScopeTriggerEdge, Slope, kSession),
+    QN_ATTR(IVISCOPE_ATTR_INTERPOLATION, IIviScopeAcquisition, Interpolation, kSession),
+    QN_ATTR(IVISCOPE_ATTR_ACQUISITION_TYPE, IIviScopeAcquisition, Type, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TRIGGER_MODIFIER, IIviScopeTrigger, Modifier, kSession),
+    QN_ATTR(IVISCOPE_ATTR_INPUT_IMPEDANCE, IIviScopeChannel, InputImpedance, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_NUM_AVERAGES, IIviScopeAcquisition, NumberOfAverages, kSession),
+    QN_ATTR(IVISCOPE_ATTR_NUM_ENVELOPES, IIviScopeAcquisition, NumberOfEnvelopes, kSession),
+    QN_ATTR(IVISCOPE_ATTR_SAMPLE_MODE, IIviScopeAcquisition, SampleMode, kSession),
+    QN_ATTR(IVISCOPE_ATTR_INITIATE_CONTINUOUS, IIviScopeTrigger, Continuous, kSession),
+    QN_ATTR(IVISCOPE_ATTR_PROBE_SENSE_VALUE, IIviScopeChannel, ProbeSense, kChannel),
+    QN_ATTR(IVISCOPE_ATTR_ACQUISITION_START_TIME, IIviScopeAcquisition, StartTime, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TV_TRIGGER_SIGNAL_FORMAT, IIviScopeTriggerTv, SignalFormat, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TV_TRIGGER_POLARITY, IIviScopeTriggerTv, polarity, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TV_TRIGGER_EVENT, IIviScopeTriggerTv, Event, kSession),
+    QN_ATTR(IVISCOPE_ATTR_TV_TRIGGER_LINE_NUMBER, IIviScopeTriggerTv, LineNumber, kSession),
+    QN_ATTR(IVISCOPE_ATTR_RUNT_HIGH_THRESHOLD, IIviScopeTriggerRunt, ThresholdHigh, kSession),
+    QN_ATTR(IVISCOPE_ATTR_RUNT_LOW_THRESHOLD, IIviScopeTriggerRunt, ThresholdLow, kSession),
+    QN_ATTR(IVISCOPE_ATTR_RUNT_POLARITY, IIviScopeTriggerRunt, polarity, kSession),
+    QN_ATTR(IVISCOPE_ATTR_GLITCH_WIDTH, IIviScopeTriggerGlitch, Width, kSession),
+    QN_ATTR(IVISCOPE_ATTR_GLITCH_POLARITY, IIviScopeTriggerGlitch, polarity, kSession),
+    QN_ATTR(IVISCOPE_ATTR_GLITCH_CONDITION, IIviScopeTriggerGlitch, condition, kSession),
+    QN_ATTR(IVISCOPE_ATTR_WIDTH_LOW_THRESHOLD, IIviScopeTriggerWidth, ThresholdLow, kSession),
+    QN_ATTR(IVISCOPE_ATTR_WIDTH_HIGH_THRESHOLD, IIviScopeTriggerWidth, ThresholdHigh, kSession),
+    QN_ATTR(IVISCOPE_ATTR_WIDTH_POLARITY, IIviScopeTriggerWidth, polarity, kSession),
+    QN_ATTR(IVISCOPE_ATTR_WIDTH_CONDITION, IIviScopeTriggerWidth, condition, kSession),
+    QN_ATTR(IVISCOPE_ATTR_MEAS_HIGH_REF, IIviScopeReferenceLevel, High, kSession),
+    QN_ATTR(IVISCOPE_ATTR_MEAS_LOW_REF, IIviScopeReferenceLevel, Low, kSession),
+    QN_ATTR(IVISCOPE_ATTR_MEAS_MID_REF, IIviScopeReferenceLevel, Mid, kSession),
+    QN_ATTR(IVISCOPE_ATTR_AC_LINE_TRIGGER_SLOPE, IIviScopeTriggerAcLine, Slope, kSession),
+
+    QN_ATTR(QN731XX_ATTR_CHANNEL_LABEL, IQuorlen731XXChannel, Label, kUserChannel),
+    QN_ATTR(QN731XX_ATTR_CHANNEL_INVERT, IQuorlen731XXChannel, Invert, kUserChannel),
+    QN_ATTR(QN731XX_ATTR_CHANNEL_PROBE_SKEW, IQuorlen731XXChannel, ProbeSkew, kUserChannel),
+    QN_ATTR(QN731XX_ATTR_CHANNEL_PROTECTION, IQuorlen731XXChannel, Protection, kUserChannel),
+    QN_ATTR(QN731XX_ATTR_CHANNEL_UNITS, IQuorlen731XXChannel, Units, kUserChannel),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_TIME_AT_EDGE_OCCURRENCE, IQuorlen731XXConfigurableMeasurement, TimeAtEdgeOccurrence, kSession),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_TIME_AT_EDGE_SLOPE, IQuorlen731XXConfigurableMeasurement, TimeAtEdgeSlope, kSession),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_TIME_AT_VALUE_OCCURRENCE, IQuorlen731XXConfigurableMeasurement, TimeAtValueOccurrence, kSession),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_TIME_AT_VALUE_SLOPE, IQuorlen731XXConfigurableMeasurement, TimeAtValueSlope, kSession),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_TIME_AT_VALUE_VALUE, IQuorlen731XXConfigurableMeasurement, TimeAtValueValue, kSession),
+    QN_ATTR(QN731XX_ATTR_CONFIGURABLEMEASUREMENT_VALUE_AT_TIME_TIME, IQuorlen731XXConfigurableMeasurement, ValueAtTimeTime, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_ENABLED, IQuorlen731XXCursors, Enabled, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_X1_POSITION, IQuorlen731XXCursors, X1Position, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_X1Y1_SOURCE, IQuorlen731XXCursors, X1Y1Source, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_X2_POSITION, IQuorlen731XXCursors, X2Position, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_X2Y2_SOURCE, IQuorlen731XXCursors, X2Y2Source, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_Y1_POSITION, IQuorlen731XXCursors, Y1Position, kSession),
+    QN_ATTR(QN731XX_ATTR_CURSORS_Y2_POSITION, IQuorlen731XXCursors, Y2Position, kSession),
+    QN_ATTR(QN731XX_ATTR_DIGITALCHANNEL_ENABLED, IQuorlen731XXDigitalChannel, Enabled, kDigitalChannel),
+    QN_ATTR(QN731XX_ATTR_DIGITALCHANNEL_LABEL, IQuorlen731XXDigitalChannel, Label, kDigitalChannel),
+    QN_ATTR(QN731XX_ATTR_DIGITALCHANNEL_THRESHOLD, IQuorlen731XXDigitalChannel, Threshold, kDigitalChannel),
+    QN_ATTR(QN731XX_ATTR_DISPLAY_LABEL_ENABLED, IQuorlen731XXDisplay, LabelEnabled, kSession),
+    QN_ATTR(QN731XX_ATTR_DISPLAY_PERSISTENCE, IQuorlen731XXDisplay, Persistence, kSession),
+    QN_ATTR(QN731XX_ATTR_EXTERNAL_PROBE_ATTENUATION, IQuorlen731XXExternal, ProbeAttenuation, kSession),
+    QN_ATTR(QN731XX_ATTR_EXTERNAL_PROBE_SENSE, IQuorlen731XXExternal, ProbeSense, kSession),
+    QN_ATTR(QN731XX_ATTR_EXTERNAL_UNITS, IQuorlen731XXExternal, Units, kSession),
+    QN_ATTR(QN731XX_ATTR_MULTIWAVEFORMMEASUREMENT_DELAY_OCCURENCE1, IQuorlen731XXMultiWaveformMeasurement, DelayOccurence1, kSession),
+    QN_ATTR(QN731XX_ATTR_MULTIWAVEFORMMEASUREMENT_DELAY_OCCURENCE2, IQuorlen731XXMultiWaveformMeasurement, DelayOccurence2, kSession),
+    QN_ATTR(QN731XX_ATTR_MULTIWAVEFORMMEASUREMENT_DELAY_SLOPE1, IQuorlen731XXMultiWaveformMeasurement, DelaySlope1, kSession),
+    QN_ATTR(QN731XX_ATTR_MULTIWAVEFORMMEASUREMENT_DELAY_SLOPE2, IQuorlen731XXMultiWaveformMeasurement, DelaySlope2, kSession),
+    QN_ATTR(QN731XX_ATTR_MULTIWAVEFORMMEASUREMENT_SOURCE2, IQuorlen731XXMultiWaveformMeasurement, Source2, kSession),
+    QN_ATTR(QN731XX_ATTR_STATUS_SERIAL_POLL, IQuorlen731XXStatus, SerialPoll, kSession),
+    QN_ATTR(QN731XX_ATTR_SYSTEM_DATE, IQuorlen731XXSystem, Date, kSession),
+    QN_ATTR(QN731XX_ATTR_SYSTEM_SERIAL_NUMBER, IQuorlen731XXSystem, SerialNumber, kSession),
+    QN_ATTR(QN731XX_ATTR_SYSTEM_TIME, IQuorlen731XXSystem, Time, kSession),
+    QN_ATTR(QN731XX_ATTR_SYSTEM_TIMEOUT_MILLISECONDS, IQuorlen731XXSystem, TimeoutMilliseconds, kSession),
+    QN_ATTR(QN731XX_ATTR_SYSTEM_TRACE_ENABLED, IQuorlen731XXSystem, TraceEnabled, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_RUNT_POLARITY, IQuorlen731XXTriggerRunt, polarity, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_RUNT_THRESHOLD_HIGH, IQuorlen731XXTriggerRunt, ThresholdHigh, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_RUNT_THRESHOLD_LOW, IQuorlen731XXTriggerRunt, ThresholdLow, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_TV_EVENT, IQuorlen731XXTriggerTv, Event, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_ANALOG_MASK, IQuorlen731XXTriggerState, AnalogMask, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_ANALOG_PATTERN, IQuorlen731XXTriggerState, AnalogPattern, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_CLOCK_SLOPE, IQuorlen731XXTriggerState, ClockSlope, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_CLOCK_SOURCE, IQuorlen731XXTriggerState, ClockSource, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_DIGITAL_MASK, IQuorlen731XXTriggerState, DigitalMask, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_STATE_DIGITAL_PATTERN, IQuorlen731XXTriggerState, DigitalPattern, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_PATTERN_ANALOG_MASK, IQuorlen731XXTriggerPattern, AnalogMask, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_PATTERN_ANALOG_PATTERN, IQuorlen731XXTriggerPattern, AnalogPattern, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_PATTERN_CONDITION, IQuorlen731XXTriggerPattern, condition, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_PATTERN_DIGITAL_MASK, IQuorlen731XXTriggerPattern, DigitalMask, kSession),
+    QN_ATTR(QN731XX_ATTR_TRIGGER_PATTERN_DIGITAL_PATTERN, IQuorlen731XXTriggerPattern, DigitalPattern, kSession),
+    QN_ATTR(QN731XX_ATTR_MEASUREMENT_COUNT, IQuorlen731XXMeasurements, Count, kSession),
+    QN_ATTR(QN731XX_ATTR_DIGITALCHANNEL_COUNT, IQuorlen731XXDigitalChannels, Count, kSession),
+});
+
+}  // namespace
+
+std::span<const AttributeRow> AttributeRows() { return kRows; }
+
+Attribute FindAttribute(ViAttr id) {
+    static const std::unordered_map<ViAttr, Attribute> by_id = [] {
+        std::unordered_map<ViAttr, Attribute> m;
+        for (const AttributeRow& row : kRows) m.emplace(row.id, Attribute{&row, FindProperty(row.key)});
+        return m;
+    }();
+    auto it = by_id.find(id);
+    return it == by_id.end() ? Attribute{} : it->second;
+}
+
+}  // namespace qn::capi

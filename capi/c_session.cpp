@@ -1,0 +1,113 @@
+// Session handles come from the IVI-C session library; the C layer keeps one
+// counted reference to the driver object in each handle's data pointer. One
+// mutex orders reading the pointer (and adding the call's reference) against
+// taking it out at close, so a call racing a close on another thread either
+// gets a live object or an invalid session, never a released one.
+#include "capi/c_session.h"
+
+#include <cstdio>
+#include <cstring>
+#include <mutex>
+#include <string>
+
+#include "platform/com/errorinfo.h"
+#include "platform/ivi/ivisession.h"
+
+namespace qn::capi {
+
+namespace {
+
+std::mutex& PointerMutex() {
+    static std::mutex m;
+    return m;
+}
+
+}  // namespace
+
+ViStatus Fail(ViSession vi, ViStatus status, std::string_view text) {
+    IviSession_SetError(vi, status, std::string(text).c_str());
+    return status;
+}
+
+ViStatus NullResult(ViSession vi, std::string_view parameter) {
+    return Fail(vi, kFailure, "Null pointer passed for parameter " + std::string(parameter) + ".");
+}
+
+ViStatus Convert(ViSession vi, HRESULT hr) {
+    const ViStatus status = ToCStatus(hr);
+    com::ErrorRecord record;
+    if (com::TakeThreadError(&record)) {
+        IviSession_SetError(vi, status, record.description.c_str());
+    } else if (status < 0) {
+        std::string_view text = StatusText(status);
+        if (text.empty()) {
+            char buf[64];
+            std::snprintf(buf, sizeof buf, "Unexpected failure (result code 0x%08X).",
+                          static_cast<unsigned>(hr));
+            IviSession_SetError(vi, status, buf);
+        } else {
+            IviSession_SetError(vi, status, std::string(text).c_str());
+        }
+    }
+    return status;
+}
+
+ViStatus DriverOf(ViSession vi, ComPtr<IUnknown>* out) {
+    std::lock_guard<std::mutex> g(PointerMutex());
+    void* data = nullptr;
+    ViStatus status = IviSession_GetDataPtr(vi, &data);
+    if (status != VI_SUCCESS) return status;
+    if (!data) return IVISESSION_ERROR_INVALID_SESSION;  // being closed
+    *out = ComPtr<IUnknown>(static_cast<IUnknown*>(data));
+    return VI_SUCCESS;
+}
+
+ViStatus Attach(IUnknown* driver, ViSession* vi) {
+    *vi = 0;
+    ViSession created = 0;
+    ViStatus status = IviSession_New(&created);
+    if (status != VI_SUCCESS) return status;
+    {
+        std::lock_guard<std::mutex> g(PointerMutex());
+        status = IviSession_SetDataPtr(created, driver);
+        if (status == VI_SUCCESS) driver->AddRef();
+    }
+    if (status != VI_SUCCESS) {
+        IviSession_Dispose(created);
+        return status;
+    }
+    *vi = created;
+    return VI_SUCCESS;
+}
+
+ViStatus Detach(ViSession vi, ComPtr<IUnknown>* driver) {
+    std::lock_guard<std::mutex> g(PointerMutex());
+    void* data = nullptr;
+    ViStatus status = IviSession_GetDataPtr(vi, &data);
+    if (status != VI_SUCCESS) return status;
+    if (!data) return IVISESSION_ERROR_INVALID_SESSION;
+    IviSession_SetDataPtr(vi, nullptr);
+    driver->Attach(static_cast<IUnknown*>(data));
+    return VI_SUCCESS;
+}
+
+ViStatus CopyString(ViSession vi, std::string_view text, ViInt32 size, ViChar* buffer) {
+    if (size < 0)
+        return Fail(vi, static_cast<ViStatus>(0xBFFA0010u),
+                    "Invalid value (" + std::to_string(size) + ") for parameter bufferSize.");
+    const std::size_t n = text.size();
+    // The size needed, capped so that it stays a positive status.
+    const ViStatus needed = n >= 0x7FFFFFFFu ? 0x7FFFFFFF : static_cast<ViStatus>(n + 1);
+    if (!buffer || size == 0) return needed;
+    const auto capacity = static_cast<std::size_t>(size);
+    if (n + 1 > capacity) {
+        std::memcpy(buffer, text.data(), capacity - 1);
+        buffer[capacity - 1] = '\0';
+        return needed;
+    }
+    std::memcpy(buffer, text.data(), n);
+    buffer[n] = '\0';
+    return VI_SUCCESS;
+}
+
+}  // namespace qn::capi

@@ -1,0 +1,39 @@
+// Repeated-capability items reached from a C session: the channel,
+// measurement and digital-channel objects a selector names.
+#pragma once
+
+#include <string>
+#include <type_traits>
+
+#include "capi/c_session.h"
+#include "capi/selector.h"
+
+namespace qn::capi {
+
+// The element interface of a collection, from its get_Item member.
+template <class C, class E>
+E* ItemType(HRESULT (C::*)(BSTR, E**));
+template <class Coll>
+using ElementOf = std::remove_pointer_t<decltype(ItemType(&Coll::get_Item))>;
+
+// The item of `Coll` named by the first name of `selector`; the selector's
+// errors and the collection's own errors are converted and recorded.
+template <class Coll, class Out>
+ViStatus ItemOf(ViSession vi, IUnknown* driver, ViConstString selector, ComPtr<Out>* out) {
+    using Elem = ElementOf<Coll>;
+    std::string name;
+    ViStatus status = FirstSelectorName(vi, selector, &name);
+    if (status != VI_SUCCESS) return status;
+    ComPtr<Coll> collection;
+    status = Convert(vi, driver->QueryInterface(iid_of<Coll>, collection.OutVoid()));
+    if (status < 0) return status;
+    com::Bstr bname(name);
+    ComPtr<Elem> item;
+    status = Convert(vi, collection->get_Item(bname.get(), item.Out()));
+    if (status < 0) return status;
+    if constexpr (std::is_same_v<Out, Elem>) *out = std::move(item);
+    else *out = ComPtr<Out>(item.get());
+    return VI_SUCCESS;
+}
+
+}  // namespace qn::capi

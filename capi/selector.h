@@ -1,0 +1,16 @@
+// Repeated-capability selectors given to the C API: a list of names
+// separated by commas, of which the C functions use the first.
+#pragma once
+
+#include <string>
+
+#include "visatype.h"
+
+namespace qn::capi {
+
+// The first name of `selector`, trimmed. An empty selector, an empty element
+// of the list, or a name with more than one level ("a:b", "[...]") is refused
+// as a badly formed selector (recorded for the session).
+ViStatus FirstSelectorName(ViSession vi, ViConstString selector, std::string* name);
+
+}  // namespace qn::capi
