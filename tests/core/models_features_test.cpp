@@ -1,7 +1,8 @@
 #include <gtest/gtest.h>
 
-#include <algorithm>
-#include <map>
+#include <set>
+#include <sstream>
+#include <string>
 
 #include "Quorlen731XXErrors.h"
 #include "core/features.h"
@@ -13,52 +14,88 @@
 namespace qn::test {
 namespace {
 
-TEST(SupportedModels, SixtyFiveModelsInSevenFamilies) {
-    std::map<std::string_view, int> per_family;
-    for (const CSupportedModelRow& r : SupportedModelRows()) ++per_family[r.family];
-    EXPECT_EQ(per_family, (std::map<std::string_view, int>{{"4XXXB", 14}, {"4XXXA", 16},
-                                                           {"2XXXA", 6},  {"3XXXL", 4},
-                                                           {"3XXXA", 16}, {"7314X", 4},
-                                                           {"7312X", 5}}));
+// The supported models as documented, family by family.
+constexpr std::pair<const char*, const char*> kDocumentedFamilies[] = {
+    {"4XXXB", "QMS4104B QMS4054B QMS4052B QMS4034B QMS4032B QMS4012B QMS4014B QDS4014B QDS4052B "
+              "QDS4054B QDS4032B QDS4034B QDS4012B QDS4104B"},
+    {"4XXXA", "QMS4014A QMS4012A QDS4014A QDS4012A QMS4104A QMS4054A QMS4034A QMS4102A QMS4052A "
+              "QMS4032A QDS4104A QDS4054A QDS4034A QDS4102A QDS4052A QDS4032A"},
+    {"2XXXA", "QDS2012A QDS2014A QDS2032A QDS2034A QDS2052A QDS2054A"},
+    {"3XXXL", "QDS3034L QDS3104L QDS3054L QDS3014L"},
+    {"3XXXA", "QMS3104A QDS3104A QMS3102A QDS3102A QMS3054A QDS3054A QMS3052A QDS3052A QMS3034A "
+              "QDS3034A QMS3032A QDS3032A QMS3014A QDS3014A QMS3012A QDS3012A"},
+    {"7314X", "73142D 73142A 73141D 73141A"},
+    {"7312X", "73124A 73122D 73122A 73121D 73121A"},
+};
+
+TEST(SupportedModels, EveryDocumentedModelIsSupportedInItsOwnFamilyOnly) {
     const auto& v = CSupportedModelValidator::Instance();
-    EXPECT_TRUE(v.IsSupported("QDS4032A"));
-    EXPECT_FALSE(v.IsSupported("qds4032a"));   // exact case
-    EXPECT_FALSE(v.IsSupported("QDS4032"));    // no prefix match
-    EXPECT_FALSE(v.IsSupported(""));
-    EXPECT_TRUE(v.IsInFamily("73141D", "7314X"));
-    EXPECT_FALSE(v.IsInFamily("73141D", "7312X"));
-    // The list holds every model once, comma-separated without blanks.
-    std::string list = v.ModelList();
-    EXPECT_EQ(std::count(list.begin(), list.end(), ','), 64);
-    EXPECT_EQ(list.find(' '), std::string::npos);
+    std::multiset<std::string> documented;
+    for (auto [family, models] : kDocumentedFamilies) {
+        std::istringstream in(models);
+        for (std::string m; in >> m;) {
+            documented.insert(m);
+            EXPECT_TRUE(v.IsSupported(m)) << m;
+            for (auto [other, unused] : kDocumentedFamilies)
+                EXPECT_EQ(v.IsInFamily(m, other), std::string_view(other) == family)
+                    << m << " in " << other;
+        }
+    }
+    EXPECT_EQ(documented.size(), 65u);
+    // The model list names each documented model once, comma-separated.
+    std::multiset<std::string> listed;
+    std::istringstream list(v.ModelList());
+    for (std::string m; std::getline(list, m, ',');) listed.insert(m);
+    EXPECT_EQ(listed, documented);
+    // Names are matched exactly, never by case, prefix or family.
+    for (const char* near : {"qds4032a", "QDS4032", "QDS4032A ", "QDS4032AB", "7312X", ""})
+        EXPECT_FALSE(v.IsSupported(near)) << near;
+    EXPECT_FALSE(v.IsInFamily("73141d", "7314X"));
+    EXPECT_FALSE(v.IsInFamily("73141D", "7314x"));
 }
 
-TEST(FixedFeatures, EarlyFamilyRules) {
-    FeatureRecord a = FixedFeatures("73122A");
-    EXPECT_EQ(a.analog_channel_count, 2);
-    EXPECT_EQ(a.digital_channel_count, 0);
-    EXPECT_EQ(a.bandwidth, 1e8);
-    EXPECT_EQ(a.bandwidth_limit, 2e7);
-    EXPECT_TRUE(a.ground_coupling);
-    EXPECT_FALSE(a.fifty_ohm_input);
-    EXPECT_FALSE(a.probe_skew);
-    EXPECT_TRUE(a.external_trigger_input);
-    EXPECT_FALSE(a.display_labels);
-    EXPECT_EQ(a.waveform_point_limit, 2000);
-    EXPECT_EQ(FixedFeatures("73121D").bandwidth, 6e7);
-    FeatureRecord b = FixedFeatures("73124A");
-    EXPECT_EQ(b.analog_channel_count, 4);
-    EXPECT_FALSE(b.external_trigger_input);
-    FeatureRecord d = FixedFeatures("73141D");
-    EXPECT_EQ(d.analog_channel_count, 2);
-    EXPECT_EQ(d.digital_channel_count, 16);
-    EXPECT_EQ(d.bandwidth, 3e8);
-    EXPECT_EQ(FixedFeatures("73142A").bandwidth, 5e8);
-    // Other families keep the defaults until discovery.
-    FeatureRecord q = FixedFeatures("QDS4032A");
-    EXPECT_FALSE(q.early_family);
-    EXPECT_EQ(q.analog_channel_count, 4);
-    EXPECT_EQ(q.waveform_point_limit, 1000);
+// The record of every early-family model, written out from the documented
+// rules, and the defaults that every other model keeps until discovery.
+TEST(FixedFeatures, EveryEarlyModelAndTheDefaults) {
+    struct Case {
+        const char* model;
+        LONG analog, digital;
+        double bandwidth, limit;
+        bool ext_trigger, labels, ground, fifty, protection, skew, auto_level;
+    };
+    const Case cases[] = {
+        {"73142D", 2, 16, 5e8, 2.5e7, true, true, false, true, true, true, false},
+        {"73142A", 2, 0, 5e8, 2.5e7, true, false, false, true, true, true, false},
+        {"73141D", 2, 16, 3e8, 2.5e7, true, true, false, true, true, true, false},
+        {"73141A", 2, 0, 3e8, 2.5e7, true, false, false, true, true, true, false},
+        {"73124A", 4, 0, 1e8, 2e7, false, false, true, false, false, false, true},
+        {"73122D", 2, 16, 1e8, 2e7, true, true, true, false, false, false, true},
+        {"73122A", 2, 0, 1e8, 2e7, true, false, true, false, false, false, true},
+        {"73121D", 2, 16, 6e7, 2e7, true, true, true, false, false, false, true},
+        {"73121A", 2, 0, 6e7, 2e7, true, false, true, false, false, false, true},
+        {"QDS4032A", 4, 16, 1e9, 2.5e7, true, true, false, true, true, true, false},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.model);
+        const FeatureRecord f = FixedFeatures(c.model);
+        const bool early = c.model[0] == '7';
+        EXPECT_EQ(f.early_family, early);
+        EXPECT_EQ(f.waveform_point_limit, early ? 2000 : 1000);
+        EXPECT_EQ(f.analog_channel_count, c.analog);
+        EXPECT_EQ(f.digital_channel_count, c.digital);
+        EXPECT_EQ(f.bandwidth, c.bandwidth);
+        EXPECT_EQ(f.bandwidth_limit, c.limit);
+        EXPECT_EQ(f.external_trigger_input, c.ext_trigger);
+        EXPECT_EQ(f.display_labels, c.labels);
+        EXPECT_EQ(f.ground_coupling, c.ground);
+        EXPECT_EQ(f.fifty_ohm_input, c.fifty);
+        EXPECT_EQ(f.channel_protection, c.protection);
+        EXPECT_EQ(f.probe_skew, c.skew);
+        EXPECT_EQ(f.auto_level_sweep, c.auto_level);
+        EXPECT_FALSE(f.digitize_command);
+        EXPECT_FALSE(f.sequence_trigger);
+        EXPECT_FALSE(f.counted_maximum_points);
+    }
 }
 
 TEST(Discovery, AFailingQueryEndsDiscoveryButNotInitialize) {
