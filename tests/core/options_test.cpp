@@ -68,6 +68,40 @@ protected:
     CErrorManagerBase err;
 };
 
+// A new session holds the documented flag defaults; each option name, in
+// any letter case, sets its own flag and no other.
+TEST_F(OptionProcessing, EachFlagStartsAtItsDefaultAndHasItsOwnName) {
+    struct Flag {
+        const char* option;
+        bool SessionFlags::*flag;
+        bool documented_default;
+    };
+    const Flag flags[] = {
+        {"Cache", &SessionFlags::cache, true},
+        {"interchangecheck", &SessionFlags::interchange_check, false},
+        {"QUERYINSTRSTATUS", &SessionFlags::query_instrument_status, false},
+        {"RangeCheck", &SessionFlags::range_check, true},
+        {"recordCoercions", &SessionFlags::record_coercions, false},
+        {"Simulate", &SessionFlags::simulate, false},
+    };
+    for (const Flag& changed : flags) {
+        SCOPED_TRACE(changed.option);
+        DriverSession fresh;
+        for (const Flag& f : flags) EXPECT_EQ(fresh.flags.*f.flag, f.documented_default) << f.option;
+        const std::string text =
+            std::string(changed.option) + (changed.documented_default ? "=0" : "=1");
+        ASSERT_EQ(ProcessOptionString(fresh, err, text), S_OK);
+        for (const Flag& f : flags)
+            EXPECT_EQ(fresh.flags.*f.flag, f.documented_default != (&f == &changed)) << f.option;
+    }
+    const TraceSettings trace = DriverSession{}.trace;
+    EXPECT_FALSE(trace.enabled);
+    EXPECT_EQ(trace.size_max, 1000000);
+    EXPECT_FALSE(trace.arrays);
+    EXPECT_EQ(trace.array_size_max, 10);
+    EXPECT_EQ(trace.save_interval, 1);
+}
+
 TEST_F(OptionProcessing, FlagsModelAndTraceSettings) {
     ASSERT_EQ(ProcessOptionString(
                   s, err,

@@ -311,6 +311,13 @@ TEST_F(TracerTest, SessionsInTheSameSecondShareOneFile) {
 
 TEST_F(TracerTest, StateTransitions) {
     CTraceOwner t;
+    // The documented defaults of a new tracer.
+    EXPECT_EQ(t.GetState(), CTracer::kNotStarted);
+    EXPECT_FALSE(t.GetEnabled());
+    EXPECT_EQ(t.GetSizeLimit(), 1000000);
+    EXPECT_FALSE(t.GetTraceArrays());
+    EXPECT_EQ(t.GetArrayLimit(), 10);
+    EXPECT_EQ(t.GetSaveInterval(), 1);
     t.SetClock(&FakeClock);
     EXPECT_EQ(t.StartSessionTracing(), S_FALSE);  // not enabled
     Start(t, "states");
