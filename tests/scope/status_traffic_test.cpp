@@ -79,28 +79,41 @@ protected:
 constexpr const char* kProtected = "73141D";
 constexpr const char* kUnprotected = "73121D";
 
-TEST_F(StatusTraffic, ServiceRequestMasksCombineTheReasonBits) {
+std::string Masks(LONG sre, LONG ese, LONG opee, LONG ovl) {
+    return "*CLS; *SRE " + std::to_string(sre) + "; *ESE " + std::to_string(ese) + "; :OPEE " +
+           std::to_string(opee) + "; :OVL " + std::to_string(ovl) + "\n";
+}
+
+// Every reason alone against the documented mask bits, then all reasons at
+// once (the largest accepted value) and the first values refused.
+TEST_F(StatusTraffic, EachServiceRequestReasonSetsItsDocumentedMaskBits) {
     Open(kProtected);
-    const std::pair<LONG, const char*> cases[] = {
-        {0, "*CLS; *SRE 0; *ESE 0; :OPEE 0; :OVL 0"},
-        {Quorlen731XXSRQReasonStbMAV | Quorlen731XXSRQReasonEsrOPC,
-         "*CLS; *SRE 48; *ESE 1; :OPEE 0; :OVL 0"},
-        {Quorlen731XXSRQReasonOperRunning | Quorlen731XXSRQReasonOperWaitTrig,
-         "*CLS; *SRE 128; *ESE 0; :OPEE 40; :OVL 0"},
-        {Quorlen731XXSRQReasonOverloadChan1 | Quorlen731XXSRQReasonOverloadChan2,
-         "*CLS; *SRE 128; *ESE 0; :OPEE 2048; :OVL 3"},
-        {Quorlen731XXSRQReasonEsrPowerOn | Quorlen731XXSRQReasonStbTRG |
-             Quorlen731XXSRQReasonStbUSR | Quorlen731XXSRQReasonFaultExternal,
-         "*CLS; *SRE 35; *ESE 128; :OPEE 0; :OVL 0"},
+    struct Reason {
+        LONG value, sre, ese, opee, ovl;
     };
-    for (auto [reason, command] : cases) {
-        io_->Expect(std::string(command) + "\n");
-        EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(reason)), S_OK);
+    const Reason reasons[] = {
+        {1, 16, 0, 0, 0},           {2, 4, 0, 0, 0},           {4, 32, 1, 0, 0},
+        {8, 32, 4, 0, 0},           {16, 32, 8, 0, 0},         {32, 32, 16, 0, 0},
+        {64, 32, 32, 0, 0},         {128, 32, 64, 0, 0},       {256, 32, 128, 0, 0},
+        {1024, 2, 0, 0, 0},         {2048, 1, 0, 0, 0},        {8192, 128, 0, 8, 0},
+        {16384, 128, 0, 32, 0},     {32768, 128, 0, 2048, 1},  {65536, 128, 0, 2048, 2},
+        {131072, 128, 0, 2048, 4},  {262144, 128, 0, 2048, 8}, {524288, 128, 0, 2048, 16},
+        {1048576, 0, 0, 0, 0},      {2097152, 0, 0, 0, 0},     {4194304, 0, 0, 0, 0},
+        {8388608, 0, 0, 0, 0},      {16777216, 0, 0, 0, 0},    {0, 0, 0, 0, 0},
+    };
+    for (const Reason& r : reasons) {
+        io_->Expect(Masks(r.sre, r.ese, r.opee, r.ovl));
+        EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(r.value)), S_OK)
+            << r.value;
     }
-    for (LONG bad : {0x2000000L, -1L}) {
+    io_->Expect(Masks(183, 253, 2088, 31));
+    EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(0x1FFFFFF)), S_OK);
+    for (LONG bad : {LONG(0x2000000), LONG(-1), LONG(INT32_MIN)}) {
         EXPECT_EQ(Status()->ConfigureServiceRequest(Quorlen731XXSRQReasonEnum(bad)),
                   E_IVI_INVALID_VALUE);
-        EXPECT_NE(ErrorText().find("ConfigureServiceRequest, parameter Reason"), std::string::npos);
+        EXPECT_NE(ErrorText().find("(" + std::to_string(bad) +
+                                   ") for method ConfigureServiceRequest, parameter Reason"),
+                  std::string::npos);
     }
 }
 
@@ -120,25 +133,51 @@ TEST_F(StatusTraffic, WithoutChannelProtectionOverloadIsRefusedAndThreeMasksSent
     EXPECT_NE(ErrorText().find("Quorlen731XXStatusRegisterOverloadEvent"), std::string::npos);
 }
 
-TEST_F(StatusTraffic, RegisterReadsUseTheEarlyDialect) {
-    Open(kProtected);
-    io_->Expect("*STB?\n", "+68\n").Expect("OPER?\n", "8\n").Expect(":OPEE?\n", "31\n")
-        .Expect("OVL?\n", "3\n").Expect(":AER?\n", "1\n");
-    const std::tuple<LONG, LONG, LONG> reads[] = {
-        {Quorlen731XXStatusRegisterStatusByte, Quorlen731XXStatusSubRegisterEvent, 68},
-        {Quorlen731XXStatusRegisterOperation, Quorlen731XXStatusSubRegisterCondition, 8},
-        {Quorlen731XXStatusRegisterOperation, Quorlen731XXStatusSubRegisterEnable, 31},
-        {Quorlen731XXStatusRegisterOverloadEvent, Quorlen731XXStatusSubRegisterEnable, 3},
-        {Quorlen731XXStatusRegisterArmEvent, Quorlen731XXStatusSubRegisterEvent, 1},
-        {Quorlen731XXStatusRegisterTriggerEvent, Quorlen731XXStatusSubRegisterEnable, 1},  // no I/O
+// Every register and sub-register in both dialects, each read answered with
+// its own value. nullptr: rejected; "": the constant 1 without I/O.
+TEST_F(StatusTraffic, EveryRegisterReadsWithItsDocumentedQuery) {
+    struct Read {
+        LONG reg;
+        const char* query[3];  // condition, event, enable
     };
-    for (auto [reg, sub, expected] : reads) {
-        LONG v = 0;
-        EXPECT_EQ(Status()->get_Register(Quorlen731XXStatusRegisterEnum(reg),
-                                         Quorlen731XXStatusSubRegisterEnum(sub), &v),
-                  S_OK);
-        EXPECT_EQ(v, expected) << reg << "/" << sub;
+    const Read newer[] = {
+        {Quorlen731XXStatusRegisterStatusByte, {nullptr, "*STB?", "*SRE?"}},
+        {Quorlen731XXStatusRegisterStandardEvent, {nullptr, "*ESR?", "*ESE?"}},
+        {Quorlen731XXStatusRegisterOperation, {"OPER:COND?", ":OPER:EVEN?", ":OPEE?"}},
+        {Quorlen731XXStatusRegisterOverloadEvent, {nullptr, ":OVLR?", "OVL?"}},
+        {Quorlen731XXStatusRegisterTriggerEvent, {nullptr, ":TER?", ""}},
+        {Quorlen731XXStatusRegisterArmEvent, {nullptr, ":AER?", ""}},
+    };
+    Open(kProtected);
+    for (bool early : {false, true}) {
+        driver_->Core().features.early_family = early;
+        for (const Read& r : newer) {
+            for (LONG sub = 0; sub < 3; ++sub) {
+                const char* query = r.query[sub];
+                if (early && r.reg == Quorlen731XXStatusRegisterOperation)
+                    query = sub == 0 ? "OPER?" : sub == 1 ? nullptr : query;
+                SCOPED_TRACE(std::to_string(r.reg) + "/" + std::to_string(sub) +
+                             (early ? " early" : ""));
+                const LONG reply = 100 + 10 * r.reg + sub;
+                if (query && *query) io_->Expect(std::string(query) + "\n", std::to_string(reply) + "\n");
+                LONG v = -7;
+                const HRESULT hr = Status()->get_Register(Quorlen731XXStatusRegisterEnum(r.reg),
+                                                          Quorlen731XXStatusSubRegisterEnum(sub), &v);
+                EXPECT_EQ(hr, query ? S_OK : E_IVI_INVALID_VALUE);
+                if (query) {
+                    EXPECT_EQ(v, *query ? reply : 1);
+                }
+                EXPECT_TRUE(io_->Done());
+            }
+        }
     }
+    // A failed read gives -1.
+    io_->ExpectTimeout("*ESR?\n");
+    LONG v = 5;
+    EXPECT_EQ(Status()->get_Register(Quorlen731XXStatusRegisterStandardEvent,
+                                     Quorlen731XXStatusSubRegisterEvent, &v),
+              E_QUORLEN731XX_IO_TIMEOUT);
+    EXPECT_EQ(v, -1);
 }
 
 TEST_F(StatusTraffic, RejectedRegisterAccessNamesWhatWasRejected) {
@@ -177,15 +216,23 @@ TEST_F(StatusTraffic, RejectedRegisterAccessNamesWhatWasRejected) {
 
 TEST_F(StatusTraffic, RegisterWritesMaskTheValueAndPresetClearsOverload) {
     Open(kProtected);
-    io_->Expect("*SRE 255\n").Expect("*ESE 1\n").Expect(":OPEE 65535\n").Expect(":OVL 4095\n");
-    const std::pair<LONG, LONG> writes[] = {{Quorlen731XXStatusRegisterStatusByte, 0x1FF},
-                                            {Quorlen731XXStatusRegisterStandardEvent, 0x101},
-                                            {Quorlen731XXStatusRegisterOperation, -1},
-                                            {Quorlen731XXStatusRegisterOverloadEvent, 0xFFFF}};
-    for (auto [reg, value] : writes)
+    // Each value has every bit of the mask and the bit above it set; the
+    // second has every bit set but the mask's lowest.
+    const std::tuple<LONG, LONG, const char*> writes[] = {
+        {Quorlen731XXStatusRegisterStatusByte, 0x1FF, "*SRE 255\n"},
+        {Quorlen731XXStatusRegisterStandardEvent, 0x1FF, "*ESE 255\n"},
+        {Quorlen731XXStatusRegisterOperation, 0x1FFFF, ":OPEE 65535\n"},
+        {Quorlen731XXStatusRegisterOverloadEvent, 0x1FFF, ":OVL 4095\n"},
+        {Quorlen731XXStatusRegisterStandardEvent, -2, "*ESE 254\n"},
+        {Quorlen731XXStatusRegisterOverloadEvent, -2, ":OVL 4094\n"},
+    };
+    for (auto [reg, value, sent] : writes) {
+        io_->Expect(sent);
         EXPECT_EQ(Status()->put_Register(Quorlen731XXStatusRegisterEnum(reg),
                                          Quorlen731XXStatusSubRegisterEnable, value),
-                  S_OK);
+                  S_OK)
+            << sent;
+    }
     io_->Expect("*CLS;:OPEE 31;:OVL 0\n");
     EXPECT_EQ(Status()->Preset(), S_OK);
     io_->stb = {0x44};
