@@ -21,58 +21,84 @@ double Plain(std::int16_t v, const WaveformScaling& s) {
 
 bool SameBits(double a, double b) { return std::memcmp(&a, &b, sizeof a) == 0; }
 
-TEST(WaveformConvert, WordsMatchThePlainFormulaBitForBitWithNaNForInvalid) {
-    const WaveformScaling scalings[] = {
-        {0, 0, 0.0, 1e-4, 16384},
-        {0, 0, 0.123456789, 3.3333333333333e-5, -17},
-        {0, 0, -2.5, 0.1 / 3.0, 0},
-        {0, 0, 1e-300, 7.123e-12, 32768},
-    };
+// Scalings with negative, positive and zero origins and references, at full
+// precision.
+constexpr WaveformScaling kScalings[] = {
+    {0, 0, 0.0, 1e-4, 16384},
+    {0, 0, 0.12345678901234567, 3.3333333333333333e-5, -17},
+    {0, 0, -2.5, 0.1 / 3.0, 0},
+    {0, 0, 1e-300, 7.123e-12, 32768},
+};
+
+// Random words with an invalid point at index 3 (when there is one).
+std::vector<std::int16_t> RandomWords(std::size_t n, std::mt19937& gen) {
+    std::uniform_int_distribution<int> dist(-32767, 32767);
+    std::vector<std::int16_t> raw(n);
+    for (auto& v : raw) v = static_cast<std::int16_t>(dist(gen));
+    if (n > 3) raw[3] = kInvalidWord;
+    return raw;
+}
+
+void ExpectPoint(double got, std::int16_t raw, const WaveformScaling& s, std::size_t i) {
+    if (raw == kInvalidWord) {
+        EXPECT_TRUE(std::isnan(got)) << i;
+    } else {
+        EXPECT_TRUE(SameBits(got, Plain(raw, s))) << i << ": " << raw << " gave " << got;
+    }
+}
+
+TEST(WaveformConvert, WordsAndPairsMatchThePlainFormulaBitForBitWithNaNForInvalid) {
     std::mt19937 gen(7);
-    std::uniform_int_distribution<int> dist(-32768, 32767);
-    for (const WaveformScaling& s : scalings) {
-        // Odd lengths exercise the vector loop's remainder.
+    for (const WaveformScaling& s : kScalings) {
+        SCOPED_TRACE(s.y_origin);
+        // Odd lengths exercise the vector loops' remainders.
         for (std::size_t n : {0u, 1u, 7u, 1001u}) {
-            std::vector<std::int16_t> raw(n);
-            for (auto& v : raw) v = static_cast<std::int16_t>(dist(gen));
-            if (n > 3) raw[3] = kInvalidWord;
+            const std::vector<std::int16_t> raw = RandomWords(n, gen);
             std::vector<double> out(n, 99.0);
-            const bool invalid = ConvertWords(raw.data(), n, s, out.data());
-            EXPECT_EQ(invalid, n > 3);
-            for (std::size_t i = 0; i < n; ++i) {
-                if (raw[i] == kInvalidWord) {
-                    ASSERT_TRUE(std::isnan(out[i])) << i;
-                } else {
-                    ASSERT_TRUE(SameBits(out[i], Plain(raw[i], s))) << i << " " << raw[i];
-                }
+            EXPECT_EQ(ConvertWords(raw.data(), n, s, out.data()), n > 3);
+            for (std::size_t i = 0; i < n; ++i) ExpectPoint(out[i], raw[i], s, i);
+
+            const std::size_t pairs = n / 2;
+            std::vector<double> lo(pairs, 99.0), hi(pairs, 99.0);
+            EXPECT_EQ(ConvertWordPairs(raw.data(), pairs, s, lo.data(), hi.data()), pairs > 1);
+            for (std::size_t k = 0; k < pairs; ++k) {
+                ExpectPoint(lo[k], raw[2 * k], s, 2 * k);
+                ExpectPoint(hi[k], raw[2 * k + 1], s, 2 * k + 1);
             }
         }
     }
 }
 
-TEST(WaveformConvert, ReferenceCodeMapsToOriginAndPairsSplit) {
-    const WaveformScaling s{0, 0, 0.0, 1e-4, 16384};
-    const std::int16_t raw[] = {16384, 26384, kInvalidWord, 6384, 1};
-    double out[5];
-    ConvertWords(raw, 5, s, out);
-    EXPECT_EQ(out[0], 0.0);
-    EXPECT_EQ(out[1], 1.0);
-    double lo[2], hi[2];
-    EXPECT_TRUE(ConvertWordPairs(raw, 2, s, lo, hi));
-    EXPECT_EQ(lo[0], 0.0);
-    EXPECT_EQ(hi[0], 1.0);
-    EXPECT_TRUE(std::isnan(lo[1]));
-    EXPECT_TRUE(SameBits(hi[1], Plain(6384, s)));
-    EXPECT_FALSE(ConvertWordPairs(raw, 1, s, lo, hi));
+TEST(WaveformConvert, EachBitAloneAndAllBits) {
+    for (int bit = 0; bit < 8; ++bit) {
+        std::vector<std::uint8_t> raw;
+        for (int other = 0; other < 8; ++other) raw.push_back(std::uint8_t(1u << other));
+        raw.push_back(0x00);
+        raw.push_back(0xFF);
+        raw.push_back(std::uint8_t(~(1u << bit)));
+        std::vector<double> expected(8, 0.0);
+        expected[std::size_t(bit)] = 1.0;
+        expected.insert(expected.end(), {0.0, 1.0, 0.0});
+        std::vector<double> out(raw.size(), 99.0);
+        ExtractBit(raw.data(), raw.size(), bit, out.data());
+        EXPECT_EQ(out, expected) << "bit " << bit;
+    }
 }
 
-TEST(WaveformConvert, BytesGiveTheSelectedBit) {
-    const std::uint8_t raw[] = {0x00, 0x04, 0xFB, 0xFF};
-    double out[4];
-    ExtractBit(raw, 4, 2, out);
-    EXPECT_EQ(std::vector<double>(out, out + 4), (std::vector<double>{0, 1, 0, 1}));
-    ExtractBit(raw, 4, 7, out);
-    EXPECT_EQ(std::vector<double>(out, out + 4), (std::vector<double>{0, 0, 1, 1}));
+// The reference code gives the origin; the pair split keeps min before max.
+TEST(WaveformConvert, ReferenceCodeGivesTheOrigin) {
+    const WaveformScaling s{0, 0, -0.5, 1e-4, 16384};
+    const std::int16_t raw[] = {16384, 26384, 6384, kInvalidWord};
+    double out[4], lo[2], hi[2];
+    EXPECT_TRUE(ConvertWords(raw, 4, s, out));
+    EXPECT_EQ(out[0], -0.5);
+    EXPECT_DOUBLE_EQ(out[1], 0.5);
+    EXPECT_DOUBLE_EQ(out[2], -1.5);
+    EXPECT_TRUE(ConvertWordPairs(raw, 2, s, lo, hi));
+    EXPECT_EQ(lo[0], -0.5);
+    EXPECT_DOUBLE_EQ(hi[0], 0.5);
+    EXPECT_DOUBLE_EQ(lo[1], -1.5);
+    EXPECT_TRUE(std::isnan(hi[1]));
 }
 
 TEST(WaveformPreamble, FieldsAndRefusals) {
