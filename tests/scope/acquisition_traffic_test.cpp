@@ -41,20 +41,24 @@ TEST_F(AcquisitionTraffic, PointCountsAboveTheModelLimitAskForTheMaximum) {
 }
 
 TEST_F(AcquisitionTraffic, StartTimeFollowsTheReferencePoint) {
-    const std::pair<const char*, double> cases[] = {
-        {"LEFT", -0.0001}, {"CENT", -0.0005}, {"RIGHT", -0.0009}, {"RIGH", -0.0009}};
+    const std::tuple<const char*, const char*, double> cases[] = {{"LEFT", "2.5E-4", 1.5e-4},
+                                                                  {"CENT", "-3E-4", -8e-4},
+                                                                  {"RIGHT", "0", -9e-4},
+                                                                  {"RIGH", "1E-3", 1e-4}};
     Open("73141D");
-    for (auto [reference, start] : cases) {
+    for (auto [reference, position, start] : cases) {
         SCOPED_TRACE(reference);
         io_->Expect(":TIM:RANG?\n", "1E-3\n")
-            .Expect(":TIM:POS?\n", "0\n")
+            .Expect(":TIM:POS?\n", std::string(position) + "\n")
             .Expect(":TIM:REF?\n", std::string(reference) + "\n");
         double t = 1;
         EXPECT_EQ(Acq()->get_StartTime(&t), S_OK);
-        EXPECT_DOUBLE_EQ(t, start);
+        EXPECT_NEAR(t, start, 1e-15);
     }
-    io_->Expect(":TIM:RANG?\n", "1E-3\n").Expect(":TIM:REF?\n", "CENT\n").Expect(":TIM:POS 0\n");
-    EXPECT_EQ(IviAcq()->put_StartTime(-0.0005), S_OK);
+    io_->Expect(":TIM:RANG?\n", "1E-3\n")
+        .Expect(":TIM:REF?\n", "CENT\n")
+        .Expect(":TIM:POS 0.000376543210987654\n");
+    EXPECT_EQ(IviAcq()->put_StartTime(-1.2345678901234567e-4), S_OK);
     io_->Expect(":TIM:RANG?\n", "2E-3\n")
         .Expect(":TIM:REF?\n", "LEFT\n")
         .Expect(":TIM:POS 0.0012\n");

@@ -113,11 +113,13 @@ TEST_F(ChannelTraffic, ConfigureStopsAtTheFirstFailure) {
               E_QUORLEN731XX_VERTICAL_GROUND_COUPLING);
     EXPECT_TRUE(io_->Done());
 
-    io_->Expect(":CHAN2:RANG 4\n")
-        .Expect(":CHAN2:OFFS -1\n")
+    // Doubles go out with 15 significant digits.
+    io_->Expect(":CHAN2:RANG 1.23456789012346\n")
+        .Expect(":CHAN2:OFFS -0.987654321098765\n")
         .Expect(":CHAN2:COUP DC\n")
         .Expect(":CHAN2:DISP 0\n");
-    EXPECT_EQ(User(2)->Configure(4.0, -1.0, Quorlen731XXVerticalCouplingDC, -1.0, VARIANT_FALSE),
+    EXPECT_EQ(User(2)->Configure(1.2345678901234567, -0.98765432109876543,
+                                 Quorlen731XXVerticalCouplingDC, -1.0, VARIANT_FALSE),
               S_OK);
     io_->Expect(":CHAN2:IMP ONEM\n").Expect(":CHAN2:BWL OFF\n");
     EXPECT_EQ(Ivi(2)->ConfigureCharacteristics(1e6, 1e9), S_OK);
@@ -136,10 +138,11 @@ TEST_F(ChannelTraffic, SkewAndProtectionNeedTheirFeatures) {
     EXPECT_NE(ErrorText().find("ClearProtection"), std::string::npos);
 
     Open("73141D");
-    io_->Expect(":CHAN2:PROB:SKEW 1e-09\n").Expect(":CHAN2:PROB:SKEW?\n", "1E-09\n");
-    EXPECT_EQ(User(2)->put_ProbeSkew(1e-9), S_OK);
+    io_->Expect(":CHAN2:PROB:SKEW -1.23456789012346e-09\n")
+        .Expect(":CHAN2:PROB:SKEW?\n", "-1.23456789012346E-09\n");
+    EXPECT_EQ(User(2)->put_ProbeSkew(-1.2345678901234567e-9), S_OK);
     EXPECT_EQ(User(2)->get_ProbeSkew(&skew), S_OK);
-    EXPECT_EQ(skew, 1e-9);
+    EXPECT_EQ(skew, -1.23456789012346e-9);
     io_->Expect(":CHAN2:PROT?\n", "NORM\n").Expect(":CHAN2:PROT?\n", "TRIP\n");
     EXPECT_EQ(User(2)->get_Protection(&protection), S_OK);
     EXPECT_EQ(protection, Quorlen731XXChannelProtectionOK);

@@ -79,14 +79,16 @@ TEST_P(ScopeOnEmulator, ChannelPropertiesRoundTrip) {
                                                       ("Channel" + std::to_string(n)).c_str());
         U* u = user.get();
         C* c = ivi.get();
-        const double k = n;  // distinct values per channel
+        // Distinct values per channel, with 17 significant digits so that a
+        // command losing precision is seen.
+        const double k = n;
         std::vector<RoundTrip> trips = {
             Trip(Row("Enabled", u, &U::get_Enabled, &U::put_Enabled, 0, -1)),
             Trip(Row("ProbeAttenuation", c, &C::get_ProbeAttenuation, &C::put_ProbeAttenuation,
-                     0, 10 * k)),
-            Trip(ReadOnly("ProbeSense", u, &U::get_ProbeSense, 10 * k)),
-            Trip(Row("Range", u, &U::get_Range, &U::put_Range, 0, 2 * k)),
-            Trip(Row("Offset", c, &C::get_Offset, &C::put_Offset, 0, -0.25 * k)),
+                     0, 1.2345678901234567 * k)),
+            Trip(ReadOnly("ProbeSense", u, &U::get_ProbeSense, 1.2345678901234567 * k)),
+            Trip(Row("Range", u, &U::get_Range, &U::put_Range, 0, 2.3456789012345678 * k)),
+            Trip(Row("Offset", c, &C::get_Offset, &C::put_Offset, 0, -0.34567890123456789 * k)),
             Trip(Row("Coupling", c, &C::get_Coupling, &C::put_Coupling, 0, 0)),
             Trip(Row("Coupling", u, &U::get_Coupling, &U::put_Coupling, 0, 1)),
             Trip(Row("InputImpedance", u, &U::get_InputImpedance, &U::put_InputImpedance, 0, 1e6)),
@@ -107,7 +109,7 @@ TEST_P(ScopeOnEmulator, ChannelPropertiesRoundTrip) {
                                      &C::put_InputImpedance, 0, 50)));
         if (f.probe_skew)
             trips.push_back(
-                Trip(Row("ProbeSkew", u, &U::get_ProbeSkew, &U::put_ProbeSkew, 0, 5e-9 * k)));
+                Trip(Row("ProbeSkew", u, &U::get_ProbeSkew, &U::put_ProbeSkew, 0, -4.5678901234567891e-9 * k)));
         if (f.channel_protection)
             trips.push_back(Trip(ReadOnly("Protection", u, &U::get_Protection, 0)));
         RunTrips(trips);
@@ -129,9 +131,9 @@ TEST_P(ScopeOnEmulator, AcquisitionPropertiesRoundTrip) {
     A* a = driver_.get();
     C* c = driver_.get();
     RunTrips({
-        Trip(Row("TimePerRecord", a, &A::get_TimePerRecord, &A::put_TimePerRecord, 0, 2e-3)),
+        Trip(Row("TimePerRecord", a, &A::get_TimePerRecord, &A::put_TimePerRecord, 0, 2.3456789012345678e-3)),
         Trip(Row("TimePerRecord", c, &C::get_TimePerRecord, &C::put_TimePerRecord, 0, 4e-3)),
-        Trip(Row("StartTime", a, &A::get_StartTime, &A::put_StartTime, 0, -1e-3)),
+        Trip(Row("StartTime", a, &A::get_StartTime, &A::put_StartTime, 0, -1.2345678901234567e-3)),
         Trip(Row("StartTime", c, &C::get_StartTime, &C::put_StartTime, 0, 2.5e-4)),
         Trip(Row("NumberOfPointsMin", c, &C::get_NumberOfPointsMin, &C::put_NumberOfPointsMin, 0,
                  500)),
