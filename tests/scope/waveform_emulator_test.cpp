@@ -237,6 +237,22 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
         ASSERT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
         EXPECT_EQ(v.size(), 1000u);
     }
+    // A read waits with its own timeout, different from the session's, and
+    // puts the session's back on failure as on success.
+    auto m = Measurement("Channel1");
+    for (LONG max_time : {200, 4000}) {
+        SCOPED_TRACE(max_time);
+        if (max_time == 200) emu_->ServeWaveformData("#42000" + payload);
+        SAFEARRAY* a = nullptr;
+        double x0 = 0, dx = 0;
+        EXPECT_EQ(m->ReadWaveform(Quorlen731XXTimeOutEnum(max_time), &a, &x0, &dx),
+                  max_time == 200 ? E_QUORLEN731XX_IO_TIMEOUT : S_OK);
+        if (a) {
+            EXPECT_EQ(Values(a).size(), 1000u);
+        }
+        ExpectRestored(300);
+        emu_->ClearWaveformData();
+    }
     // A block longer than it declares: the declared part is the record and
     // the rest of the message is discarded.
     emu_->ServeWaveformData(WordBlock({1, 2}) + "extra bytes");
