@@ -11,18 +11,6 @@ using namespace qn::capi;
 
 namespace {
 
-// Calls `member(Elem*)` on the item of the collection `Coll` that `selector` names.
-template <class Coll, class Member>
-ViStatus CallOnItem(ViSession vi, ViConstString selector, Member&& member) {
-    ComPtr<IUnknown> driver;
-    ViStatus status = DriverOf(vi, &driver);
-    if (status != VI_SUCCESS) return status;
-    ComPtr<ElementOf<Coll>> item;
-    status = ItemOf<Coll>(vi, driver.get(), selector, &item);
-    if (status != VI_SUCCESS) return status;
-    return Convert(vi, member(item.get()));
-}
-
 // The name of the item at 1-based `index` of the collection `Coll`.
 template <class Coll>
 ViStatus ItemName(ViSession vi, ViInt32 index, ViInt32 bufferSize, ViChar name[]) {

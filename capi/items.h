@@ -36,4 +36,17 @@ ViStatus ItemOf(ViSession vi, IUnknown* driver, ViConstString selector, ComPtr<O
     return VI_SUCCESS;
 }
 
+// Calls `member(Elem*)` (returning an HRESULT) on the item of `Coll` that
+// `selector` names, in the session's driver object.
+template <class Coll, class Member>
+ViStatus CallOnItem(ViSession vi, ViConstString selector, Member&& member) {
+    ComPtr<IUnknown> driver;
+    ViStatus status = DriverOf(vi, &driver);
+    if (status != VI_SUCCESS) return status;
+    ComPtr<ElementOf<Coll>> item;
+    status = ItemOf<Coll>(vi, driver.get(), selector, &item);
+    if (status != VI_SUCCESS) return status;
+    return Convert(vi, member(item.get()));
+}
+
 }  // namespace qn::capi

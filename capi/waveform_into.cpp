@@ -17,7 +17,26 @@ LONG CopyPoints(const com::SafeArray& record, CallerArray out) {
     return n;
 }
 
+LONG CopyBytes(const com::SafeArray& record, CallerBytes out) {
+    const ULONG count = record ? record.size() : 0;
+    const LONG n = static_cast<LONG>(std::min<ULONG>(count, static_cast<ULONG>(std::max<LONG>(out.size, 0))));
+    if (n > 0) std::memcpy(out.data, record.data<unsigned char>(), static_cast<std::size_t>(n));
+    return n;
+}
+
 }  // namespace
+
+HRESULT DigitalInto(IQuorlen731XXDigitalChannel* d, WaveformCall call, LONG max_time,
+                    CallerBytes out, LONG* actual, double* x0, double* dx) {
+    com::SafeArray record;
+    const HRESULT hr =
+        call == WaveformCall::kRead
+            ? d->ReadDigitalWaveform(static_cast<Quorlen731XXTimeOutEnum>(max_time), record.Out(), x0, dx)
+            : d->FetchDigitalWaveform(record.Out(), x0, dx);
+    if (FAILED(hr)) return hr;
+    *actual = CopyBytes(record, out);
+    return hr;
+}
 
 HRESULT WaveformInto(IIviScopeMeasurement* m, WaveformCall call, LONG max_time, CallerArray out,
                      LONG* actual, double* x0, double* dx) {

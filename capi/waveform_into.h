@@ -3,6 +3,7 @@
 #pragma once
 
 #include "IviScope.h"
+#include "Quorlen731XX.h"
 
 namespace qn::capi {
 
@@ -24,5 +25,15 @@ HRESULT WaveformInto(IIviScopeMeasurement* m, WaveformCall call, LONG max_time, 
 // The same for a min/max record into two arrays of `size` points each.
 HRESULT MinMaxInto(IIviScopeMeasurement* m, WaveformCall call, LONG max_time, CallerArray min,
                    CallerArray max, LONG* actual, double* x0, double* dx);
+
+// A caller's byte array of a digital channel.
+struct CallerBytes {
+    unsigned char* data;
+    LONG size;
+};
+
+// The same for a digital channel's record of bytes.
+HRESULT DigitalInto(IQuorlen731XXDigitalChannel* d, WaveformCall call, LONG max_time,
+                    CallerBytes out, LONG* actual, double* x0, double* dx);
 
 }  // namespace qn::capi

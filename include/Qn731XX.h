@@ -296,6 +296,38 @@ extern "C" {
 #define QN731XX_VAL_ACQ_STATUS_UNKNOWN 2L
 #define QN731XX_VAL_TIME_OUT_IMMEDIATE 0L
 #define QN731XX_VAL_TIME_OUT_INFINITE 1L
+#define QN731XX_VAL_MEASUREMENT_RISE_TIME 0L
+#define QN731XX_VAL_MEASUREMENT_FALL_TIME 1L
+#define QN731XX_VAL_MEASUREMENT_FREQUENCY 2L
+#define QN731XX_VAL_MEASUREMENT_PERIOD 3L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_RMS 4L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_PEAK_TO_PEAK 5L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_MAX 6L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_MIN 7L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_HIGH 8L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_LOW 9L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_AVERAGE 10L
+#define QN731XX_VAL_MEASUREMENT_WIDTH_NEG 11L
+#define QN731XX_VAL_MEASUREMENT_WIDTH_POS 12L
+#define QN731XX_VAL_MEASUREMENT_DUTY_CYCLE_NEG 13L
+#define QN731XX_VAL_MEASUREMENT_DUTY_CYCLE_POS 14L
+#define QN731XX_VAL_MEASUREMENT_AMPLITUDE 15L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_CYCLE_RMS 16L
+#define QN731XX_VAL_MEASUREMENT_VOLTAGE_CYCLE_AVERAGE 17L
+#define QN731XX_VAL_MEASUREMENT_OVER_SHOOT 18L
+#define QN731XX_VAL_MEASUREMENT_PRESHOOT 19L
+#define QN731XX_VAL_MEASUREMENT_FREQUENCY_COUNTER 20L
+#define QN731XX_VAL_MEASUREMENT_TIME_AT_MAX 21L
+#define QN731XX_VAL_MEASUREMENT_TIME_AT_MIN 22L
+#define QN731XX_VAL_MEASUREMENT_DELAY 23L
+#define QN731XX_VAL_MEASUREMENT_PHASE 24L
+#define QN731XX_VAL_MEASUREMENT_VALUE_AT_TIME 25L
+#define QN731XX_VAL_MEASUREMENT_TIME_AT_VALUE 26L
+#define QN731XX_VAL_MEASUREMENT_TIME_OF_EDGE 27L
+#define QN731XX_VAL_MEASUREMENT_SLOPE_POSITIVE 0L
+#define QN731XX_VAL_MEASUREMENT_SLOPE_NEGATIVE 1L
+#define QN731XX_VAL_MEASUREMENT_REFERENCE_MODE_PERCENT 0L
+#define QN731XX_VAL_MEASUREMENT_REFERENCE_MODE_ABSOLUTE 1L
 
 /* ------------------------------------------------------------------------ */
 /* Sessions and errors                                                       */
@@ -440,6 +472,37 @@ QN731XX_API ViStatus Qn731XX_GetMeasurementName(ViSession vi, ViInt32 index,
 /* index counts from 1. */
 QN731XX_API ViStatus Qn731XX_GetDigitalChannelName(ViSession vi, ViInt32 index,
                                                    ViInt32 bufferSize, ViChar name[]);
+
+/* ------------------------------------------------------------------------ */
+/* Measurements                                                              */
+/* ------------------------------------------------------------------------ */
+
+QN731XX_API ViStatus Qn731XX_FetchWaveformMeasurement(ViSession vi, ViConstString channel,
+                                                      ViInt32 measFunction, ViReal64 *measurement);
+QN731XX_API ViStatus Qn731XX_ReadWaveformMeasurement(ViSession vi, ViConstString channel,
+                                                     ViInt32 measFunction,
+                                                     ViInt32 maxTimeMilliseconds,
+                                                     ViReal64 *measurement);
+/* The name of a measurement function on the measurement object named. */
+QN731XX_API ViStatus Qn731XX_MeasurementFunctionName(ViSession vi, ViConstString measurement,
+                                                     ViInt32 measFunction, ViInt32 bufferSize,
+                                                     ViChar name[]);
+QN731XX_API ViStatus Qn731XX_ConfigureRefLevels(ViSession vi, ViReal64 low, ViReal64 mid,
+                                                ViReal64 high);
+QN731XX_API ViStatus Qn731XX_MultiWaveformMeasurementResetActivity(ViSession vi);
+QN731XX_API ViStatus Qn731XX_MultiWaveformMeasurementReadActivity(ViSession vi, ViInt32 *edges,
+                                                                  ViInt32 *levels);
+QN731XX_API ViStatus Qn731XX_MultiWaveformMeasurementConfigureDelay(
+    ViSession vi, ViConstString source2, ViInt32 slope1, ViInt32 slope2, ViInt32 delayOccurence1,
+    ViInt32 delayOccurence2);
+/* Digital records are one byte per point; at most waveformSize bytes are
+ * written and *actualPoints is the number written. */
+QN731XX_API ViStatus Qn731XX_DigitalChannelFetchDigitalWaveform(
+    ViSession vi, ViConstString digitalChannel, ViInt32 waveformSize, ViByte waveformArray[],
+    ViInt32 *actualPoints, ViReal64 *initialX, ViReal64 *xIncrement);
+QN731XX_API ViStatus Qn731XX_DigitalChannelReadDigitalWaveform(
+    ViSession vi, ViConstString digitalChannel, ViInt32 waveformSize, ViInt32 maxTimeMilliseconds,
+    ViByte waveformArray[], ViInt32 *actualPoints, ViReal64 *initialX, ViReal64 *xIncrement);
 
 /* ------------------------------------------------------------------------ */
 /* Status registers                                                          */

@@ -1,6 +1,6 @@
 /* A C program driving an oscilloscope through the C API: it opens a session,
- * configures a channel and the record, captures and reads a waveform, and
- * shows the error text of a setting the driver refuses.
+ * configures a channel and the record, captures and reads a waveform,
+ * measures its frequency, and shows the error text of a setting the driver refuses.
  *
  *   qn731xx_c_example RESOURCE [OPTIONS]
  *   qn731xx_c_example TCPIP0::127.0.0.1::5025::SOCKET
@@ -30,7 +30,7 @@ int main(int argc, char **argv) {
     ViSession vi = 0;
     ViStatus status;
     ViInt32 actual = 0;
-    ViReal64 initial_x = 0.0, x_increment = 0.0, low, high;
+    ViReal64 initial_x = 0.0, x_increment = 0.0, low, high, frequency = 0.0;
     ViChar model[256] = "";
     ViInt32 i;
 
@@ -59,6 +59,11 @@ int main(int argc, char **argv) {
     }
     printf("waveform: %ld points from %g s every %g s, %g V to %g V\n", (long)actual, initial_x,
            x_increment, low, high);
+
+    status = Qn731XX_FetchWaveformMeasurement(vi, "Channel1", QN731XX_VAL_MEASUREMENT_FREQUENCY,
+                                              &frequency);
+    if (status < 0) return report(vi, "Qn731XX_FetchWaveformMeasurement", status);
+    printf("frequency: %g Hz\n", frequency);
 
     /* A coupling the driver does not know: refused before anything is sent. */
     status = Qn731XX_SetAttributeViInt32(vi, "Channel1", IVISCOPE_ATTR_VERTICAL_COUPLING, 42);

@@ -74,3 +74,38 @@ TEST_F(CTraffic, ARefusedValueSendsNothingAndLeavesTheSessionUsable) {
 
 }  // namespace
 }  // namespace qn::test
+
+namespace qn::test {
+namespace {
+
+TEST_F(CTraffic, AMeasurementSelectsItsSourceAndCopiesOnlyAResult) {
+    OpenC("73142D");
+    io_->Expect(":STAT? CHAN2\n", "1\n").Expect(":MEAS:SOUR CHAN2\n");
+    io_->Expect(":MEAS:FREQ?\n", "+1.00000000000000E+03\n");
+    ViReal64 v = 0;
+    EXPECT_EQ(Qn731XX_FetchWaveformMeasurement(vi_, "Channel2", QN731XX_VAL_MEASUREMENT_FREQUENCY, &v),
+              VI_SUCCESS);
+    EXPECT_EQ(v, 1000.0);
+    // No result: the failure and its text, the caller's variable untouched.
+    io_->Expect(":STAT? CHAN2\n", "1\n").Expect(":MEAS:SOUR CHAN2\n");
+    io_->Expect(":MEAS:PER?\n", "9.9E+37\n");
+    v = -3.0;
+    EXPECT_EQ(Qn731XX_FetchWaveformMeasurement(vi_, "Channel2", QN731XX_VAL_MEASUREMENT_PERIOD, &v),
+              IVISCOPE_ERROR_UNABLE_TO_PERFORM_MEASUREMENT);
+    EXPECT_EQ(v, -3.0);
+    EXPECT_FALSE(RecordedError(vi_).empty());
+    // Refused before anything is sent.
+    EXPECT_EQ(Qn731XX_FetchWaveformMeasurement(vi_, "Channel2", QN731XX_VAL_MEASUREMENT_PERIOD,
+                                               nullptr),
+              QN731XX_ERROR_FAILURE);
+    char name[64];
+    EXPECT_EQ(Qn731XX_MeasurementFunctionName(vi_, "UserChannel1",
+                                              QN731XX_VAL_MEASUREMENT_DUTY_CYCLE_NEG, sizeof name,
+                                              name),
+              VI_SUCCESS);
+    EXPECT_STREQ(name, "Neg Duty Cycle");
+    EXPECT_TRUE(io_->Done());
+}
+
+}  // namespace
+}  // namespace qn::test
