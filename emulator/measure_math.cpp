@@ -190,8 +190,12 @@ std::optional<double> Measurer::TimeAtValue(double level, int n) const {
 
 std::optional<double> Measurer::ValueAtTime(double t) const {
     if (trace_.v.size() < 2) return std::nullopt;
-    const double pos = (t - trace_.x0) / trace_.dx;
-    if (!(pos >= 0) || pos > static_cast<double>(trace_.v.size() - 1)) return std::nullopt;
+    // The time of the last point, computed by the caller as x0 + i * dx, may
+    // round a hair beyond it.
+    const double last = static_cast<double>(trace_.v.size() - 1);
+    double pos = (t - trace_.x0) / trace_.dx;
+    if (pos > last && pos < last + 1e-9) pos = last;
+    if (!(pos >= 0) || pos > last) return std::nullopt;
     const std::size_t i = std::min(static_cast<std::size_t>(pos), trace_.v.size() - 2);
     const double f = pos - static_cast<double>(i);
     return trace_.v[i] + f * (trace_.v[i + 1] - trace_.v[i]);
