@@ -39,23 +39,6 @@ TEST(Bstr, NullSourceGivesZeroedCharactersAndHugeLengthFails) {
     EXPECT_EQ(SysAllocStringLen(u"x", 0x80000000u), nullptr);
 }
 
-TEST(Bstr, HolderCopiesMovesAndDetaches) {
-    Bstr a("Grüße");
-    Bstr copy = a;
-    EXPECT_NE(copy.get(), a.get());
-    EXPECT_EQ(copy.utf8(), "Grüße");
-    Bstr moved = std::move(copy);
-    EXPECT_EQ(copy.get(), nullptr);
-    EXPECT_EQ(moved.utf8(), "Grüße");
-    BSTR raw = moved.Detach();
-    EXPECT_EQ(moved.get(), nullptr);
-    SysFreeString(raw);
-    Bstr null_text(static_cast<const char*>(nullptr));
-    ASSERT_NE(null_text.get(), nullptr);
-    EXPECT_TRUE(null_text.empty());
-    EXPECT_EQ(Bstr().utf8(), "");
-}
-
 struct Utf8Case {
     const char* name;
     std::string in;
