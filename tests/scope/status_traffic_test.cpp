@@ -178,6 +178,9 @@ TEST_F(StatusTraffic, EveryRegisterReadsWithItsDocumentedQuery) {
                                      Quorlen731XXStatusSubRegisterEvent, &v),
               E_QUORLEN731XX_IO_TIMEOUT);
     EXPECT_EQ(v, -1);
+    // The message carries the transport's reason.
+    EXPECT_EQ(ErrorText(),
+              "Quorlen731XX: IO timeout error: Timeout expired before operation completed..");
 }
 
 TEST_F(StatusTraffic, RejectedRegisterAccessNamesWhatWasRejected) {
