@@ -6,6 +6,7 @@ packages=(
   libgtest-dev libgmock-dev libbenchmark-dev
   libpugixml-dev libtirpc-dev rpcsvc-proto
   python3 python3-pyvisa python3-pyvisa-py lxi-tools
+  python3-numpy python3-pytest python3-matplotlib python3-venv python3-pip python3-setuptools
 )
 missing=()
 for p in "${packages[@]}"; do

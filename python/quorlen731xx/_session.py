@@ -70,6 +70,11 @@ class Session:
     def check(self, status: int, vi: Optional[int] = None) -> int:
         """Raises the driver's error for a negative status; warns for a positive one."""
         if status < 0:
+            if self._vi is None:
+                # Closed by another thread while this call ran: whatever the
+                # driver answered, the reason is the close.
+                raise SessionClosedError(status, "Quorlen731XX: the scope was closed during "
+                                         "the call.")
             raise error_for(status, self.error_text(self.vi if vi is None else vi, status))
         if status > 0:
             msg = ctypes.create_string_buffer(256)

@@ -7,6 +7,7 @@ and documented from its row. Functions are thin calls of the C API.
 from __future__ import annotations
 
 import contextlib
+import math
 import ctypes
 from collections.abc import Mapping
 from typing import Any, Dict, Iterator, List, Optional, Tuple, Union
@@ -141,7 +142,7 @@ class _WaveformSource(_Group):
                       out: Optional[np.ndarray] = None) -> Waveform:
         """Starts an acquisition, waits for it at most `max_time` seconds and
         fetches the record (as fetch_waveform). DriverTimeoutError when it does
-        not complete in time."""
+        not complete in time; `math.inf` waits without limit."""
         return self._analog("ReadWaveform", max_time, out)
 
     def _min_max(self, fn: str, max_time: Optional[float], out_min, out_max) -> MinMaxWaveform:
@@ -199,6 +200,9 @@ class _WaveformSource(_Group):
 
 
 def _milliseconds(seconds: float) -> int:
+    """Seconds to the C API's milliseconds; math.inf waits without limit (-1)."""
+    if seconds == math.inf:
+        return -1
     return as_int32(round(as_real64(seconds, "max_time") * 1000.0), "max_time in milliseconds")
 
 
