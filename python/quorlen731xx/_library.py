@@ -94,6 +94,15 @@ class Library:
             fn.argtypes = argtypes
             fn.restype = ViStatus
             setattr(self, name[len("Qn731XX_"):], fn)
+        # The typed attribute getters once more without argument conversion, for
+        # property reads (every argument is already an int, bytes or a pointer).
+        self.fast = {}
+        for ctype in ("ViInt32", "ViReal64", "ViBoolean"):
+            name = f"Qn731XX_GetAttribute{ctype}"
+            if name not in self.missing:
+                fn = self.dll[name]  # a new function object, its own argtypes
+                fn.restype = ViStatus
+                self.fast[ctype] = fn
 
 
 def load(path: Optional[str] = None) -> Library:

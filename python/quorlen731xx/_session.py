@@ -149,6 +149,38 @@ class AttributeSpec:
          self.writable, _enum_name, self.group, self.name) = row
         self.enum = enum_class
 
+    def getter(self):
+        """A property getter for objects with `_session` and `_selectors`: the hot
+        path of a property read, with as little Python as possible."""
+        if self.ctype == "ViString":
+            return lambda obj: self.get(obj._session, obj._selectors[self.scope])
+        ident, scope, enum_class = self.id, self.scope, self.enum
+        out_type = {"ViInt32": ctypes.c_int32, "ViReal64": ctypes.c_double,
+                    "ViBoolean": ctypes.c_uint16}[self.ctype]
+        boolean = self.ctype == "ViBoolean"
+        byref = ctypes.byref
+        slow = self.get
+        # value -> member; a value the table does not name stays an int
+        members = {int(m): m for m in enum_class} if enum_class is not None else None
+
+        def fget(obj):
+            session = obj._session
+            vi = session._vi
+            fn = session.lib.fast.get(self.ctype)
+            if vi is None or fn is None:
+                return slow(session, obj._selectors[scope])
+            out = out_type()
+            status = fn(vi, obj._selectors[scope], ident, byref(out))
+            if status:
+                session.check(status, vi)
+            if boolean:
+                return bool(out.value)
+            if members is not None:
+                return members.get(out.value, out.value)
+            return out.value
+
+        return fget
+
     def get(self, session: Session, selector: bytes) -> Any:
         vi = session.vi
         lib = session.lib

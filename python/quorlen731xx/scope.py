@@ -40,9 +40,7 @@ def _doc(spec: AttributeSpec) -> str:
 
 def _property(spec: AttributeSpec) -> property:
     scope = spec.scope
-
-    def fget(self):
-        return spec.get(self._session, self._selectors[scope])
+    fget = spec.getter()
 
     def fset(self, value):
         spec.set(self._session, self._selectors[scope], value)
