@@ -192,7 +192,7 @@ void SetDefinition(Instrument& inst, Call& call) {
     const auto mid = high ? NumberArg(inst, call.arg(3)) : std::nullopt;
     const auto low = mid ? NumberArg(inst, call.arg(4)) : std::nullopt;
     if (!low) return;
-    if (!(*high > *mid && *mid > *low)) return inst.Error(err::kIllegalParameter);
+    if (!(*high > *mid && *mid > *low)) return inst.Error(err::kDataOutOfRange);
     m.mode = *mode;
     m.high = *high;
     m.mid = *mid;

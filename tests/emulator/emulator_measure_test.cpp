@@ -1,0 +1,111 @@
+// The measurement and digital-channel commands over the socket: what each
+// model accepts and refuses, the definitions read back as written, pods and
+// their channels switching together, and the activity flags.
+#include <gtest/gtest.h>
+
+#include "emulator/emulator.h"
+#include "tests/emulator/scpi_client.h"
+
+namespace qn::emu {
+namespace {
+
+using test::ScpiClient;
+
+constexpr const char* kNoError = R"(+0,"No error")";
+
+struct Session {
+    explicit Session(const char* model) : emu(model), client(emu.Start()) {
+        client.Query("*CLS;*OPC?");
+    }
+    Emulator emu;
+    ScpiClient client;
+};
+
+TEST(EmulatorMeasure, CommandsEachModelAcceptsOrRefuses) {
+    struct Case {
+        const char* model;
+        const char* message;
+        const char* error;  // null: accepted
+    } cases[] = {
+        {"QMS4034A", ":MEAS:DEF THR,PERC,90,50,10", nullptr},
+        {"QMS4034A", ":MEAS:DEF THR,PERC,10,50,90", R"(-222,"Data out of range")"},
+        {"QMS4034A", ":MEAS:DEF THR,PERC,90,50,50", R"(-222,"Data out of range")"},
+        {"QMS4034A", ":MEAS:DEF THR,VOLT,90,50,10", R"(-224,"Illegal parameter value")"},
+        {"QMS4034A", ":MEAS:DEF THR,ABS,2,0", R"(-109,"Missing parameter")"},
+        {"QMS4034A", ":MEAS:DEF DEL,1,-2", nullptr},
+        {"QMS4034A", ":MEAS:DEF DEL,1,X", R"(-104,"Data type error")"},
+        {"QMS4034A", ":MEAS:DEF DEL,1001,1", R"(-222,"Data out of range")"},
+        {"QMS4034A", ":MEAS:SOUR DIG15,CHAN4", nullptr},
+        {"QMS4034A", ":MEAS:SOUR DIG16", R"(-224,"Illegal parameter value")"},
+        {"QMS4034A", ":MEAS:SOUR DIG", R"(-224,"Illegal parameter value")"},
+        {"QDS4034A", ":MEAS:SOUR DIG0", R"(-224,"Illegal parameter value")"},
+        {"QMS4034A", ":DIG0:DISP 1;:DIG15:LAB \"CLK\";:DIG7:THR -1.5", nullptr},
+        {"QMS4034A", ":DIG16:DISP 1", R"(-114,"Header suffix out of range")"},
+        {"QMS4034A", ":DIG3:THR 9", R"(-222,"Data out of range")"},
+        {"QDS4034A", ":DIG0:DISP 1", R"(-113,"Undefined header")"},
+        {"QDS4034A", ":ACT?", R"(-113,"Undefined header")"},
+        {"73122D", ":ACT", nullptr},
+        {"QMS4034A", ":MEAS:FREQ? CHAN5", R"(-224,"Illegal parameter value")"},
+        {"QMS4034A", ":MEAS:TEDG? ONE, CHAN1", R"(-104,"Data type error")"},
+        {"QMS4034A", ":EMUL:INP4 SQU,1E3,2,0", nullptr},
+        {"QDS4032A", ":EMUL:INP3 SIN,1E3,2,0", R"(-114,"Header suffix out of range")"},
+        {"QMS4034A", ":EMUL:INP1 TRI,1E3,2,0", R"(-224,"Illegal parameter value")"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.model) + " " + c.message);
+        Session s(c.model);
+        s.client.Send(c.message);
+        EXPECT_EQ(s.client.Query("SYST:ERR?"), c.error ? c.error : kNoError);
+    }
+}
+
+TEST(EmulatorMeasure, DefinitionsAndSourcesReadBack) {
+    Session s("QMS4034A");
+    auto& c = s.client;
+    EXPECT_EQ(c.Query(":MEAS:DEF? THR"), "THR,PERC,90,50,10");
+    EXPECT_EQ(c.Query(":MEAS:DEF? DEL"), "1,1");
+    EXPECT_EQ(c.Query(":MEAS:SOUR?"), "CHAN1,CHAN2");
+    c.Send(":MEAS:DEF THR,ABSOLUTE,1.25,0.5,-0.125;:MEAS:DEF DEL,-3,2;:MEAS:SOUR CHAN3,CHAN4");
+    c.Send(":MEAS:SOUR DIG9");  // one source keeps the second
+    EXPECT_EQ(c.Query(":MEAS:DEF? THR"), "THR,ABS,1.25,0.5,-0.125");
+    EXPECT_EQ(c.Query(":MEAS:DEF? DEL"), "-3,2");
+    EXPECT_EQ(c.Query(":MEAS:SOUR?"), "DIG9,CHAN4");
+    // *RST returns the subsystem to its defaults.
+    c.Send("*RST");
+    EXPECT_EQ(c.Query(":MEAS:SOUR?"), "CHAN1,CHAN2");
+    EXPECT_EQ(c.Query("SYST:ERR?"), kNoError);
+}
+
+TEST(EmulatorMeasure, PodsAndTheirChannelsSwitchTogether) {
+    Session s("QMS4034A");
+    auto& c = s.client;
+    EXPECT_EQ(c.Query(":STAT? DIG8"), "0");
+    c.Send(":POD2:DISP 1");
+    EXPECT_EQ(c.Query(":DIG8:DISP?;:DIG15:DISP?;:DIG7:DISP?"), "1;1;0");
+    c.Send(":DIG8:DISP 0");
+    EXPECT_EQ(c.Query(":POD2:DISP?"), "1");  // seven channels still on
+    for (int d = 9; d <= 15; ++d) c.Send(":DIG" + std::to_string(d) + ":DISP 0");
+    EXPECT_EQ(c.Query(":POD2:DISP?;:STAT? POD2"), "0;0");
+    c.Send(":DIG3:DISP 1");
+    EXPECT_EQ(c.Query(":POD1:DISP?;:STAT? DIG3;:STAT? DIG4"), "1;1;0");
+    // A hidden channel has no result; a shown one measures its own bit.
+    EXPECT_EQ(c.Query(":MEAS:FREQ? DIG4"), "9.9E+37");
+    EXPECT_NE(c.Query(":MEAS:FREQ? DIG3"), "9.9E+37");
+    EXPECT_EQ(c.Query("SYST:ERR?"), kNoError);
+}
+
+TEST(EmulatorMeasure, ActivityFlagsClearUntilTheNextAcquisition) {
+    Session s("QMS4034A");
+    auto& c = s.client;
+    // Every channel of both pods changes in the pattern; the levels are the
+    // last point's bits.
+    const std::string first = c.Query(":ACT?");
+    EXPECT_EQ(first.substr(0, first.find(',')), "65535");
+    c.Send(":ACT");
+    EXPECT_EQ(c.Query(":ACT?").substr(0, 2), "0,");
+    c.Query(":DIG;*OPC?");
+    EXPECT_EQ(c.Query(":ACT?").substr(0, 6), "65535,");
+}
+
+}  // namespace
+}  // namespace qn::emu
