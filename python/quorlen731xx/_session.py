@@ -14,6 +14,7 @@ from .errors import DriverWarning, InvalidValueError, NotSupportedError, Session
 from .errors import error_for
 
 INT32_MIN, INT32_MAX = -(1 << 31), (1 << 31) - 1
+TEXT_LIMIT = 1 << 24  # no text result is this long; warning statuses are larger
 _INVALID_VALUE = STATUSES["IVI_ERROR_INVALID_VALUE"]
 _INVALID_SESSION = STATUSES["QN731XX_ERROR_INVALID_SESSION"]
 _FUNCTION_NOT_SUPPORTED = STATUSES["IVI_ERROR_FUNCTION_NOT_SUPPORTED"]
@@ -89,7 +90,9 @@ class Session:
         while True:
             buf = ctypes.create_string_buffer(size)
             status = fn(self.vi, *args, size, buf)
-            if status <= size:
+            # A positive return is the size needed, unless it is a warning status
+            # (those are far larger than any text).
+            if status <= size or status >= TEXT_LIMIT:
                 self.check(status)
                 return buf.value.decode("utf-8", "replace")
             size = status

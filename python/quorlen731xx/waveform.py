@@ -29,8 +29,9 @@ class Waveform:
         """The time of each point: initial_x + i * x_increment."""
         return self.initial_x + np.arange(len(self.y), dtype=np.float64) * self.x_increment
 
-    def __array__(self, dtype=None):
-        return self.y if dtype is None else self.y.astype(dtype, copy=False)
+    def __array__(self, dtype=None, copy=None):
+        y = self.y if dtype is None else self.y.astype(dtype, copy=False)
+        return y.copy() if copy else y
 
     def __len__(self) -> int:
         return len(self.y)

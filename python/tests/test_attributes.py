@@ -118,3 +118,11 @@ def test_enumerated_value_outside_the_table_reads_as_int(sim):
     assert ch.coupling == 7 and type(ch.coupling) is int
     ch.coupling = qn.VerticalCoupling.GND
     assert ch.coupling is qn.VerticalCoupling.GND
+
+
+@pytest.mark.parametrize("length", [255, 256, 257, 1000])
+def test_text_longer_than_the_first_buffer(sim, length):
+    # The first read uses 256 bytes (255 characters and the terminator).
+    text = "".join(chr(ord("a") + i % 26) for i in range(length))
+    sim.channels["Channel1"].label = text
+    assert sim.channels["UserChannel1"].label == text
