@@ -510,9 +510,11 @@ def _spec(attribute: Union[str, int]) -> AttributeSpec:
 
 
 # The groups of settings become properties of Scope; root-level attributes too.
+# A name Scope already has (a method) keeps its meaning; the attribute stays
+# reachable through get_attribute/set_attribute.
 for _path, _cls in _GROUPS.items():
-    if _path and "." not in _path:
+    if _path and "." not in _path and not hasattr(Scope, _path):
         setattr(Scope, _path, _child(_cls))
 for _s in SPECS:
-    if _s.group == "" and _s.scope == "session":
+    if _s.group == "" and _s.scope == "session" and not hasattr(Scope, _s.name):
         setattr(Scope, _s.name, _property(_s))
