@@ -6,6 +6,8 @@ in one run (built programs only; never run by the tests):
   holding a pre-built record (bench_python_server), against the C API call it
   wraps (Qn731XX_FetchWaveform through ctypes into the same buffer), and
   against pyvisa-py's query_binary_values plus NumPy scaling of the same record;
+- the same record read by a bare socket client into a reused buffer and
+  converted with NumPy (the limit of the path);
 - a simulated property read, against the bare C API getter.
 
     QN731XX_LIBRARY=build/libquorlen731xx.so python3 bench/bench_python.py \
@@ -96,6 +98,37 @@ def pyvisa_round(port, reps):
     return out
 
 
+def bare_round(port, points, buf, reps):
+    """The limit of the path: one query, the block read into a reused buffer,
+    converted with NumPy into the same output array."""
+    import socket
+    sock = socket.create_connection(("127.0.0.1", port))
+    sock.setsockopt(socket.IPPROTO_TCP, socket.TCP_NODELAY, 1)
+    raw = bytearray(2 * points + 64)
+    view = memoryview(raw)
+    out = []
+
+    def fetch():
+        sock.sendall(b":WAV:DATA?\n")
+        got = 0
+        need = None
+        while need is None or got < need:
+            got += sock.recv_into(view[got:])
+            if need is None and got >= 2:
+                digits = raw[1] - 48
+                if got >= 2 + digits:
+                    need = 2 + digits + int(raw[2:2 + digits]) + 1  # block and "\n"
+        start = 2 + (raw[1] - 48)
+        words = np.frombuffer(raw, dtype=">i2", count=points, offset=start)
+        np.multiply(words, 1.25e-4, out=buf)
+
+    fetch()
+    for _ in range(reps):
+        out.append(timed(fetch))
+    sock.close()
+    return out
+
+
 def property_read(n=20000):
     with qn.Scope("", options="Simulate=true") as scope:
         acq = scope.acquisition
@@ -127,20 +160,22 @@ def main():
     for points in (1_000_000, 8_000_000):
         server = Server(args.server, points)
         buf = np.empty(points)
-        py, c, visa = [], [], []
+        py, c, visa, bare = [], [], [], []
         try:
             for _ in range(args.rounds):
                 p, b = driver_round(server.port, points, buf, args.reps)
                 py += p
                 c += b
                 visa += pyvisa_round(server.port, max(1, args.reps // 2))
+                bare += bare_round(server.port, points, buf, args.reps)
         finally:
             server.close()
-        mp, mc, mv = (statistics.median(x) for x in (py, c, visa))
+        mp, mc, mv, mb = (statistics.median(x) for x in (py, c, visa, bare))
         print(f"{points:>9} points: fetch_waveform(out=) {mp * 1e3:8.2f} ms | C API {mc * 1e3:8.2f} ms"
               f" | pyvisa-py query_binary_values+scaling {mv * 1e3:8.2f} ms"
+              f" | bare socket+numpy {mb * 1e3:8.2f} ms"
               f" || python/C {mp / mc:5.2f} (goal <= 1.2) | pyvisa/python {mv / mp:6.1f}"
-              f" (goal >= 20)")
+              f" (goal >= 20) | python/bare {mp / mb:5.2f}")
     py, c = property_read()
     print(f"simulated property read: python {py * 1e6:.2f} us | C API {c * 1e6:.2f} us"
           f" || python/C {py / c:.2f} (goal: python under 5 us)")
