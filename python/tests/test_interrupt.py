@@ -11,8 +11,9 @@ import quorlen731xx as qn
 with qn.Scope(sys.argv[1], id_query=True) as scope:
     source = scope.measurements["Channel1"]
     reference = source.read_waveform(max_time=5).y.copy()
-    print("ready", flush=True)
     try:
+        source.fetch_waveform()
+        print("ready", flush=True)  # inside the try: the signal may come at once
         while True:
             source.fetch_waveform()
     except KeyboardInterrupt:
