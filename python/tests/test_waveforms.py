@@ -78,6 +78,7 @@ def test_digital_pod_bytes(sim):
 
 def test_min_max_waveform_needs_its_acquisition_type(live):
     source = live.measurements["Channel1"]
+    live.acquisition.type = qn.AcquisitionType.NORMAL
     with pytest.raises(qn.DriverError) as info:
         source.fetch_min_max_waveform()
     assert info.value.status_name == "IVISCOPE_ERROR_INVALID_ACQ_TYPE"
