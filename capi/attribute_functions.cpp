@@ -35,20 +35,20 @@ ViStatus CheckAttribute(ViSession vi, ViAttr id, CType type, Access access, Attr
     return VI_SUCCESS;
 }
 
-// The object that carries the attribute's property: the driver object, or
-// the channel item the selector names.
-ViStatus TargetOf(ViSession vi, IUnknown* driver, const AttributeRow& row, ViConstString selector,
-                  ComPtr<IUnknown>* out) {
-    if (row.scope == Scope::kSession) {
-        *out = ComPtr<IUnknown>(driver);
-        return VI_SUCCESS;
-    }
-    switch (row.scope) {
-        case Scope::kChannel: return ItemOf<IIviScopeChannels>(vi, driver, selector, out);
-        case Scope::kUserChannel: return ItemOf<IQuorlen731XXChannels>(vi, driver, selector, out);
+// The interface pointer that carries the attribute's property: the driver's
+// own interface, or the channel item the selector names; *hold keeps an item
+// the session does not cache.
+ViStatus TargetOf(ViSession vi, SessionData& session, const Attribute& attr, ViConstString selector,
+                  ComPtr<IUnknown>* hold, IUnknown** itf) {
+    switch (attr.row->scope) {
+        case Scope::kSession:
+            return Convert(vi, session.Interface(*attr.property->iid, attr.interface_slot, itf));
+        case Scope::kChannel:
+            return CachedItemOf<IIviScopeChannels>(vi, session, selector, hold, itf);
+        case Scope::kUserChannel:
+            return CachedItemOf<IQuorlen731XXChannels>(vi, session, selector, hold, itf);
         case Scope::kDigitalChannel:
-            return ItemOf<IQuorlen731XXDigitalChannels>(vi, driver, selector, out);
-        case Scope::kSession: break;
+            return CachedItemOf<IQuorlen731XXDigitalChannels>(vi, session, selector, hold, itf);
     }
     return kFailure;
 }
@@ -66,13 +66,15 @@ bool ReadableWithoutSession(ViAttr id) {
     }
 }
 
-ViStatus DriverFor(ViSession vi, ViAttr id, Access access, ComPtr<IUnknown>* driver) {
+ViStatus SessionFor(ViSession vi, ViAttr id, Access access, SessionRef* session) {
     if (vi == 0 && access == Access::kGet && ReadableWithoutSession(id)) {
-        if (FAILED(CreateQuorlen731XX(nullptr, iid_of<IUnknown>, driver->OutVoid())))
+        ComPtr<IUnknown> driver;
+        if (FAILED(CreateQuorlen731XX(nullptr, iid_of<IUnknown>, driver.OutVoid())))
             return Fail(0, kFailure, "The driver object could not be created.");
+        session->reset(new SessionData(driver.get(), false));
         return VI_SUCCESS;
     }
-    return DriverOf(vi, driver);
+    return SessionOf(vi, session);
 }
 
 // `result` is the caller's result variable, checked before anything is sent.
@@ -82,13 +84,14 @@ ViStatus GetAttribute(ViSession vi, ViConstString selector, ViAttr id, CType typ
     ViStatus status = CheckAttribute(vi, id, type, Access::kGet, &attr);
     if (status != VI_SUCCESS) return status;
     if (!result) return NullResult(vi, "value");
-    ComPtr<IUnknown> driver;
-    status = DriverFor(vi, id, Access::kGet, &driver);
+    SessionRef session;
+    status = SessionFor(vi, id, Access::kGet, &session);
     if (status != VI_SUCCESS) return status;
-    ComPtr<IUnknown> target;
-    status = TargetOf(vi, driver.get(), *attr.row, selector, &target);
+    ComPtr<IUnknown> hold;
+    IUnknown* itf = nullptr;
+    status = TargetOf(vi, *session.get(), attr, selector, &hold, &itf);
     if (status != VI_SUCCESS) return status;
-    return Convert(vi, attr.property->get(target.get(), value));
+    return Convert(vi, attr.property->get(itf, value));
 }
 
 ViStatus SetAttribute(ViSession vi, ViConstString selector, ViAttr id, CType type,
@@ -96,13 +99,14 @@ ViStatus SetAttribute(ViSession vi, ViConstString selector, ViAttr id, CType typ
     Attribute attr;
     ViStatus status = CheckAttribute(vi, id, type, Access::kSet, &attr);
     if (status != VI_SUCCESS) return status;
-    ComPtr<IUnknown> driver;
-    status = DriverFor(vi, id, Access::kSet, &driver);
+    SessionRef session;
+    status = SessionFor(vi, id, Access::kSet, &session);
     if (status != VI_SUCCESS) return status;
-    ComPtr<IUnknown> target;
-    status = TargetOf(vi, driver.get(), *attr.row, selector, &target);
+    ComPtr<IUnknown> hold;
+    IUnknown* itf = nullptr;
+    status = TargetOf(vi, *session.get(), attr, selector, &hold, &itf);
     if (status != VI_SUCCESS) return status;
-    return Convert(vi, attr.property->put(target.get(), value));
+    return Convert(vi, attr.property->put(itf, value));
 }
 
 // A getter of a number-like type: the value is copied after success.

@@ -3,7 +3,8 @@
 #include "capi/attribute_table.h"
 
 #include <array>
-#include <unordered_map>
+#include <algorithm>
+#include <vector>
 
 #include "Qn731XX.h"
 
@@ -140,14 +141,44 @@ constexpr auto kRows = std::to_array<AttributeRow>({
 
 std::span<const AttributeRow> AttributeRows() { return kRows; }
 
-Attribute FindAttribute(ViAttr id) {
-    static const std::unordered_map<ViAttr, Attribute> by_id = [] {
-        std::unordered_map<ViAttr, Attribute> m;
-        for (const AttributeRow& row : kRows) m.emplace(row.id, Attribute{&row, FindProperty(row.key)});
-        return m;
+namespace {
+
+struct Lookup {
+    std::vector<Attribute> by_id;  // sorted by ID
+    std::size_t interfaces = 0;
+};
+
+const Lookup& Table() {
+    static const Lookup lookup = [] {
+        Lookup l;
+        std::vector<const IID*> seen;
+        for (const AttributeRow& row : kRows) {
+            Attribute a{&row, FindProperty(row.key), 0};
+            if (a.property) {
+                auto it = std::find_if(seen.begin(), seen.end(),
+                                       [&](const IID* iid) { return *iid == *a.property->iid; });
+                a.interface_slot = static_cast<std::size_t>(it - seen.begin());
+                if (it == seen.end()) seen.push_back(a.property->iid);
+            }
+            l.by_id.push_back(a);
+        }
+        std::sort(l.by_id.begin(), l.by_id.end(),
+                  [](const Attribute& x, const Attribute& y) { return x.row->id < y.row->id; });
+        l.interfaces = seen.size();
+        return l;
     }();
-    auto it = by_id.find(id);
-    return it == by_id.end() ? Attribute{} : it->second;
+    return lookup;
 }
+
+}  // namespace
+
+Attribute FindAttribute(ViAttr id) {
+    const std::vector<Attribute>& v = Table().by_id;
+    auto it = std::lower_bound(v.begin(), v.end(), id,
+                               [](const Attribute& a, ViAttr key) { return a.row->id < key; });
+    return it != v.end() && it->row->id == id ? *it : Attribute{};
+}
+
+std::size_t AttributeInterfaceCount() { return Table().interfaces; }
 
 }  // namespace qn::capi

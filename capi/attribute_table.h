@@ -27,7 +27,11 @@ std::span<const AttributeRow> AttributeRows();
 struct Attribute {
     const AttributeRow* row = nullptr;
     const PropertyAccess* property = nullptr;  // null while the driver lacks the property
+    std::size_t interface_slot = 0;  // the property's interface, numbered among all attributes'
 };
+
+// How many interfaces carry the attributes (interface_slot is below this).
+std::size_t AttributeInterfaceCount();
 
 // The attribute of an ID; row null for an ID the API does not know.
 Attribute FindAttribute(ViAttr id);

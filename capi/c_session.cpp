@@ -34,6 +34,9 @@ ViStatus NullResult(ViSession vi, std::string_view parameter) {
 }
 
 ViStatus Convert(ViSession vi, HRESULT hr) {
+    // Plain success carries nothing to record: every member clears the
+    // thread's error information when it is entered.
+    if (hr == S_OK) return VI_SUCCESS;
     const ViStatus status = ToCStatus(hr);
     com::ErrorRecord record;
     if (com::TakeThreadError(&record)) {
@@ -52,27 +55,41 @@ ViStatus Convert(ViSession vi, HRESULT hr) {
     return status;
 }
 
-ViStatus DriverOf(ViSession vi, ComPtr<IUnknown>* out) {
+ViStatus SessionOf(ViSession vi, SessionRef* out) {
     std::lock_guard<std::mutex> g(PointerMutex());
     void* data = nullptr;
     ViStatus status = IviSession_GetDataPtr(vi, &data);
     if (status != VI_SUCCESS) return status;
     if (!data) return IVISESSION_ERROR_INVALID_SESSION;  // being closed
-    *out = ComPtr<IUnknown>(static_cast<IUnknown*>(data));
+    auto* session = static_cast<SessionData*>(data);
+    session->AddRef();
+    out->reset(session);
     return VI_SUCCESS;
 }
 
-ViStatus Attach(IUnknown* driver, ViSession* vi) {
+ViStatus DriverOf(ViSession vi, ComPtr<IUnknown>* out) {
+    SessionRef session;
+    ViStatus status = SessionOf(vi, &session);
+    if (status != VI_SUCCESS) return status;
+    *out = ComPtr<IUnknown>(session->Driver());
+    return VI_SUCCESS;
+}
+
+ViStatus Attach(IUnknown* driver, bool private_object, ViSession* vi) {
     *vi = 0;
+    auto* data = new SessionData(driver, private_object);
     ViSession created = 0;
     ViStatus status = IviSession_New(&created);
-    if (status != VI_SUCCESS) return status;
+    if (status != VI_SUCCESS) {
+        data->Release();
+        return status;
+    }
     {
         std::lock_guard<std::mutex> g(PointerMutex());
-        status = IviSession_SetDataPtr(created, driver);
-        if (status == VI_SUCCESS) driver->AddRef();
+        status = IviSession_SetDataPtr(created, data);
     }
     if (status != VI_SUCCESS) {
+        data->Release();
         IviSession_Dispose(created);
         return status;
     }
@@ -81,13 +98,18 @@ ViStatus Attach(IUnknown* driver, ViSession* vi) {
 }
 
 ViStatus Detach(ViSession vi, ComPtr<IUnknown>* driver) {
-    std::lock_guard<std::mutex> g(PointerMutex());
-    void* data = nullptr;
-    ViStatus status = IviSession_GetDataPtr(vi, &data);
-    if (status != VI_SUCCESS) return status;
-    if (!data) return IVISESSION_ERROR_INVALID_SESSION;
-    IviSession_SetDataPtr(vi, nullptr);
-    driver->Attach(static_cast<IUnknown*>(data));
+    SessionData* data = nullptr;
+    {
+        std::lock_guard<std::mutex> g(PointerMutex());
+        void* p = nullptr;
+        ViStatus status = IviSession_GetDataPtr(vi, &p);
+        if (status != VI_SUCCESS) return status;
+        if (!p) return IVISESSION_ERROR_INVALID_SESSION;
+        IviSession_SetDataPtr(vi, nullptr);
+        data = static_cast<SessionData*>(p);
+    }
+    *driver = ComPtr<IUnknown>(data->Driver());
+    data->Release();
     return VI_SUCCESS;
 }
 

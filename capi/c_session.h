@@ -6,6 +6,7 @@
 #include <new>
 #include <string_view>
 
+#include "capi/session_data.h"
 #include "capi/status_table.h"
 #include "platform/com/bstr.h"
 #include "platform/com/unknown.h"
@@ -26,9 +27,11 @@ ViStatus Fail(ViSession vi, ViStatus status, std::string_view text);
 // the parameter.
 ViStatus NullResult(ViSession vi, std::string_view parameter);
 
-// The driver object of a session, with a reference held for the call. A
-// session that is invalid, closed or being closed gives the session library's
-// status, unchanged.
+// The data of a session, with a reference held for the call. A session that
+// is invalid, closed or being closed gives the session library's status,
+// unchanged.
+ViStatus SessionOf(ViSession vi, SessionRef* out);
+// The driver object of a session, with a reference held for the call.
 ViStatus DriverOf(ViSession vi, ComPtr<IUnknown>* out);
 
 // The interface `Itf` of the session's driver object.
@@ -40,8 +43,9 @@ ViStatus InterfaceOf(ViSession vi, ComPtr<Itf>* out) {
     return Convert(vi, driver.As(*out));
 }
 
-// Creates a session bound to `driver` (one reference added); *vi is 0 on failure.
-ViStatus Attach(IUnknown* driver, ViSession* vi);
+// Creates a session bound to `driver` (one reference added); *vi is 0 on
+// failure. `private_object`: no client holds the object (see SessionData).
+ViStatus Attach(IUnknown* driver, bool private_object, ViSession* vi);
 // Takes the driver object out of a session; the reference the session held
 // goes to *driver. Other threads see the session as invalid from then on; the
 // handle itself stays until IviSession_Dispose, so errors can still be

@@ -21,7 +21,7 @@ using ElementOf = std::remove_pointer_t<decltype(ItemType(&Coll::get_Item))>;
 template <class Coll, class Out>
 ViStatus ItemOf(ViSession vi, IUnknown* driver, ViConstString selector, ComPtr<Out>* out) {
     using Elem = ElementOf<Coll>;
-    std::string name;
+    std::string_view name;
     ViStatus status = FirstSelectorName(vi, selector, &name);
     if (status != VI_SUCCESS) return status;
     ComPtr<Coll> collection;
@@ -47,6 +47,27 @@ ViStatus CallOnItem(ViSession vi, ViConstString selector, Member&& member) {
     status = ItemOf<Coll>(vi, driver.get(), selector, &item);
     if (status != VI_SUCCESS) return status;
     return Convert(vi, member(item.get()));
+}
+
+// The item of `Coll` that `selector` names, as the element interface (held by
+// the session's cache when the session may cache items, else by *hold).
+template <class Coll>
+ViStatus CachedItemOf(ViSession vi, SessionData& session, ViConstString selector,
+                      ComPtr<IUnknown>* hold, IUnknown** item) {
+    std::string_view name;
+    ViStatus status = FirstSelectorName(vi, selector, &name);
+    if (status != VI_SUCCESS) return status;
+    if (IUnknown* cached = session.FindItem(iid_of<Coll>, name)) {
+        *item = cached;
+        return VI_SUCCESS;
+    }
+    ComPtr<ElementOf<Coll>> found;
+    status = ItemOf<Coll>(vi, session.Driver(), selector, &found);
+    if (status != VI_SUCCESS) return status;
+    session.StoreItem(iid_of<Coll>, name, found.get());
+    *hold = ComPtr<IUnknown>(found.get());
+    *item = hold->get();
+    return VI_SUCCESS;
 }
 
 }  // namespace qn::capi

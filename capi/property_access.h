@@ -29,11 +29,13 @@ struct AttrValue {
     com::Bstr str;
 };
 
-using PropertyGet = HRESULT (*)(IUnknown* target, AttrValue* out);
-using PropertyPut = HRESULT (*)(IUnknown* target, const AttrValue& in);
+// Both are called with the property's interface pointer (as IUnknown*).
+using PropertyGet = HRESULT (*)(IUnknown* itf, AttrValue* out);
+using PropertyPut = HRESULT (*)(IUnknown* itf, const AttrValue& in);
 
 struct PropertyAccess {
     std::string_view key;  // "Interface.Property"
+    const IID* iid;        // the interface that carries the property
     CType type;
     PropertyGet get;  // null for a write-only property
     PropertyPut put;  // null for a read-only property
@@ -85,23 +87,17 @@ T Load(const AttrValue& in, CType type) {
 }  // namespace detail
 
 template <class Itf, class T, HRESULT (Itf::*Get)(T*), VARTYPE Vt = VT_EMPTY>
-HRESULT GetThunk(IUnknown* target, AttrValue* out) {
-    ComPtr<Itf> itf;
-    HRESULT hr = target->QueryInterface(iid_of<Itf>, itf.OutVoid());
-    if (FAILED(hr)) return hr;
+HRESULT GetThunk(IUnknown* itf, AttrValue* out) {
     T v{};
-    hr = (itf.get()->*Get)(&v);
+    const HRESULT hr = (static_cast<Itf*>(itf)->*Get)(&v);
     if (SUCCEEDED(hr)) detail::Store<T>(v, CTypeOf<T>(Vt), out);
     else if constexpr (std::is_same_v<T, BSTR>) SysFreeString(v);
     return hr;
 }
 
 template <class Itf, class T, HRESULT (Itf::*Put)(T), VARTYPE Vt = VT_EMPTY>
-HRESULT PutThunk(IUnknown* target, const AttrValue& in) {
-    ComPtr<Itf> itf;
-    HRESULT hr = target->QueryInterface(iid_of<Itf>, itf.OutVoid());
-    if (FAILED(hr)) return hr;
-    return (itf.get()->*Put)(detail::Load<T>(in, CTypeOf<T>(Vt)));
+HRESULT PutThunk(IUnknown* itf, const AttrValue& in) {
+    return (static_cast<Itf*>(itf)->*Put)(detail::Load<T>(in, CTypeOf<T>(Vt)));
 }
 
 }  // namespace qn::capi

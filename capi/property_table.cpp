@@ -23,7 +23,8 @@ namespace {
 #define QN_CAPI_PUT_WO(Itf, Name, T, Vt) &PutThunk<Itf, T, &Itf::put_##Name, Vt>
 
 #define QN_PROPERTY(Itf, Name, T, Vt, Access, ...)                                        \
-    PropertyAccess{#Itf "." #Name, CTypeOf<T>(Vt), QN_CAPI_GET_##Access(Itf, Name, T, Vt), \
+    PropertyAccess{#Itf "." #Name, &iid_of<Itf>, CTypeOf<T>(Vt),                           \
+                   QN_CAPI_GET_##Access(Itf, Name, T, Vt),                                 \
                    QN_CAPI_PUT_##Access(Itf, Name, T, Vt)},
 #define QN_NAVIGATION(...)
 #define QN_METHOD(...)
@@ -34,11 +35,13 @@ template <class Itf, class T>
 T ValueOf(HRESULT (Itf::*)(T*));
 
 #define QN_CAPI_INHERENT_RO(Itf, Name)                                                       \
-    PropertyAccess{#Itf "." #Name, CTypeOf<decltype(ValueOf(&Itf::get_##Name))>(),            \
+    PropertyAccess{#Itf "." #Name, &iid_of<Itf>,                                             \
+                   CTypeOf<decltype(ValueOf(&Itf::get_##Name))>(),                           \
                    &GetThunk<Itf, decltype(ValueOf(&Itf::get_##Name)), &Itf::get_##Name>, \
                    nullptr},
 #define QN_CAPI_INHERENT_RW(Itf, Name)                                                       \
-    PropertyAccess{#Itf "." #Name, CTypeOf<decltype(ValueOf(&Itf::get_##Name))>(),            \
+    PropertyAccess{#Itf "." #Name, &iid_of<Itf>,                                             \
+                   CTypeOf<decltype(ValueOf(&Itf::get_##Name))>(),                           \
                    &GetThunk<Itf, decltype(ValueOf(&Itf::get_##Name)), &Itf::get_##Name>, \
                    &PutThunk<Itf, decltype(ValueOf(&Itf::get_##Name)), &Itf::put_##Name>},
 

@@ -16,7 +16,7 @@ std::string_view Trim(std::string_view s) {
 
 }  // namespace
 
-ViStatus FirstSelectorName(ViSession vi, ViConstString selector, std::string* name) {
+ViStatus FirstSelectorName(ViSession vi, ViConstString selector, std::string_view* name) {
     std::string_view rest = selector ? selector : "";
     std::string_view first;
     bool is_first = true;
@@ -31,7 +31,7 @@ ViStatus FirstSelectorName(ViSession vi, ViConstString selector, std::string* na
         rest.remove_prefix(comma + 1);
     }
     if (bad) return Fail(vi, kBadlyFormedSelector, "The repeated capability selector is badly-formed.");
-    *name = std::string(first);
+    *name = first;
     return VI_SUCCESS;
 }
 

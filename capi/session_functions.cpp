@@ -41,7 +41,7 @@ ViStatus Qn731XX_InitWithOptions(ViRsrc resourceName, ViBoolean idQuery, ViBoole
                                               reset ? VARIANT_TRUE : VARIANT_FALSE, options.get());
         ViSession session = 0;
         if (SUCCEEDED(hr)) {
-            status = Attach(object.get(), &session);
+            status = Attach(object.get(), true, &session);
             if (status != VI_SUCCESS) {
                 driver->Close();
                 return status;
@@ -74,7 +74,7 @@ ViStatus Qn731XX_AttachToExistingCOMSession(void* existingIUnknown, ViSession* v
         if (!vi) return NullResult(0, "vi");
         *vi = 0;
         if (!existingIUnknown) return NullResult(0, "existingIUnknown");
-        return Attach(static_cast<IUnknown*>(existingIUnknown), vi);
+        return Attach(static_cast<IUnknown*>(existingIUnknown), false, vi);
     });
 }
 
@@ -82,10 +82,13 @@ ViStatus Qn731XX_GetNativeIUnknownPtr(ViSession vi, void** nativeIUnknown) {
     return Guard(vi, [&]() -> ViStatus {
         if (!nativeIUnknown) return NullResult(vi, "nativeIUnknown");
         *nativeIUnknown = nullptr;
-        ComPtr<IUnknown> object;
-        ViStatus status = DriverOf(vi, &object);
+        SessionRef session;
+        ViStatus status = SessionOf(vi, &session);
         if (status != VI_SUCCESS) return status;
-        *nativeIUnknown = object.Detach();
+        session->Expose();
+        IUnknown* driver = session->Driver();
+        driver->AddRef();
+        *nativeIUnknown = driver;
         return VI_SUCCESS;
     });
 }

@@ -9,6 +9,7 @@
 #include <string>
 
 #include "capi/attribute_table.h"
+#include "capi/session_data.h"
 #include "capi_fixture.h"
 
 namespace qn::test {
@@ -276,6 +277,16 @@ TEST(AttributeWithoutSession, TheDriversIdentityAnswersOnSessionZero) {
     // Anything else needs a session.
     EXPECT_EQ(Qn731XX_GetAttributeViString(0, "", IVI_ATTR_INSTRUMENT_MODEL, sizeof text, text),
               QN731XX_ERROR_INVALID_SESSION);
+}
+
+}  // namespace
+}  // namespace qn::test
+
+namespace qn::test {
+namespace {
+
+TEST(AttributeTable, EveryInterfaceOfTheAttributesHasASessionCacheSlot) {
+    EXPECT_LE(capi::AttributeInterfaceCount(), capi::SessionData::kInterfaceSlots);
 }
 
 }  // namespace

@@ -1,0 +1,87 @@
+// What a C session handle's data pointer holds: one counted reference to the
+// driver object, and the interfaces and channel items the C functions have
+// asked it for, kept so that a call does not ask again.
+#pragma once
+
+#include <atomic>
+#include <mutex>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/com/unknown.h"
+
+namespace qn::capi {
+
+class SessionData {
+public:
+    // `items_cacheable`: the driver object is reachable only through this
+    // session, so its channel items stay those of the one Initialize that
+    // created them. An object a client holds (attached, or handed out) may be
+    // re-initialized through COM and is never cached for items.
+    SessionData(IUnknown* driver, bool items_cacheable) : driver_(driver), items_cacheable_(items_cacheable) {}
+
+    SessionData(const SessionData&) = delete;
+    SessionData& operator=(const SessionData&) = delete;
+
+    void AddRef() { refs_.fetch_add(1, std::memory_order_relaxed); }
+    void Release() {
+        if (refs_.fetch_sub(1, std::memory_order_acq_rel) == 1) delete this;
+    }
+
+    IUnknown* Driver() const { return driver_.get(); }
+
+    // The driver's interface `iid` (borrowed: valid while the session data
+    // lives), asked for once. `slot` (below kInterfaceSlots) names the
+    // interface within the session, so a cached one is found without a lock.
+    HRESULT Interface(const IID& iid, std::size_t slot, IUnknown** out);
+    static constexpr std::size_t kInterfaceSlots = 64;
+
+    // A channel item cached under (collection, name), or null.
+    IUnknown* FindItem(const IID& collection, std::string_view name);
+    void StoreItem(const IID& collection, std::string_view name, IUnknown* item);
+    // A client got hold of the driver object: stop caching items.
+    void Expose();
+
+private:
+    ~SessionData() {
+        for (std::atomic<IUnknown*>& itf : interfaces_)
+            if (IUnknown* p = itf.load()) p->Release();
+    }
+
+    struct CachedItem {
+        const IID* collection;
+        std::string name;
+        ComPtr<IUnknown> item;
+    };
+
+    std::atomic<long> refs_{1};
+    ComPtr<IUnknown> driver_;
+    std::mutex m_;
+    std::atomic<IUnknown*> interfaces_[kInterfaceSlots] = {};  // each holds a reference
+    std::vector<CachedItem> items_;
+    bool items_cacheable_;
+};
+
+// A counted reference to a session's data for the length of a call.
+class SessionRef {
+public:
+    SessionRef() = default;
+    explicit SessionRef(SessionData* d) : d_(d) {}
+    SessionRef(const SessionRef&) = delete;
+    SessionRef& operator=(const SessionRef&) = delete;
+    ~SessionRef() {
+        if (d_) d_->Release();
+    }
+    SessionData* operator->() const { return d_; }
+    SessionData* get() const { return d_; }
+    void reset(SessionData* d) {
+        if (d_) d_->Release();
+        d_ = d;
+    }
+
+private:
+    SessionData* d_ = nullptr;
+};
+
+}  // namespace qn::capi
