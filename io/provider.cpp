@@ -84,15 +84,14 @@ HRESULT CDriverIOProvider::ReadReply(std::string* out, LONG max_chars, bool stri
 }
 
 HRESULT CDriverIOProvider::StatusCheck() {
-    static constexpr std::string_view kEsr = "*ESR?\n";
-    LONG written = 0;
-    HRESULT hr = RawWrite(reinterpret_cast<const BYTE*>(kEsr.data()), LONG(kEsr.size()), &written);
-    if (FAILED(hr)) {
-        RawClear();
-        return hr;
-    }
     std::string reply;
-    hr = ReadReply(&reply, kStatusReplyChars, false);
+    HRESULT hr = AsOneOperation([&] {
+        static constexpr std::string_view kEsr = "*ESR?\n";
+        LONG written = 0;
+        HRESULT h =
+            RawWrite(reinterpret_cast<const BYTE*>(kEsr.data()), LONG(kEsr.size()), &written);
+        return SUCCEEDED(h) ? ReadReply(&reply, kStatusReplyChars, false) : h;
+    });
     if (FAILED(hr)) {
         RawClear();
         return hr;

@@ -111,11 +111,24 @@ protected:
     virtual HRESULT RawSetBool(int which, bool v) = 0;
     virtual HRESULT RawGetTermChar(BYTE* c) = 0;
     virtual HRESULT RawSetTermChar(BYTE c) = 0;
+    // Opens one operation of the session: the raw reads and writes until
+    // RawEndOperation share one deadline, the session timeout from now.
+    // False when the session cannot (nothing to end then).
+    virtual bool RawBeginOperation() { return false; }
+    virtual void RawEndOperation() {}
 
     bool initialized_ = false;
     bool timed_out_ = false;
 
 private:
+    // Runs op as one operation of the session (one deadline for all of it).
+    template <class Op>
+    HRESULT AsOneOperation(Op&& op) {
+        const bool open = RawBeginOperation();
+        HRESULT hr = op();
+        if (open) RawEndOperation();
+        return hr;
+    }
     HRESULT StatusCheck();  // sub-steps 2 to 5 of the check: S_OK or a failure
     HRESULT WriteWithTerminator(std::string_view cmd);
     HRESULT ReadRaw(std::string* out, LONG max_chars, bool strip);

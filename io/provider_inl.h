@@ -23,7 +23,9 @@ HRESULT CDriverIOProvider::Run(const CErrorManagerBase& err, LONG timeout, bool 
     // Whatever error information the operation leaves is its own: the error
     // handler quotes it.
     SetErrorInfo(0, nullptr);
-    HRESULT hr = op();
+    // The operation ends by one deadline; the error handler's device clear
+    // and the status check after it each have their own.
+    HRESULT hr = AsOneOperation(op);
     if (FAILED(hr))
         hr = ReportIOError(err, hr);
     else if (poll)

@@ -159,4 +159,11 @@ HRESULT CVisaComIOProvider::RawSetTermChar(BYTE c) {
     return message_ ? Translate(message_->put_TerminationCharacter(c)) : E_FAIL;
 }
 
+bool CVisaComIOProvider::RawBeginOperation() {
+    return direct_ && direct_->BeginOperation() == S_OK;
+}
+void CVisaComIOProvider::RawEndOperation() {
+    if (direct_) direct_->EndOperation();
+}
+
 }  // namespace qn

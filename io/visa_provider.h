@@ -38,6 +38,8 @@ protected:
     HRESULT RawSetBool(int which, bool v) override;
     HRESULT RawGetTermChar(BYTE* c) override;
     HRESULT RawSetTermChar(BYTE c) override;
+    bool RawBeginOperation() override;
+    void RawEndOperation() override;
 
 private:
     ComPtr<IVisaSession> session_;

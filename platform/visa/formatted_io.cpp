@@ -7,6 +7,7 @@
 
 #include "platform/visa/errors.h"
 #include "platform/visa/formatted_convert.h"
+#include "platform/visa/operation_scope.h"
 
 namespace qn::visa {
 namespace {
@@ -293,6 +294,7 @@ HRESULT FormattedIO::ReadIEEEBlock(LONG type, VARIANT_BOOL seekToBlock, VARIANT_
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const std::size_t elem = fmt::PlainElementSize(vt);
         struct ArrayTarget final : BlockTarget {
             VARTYPE vt;
@@ -332,6 +334,7 @@ HRESULT FormattedIO::ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const std::size_t elem = fmt::PlainElementSize(vt);
         struct BufferTarget final : BlockTarget {
             BYTE* buf;
@@ -364,6 +367,7 @@ HRESULT FormattedIO::ReadString(BSTR* pString) {
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         std::string text;
         HRESULT hr = Settle(ReadRest(OpDeadline(), &text));
         if (FAILED(hr)) return hr;
@@ -377,6 +381,7 @@ HRESULT FormattedIO::ReadNumber(LONG type, VARIANT_BOOL flushToEND, VARIANT* pDa
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const Deadline deadline = OpDeadline();
         qn::com::Variant value;
         HRESULT hr = ReadField(type, deadline, &value);
@@ -396,6 +401,7 @@ HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         std::string text;
         HRESULT hr = Settle(ReadRest(OpDeadline(), &text));
         if (FAILED(hr)) return hr;
@@ -433,6 +439,7 @@ HRESULT FormattedIO::FlushRead() {
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         return DrainMessage(OpDeadline());
     });
 }

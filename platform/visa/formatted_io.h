@@ -8,9 +8,9 @@
 // Writes collect in a write buffer that leaves when full or on flush.
 //
 // A message ends at END or, when the session has it enabled, at the
-// termination character. A formatted operation checks the session timeout
-// as a deadline between the reads it makes, so it ends at the latest one
-// session timeout after that deadline passed.
+// termination character. Each formatted operation is one operation of the
+// session (IMessageDirect::BeginOperation): all its reads and writes end by
+// one deadline, the session timeout counted from its start.
 #pragma once
 
 #include <mutex>

@@ -7,6 +7,7 @@
 #include "platform/visa/errors.h"
 #include "platform/visa/formatted_convert.h"
 #include "platform/visa/formatted_io.h"
+#include "platform/visa/operation_scope.h"
 
 namespace qn::visa {
 namespace {
@@ -39,6 +40,7 @@ HRESULT FormattedIO::WriteString(BSTR data, VARIANT_BOOL flushAndEND) {
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         HRESULT hr = Append(qn::com::BstrToUtf8(data));
         return SUCCEEDED(hr) && flushAndEND != VARIANT_FALSE ? SendBuffer() : hr;
     });
@@ -50,6 +52,7 @@ HRESULT FormattedIO::WriteNumber(VARIANT data, LONG type, VARIANT_BOOL flushAndE
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const VARIANT* value = &data;
         if (data.vt == (VT_BYREF | VT_VARIANT) && data.pvarVal) value = data.pvarVal;
         std::string text, error;
@@ -68,6 +71,7 @@ HRESULT FormattedIO::WriteList(VARIANT* data, LONG type, BSTR listSeparator,
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const std::string sep = listSeparator ? qn::com::BstrToUtf8(listSeparator) : ",";
         std::string text, item, error;
         HRESULT hr = S_OK;
@@ -137,6 +141,7 @@ HRESULT FormattedIO::WriteIEEEBlock(BSTR command, VARIANT data, VARIANT_BOOL flu
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         const std::size_t bytes = std::size_t(qn::com::SafeArrayCount(sa)) * elem;
         const std::string length = std::to_string(bytes);
         if (length.size() > 9)
@@ -155,6 +160,7 @@ HRESULT FormattedIO::FlushWrite(VARIANT_BOOL /*sendEND*/) {
     return Guard(kFormattedIid, [&] {
         std::lock_guard<std::mutex> lock(m_);
         if (HRESULT b = Bound(); FAILED(b)) return b;
+        OperationScope op(direct_.get());
         return SendBuffer();
     });
 }

@@ -26,6 +26,31 @@ HRESULT MessageSession::Closed() const {
     return Report(E_VISA_INVALID_OBJECT, kIidMessage, "the session is closed");
 }
 
+Deadline MessageSession::CallDeadline() {
+    std::lock_guard<std::mutex> lock(op_m_);
+    if (op_depth_ > 0 && op_thread_ == std::this_thread::get_id()) return op_deadline_;
+    return Deadline::FromTimeout(timeout_);
+}
+
+HRESULT MessageSession::BeginOperation() {
+    std::lock_guard<std::mutex> lock(op_m_);
+    if (op_depth_ == 0) {
+        op_thread_ = std::this_thread::get_id();
+        op_deadline_ = Deadline::FromTimeout(timeout_);
+    } else if (op_thread_ != std::this_thread::get_id()) {
+        return S_FALSE;
+    }
+    ++op_depth_;
+    return S_OK;
+}
+
+HRESULT MessageSession::EndOperation() {
+    std::lock_guard<std::mutex> lock(op_m_);
+    if (op_depth_ == 0 || op_thread_ != std::this_thread::get_id()) return E_UNEXPECTED;
+    --op_depth_;
+    return S_OK;
+}
+
 HRESULT MessageSession::get_HardwareInterfaceType(SHORT* pVal) {
     if (!pVal) return E_POINTER;
     *pVal = SHORT(name_.interface_type);
@@ -78,7 +103,7 @@ HRESULT MessageSession::Clear() {
         std::lock_guard<std::mutex> lock(io_);
         if (!transport_) return Closed();
         std::string error;
-        HRESULT hr = transport_->Clear(Deadline::FromTimeout(timeout_), &error);
+        HRESULT hr = transport_->Clear(CallDeadline(), &error);
         return FAILED(hr) ? Report(hr, kIidMessage, "device clear: " + error) : hr;
     });
 }
@@ -90,7 +115,7 @@ HRESULT MessageSession::ReadSTB(SHORT* pStatusByte) {
         if (!transport_) return Closed();
         std::string error;
         BYTE stb = 0;
-        HRESULT hr = transport_->ReadStatusByte(Deadline::FromTimeout(timeout_), &stb, &error);
+        HRESULT hr = transport_->ReadStatusByte(CallDeadline(), &stb, &error);
         if (FAILED(hr)) return Report(hr, kIidMessage, "read status byte: " + error);
         *pStatusByte = stb;
         return S_OK;
@@ -121,7 +146,7 @@ HRESULT MessageSession::Read(LONG count, SAFEARRAY** pBuffer) {
         std::lock_guard<std::mutex> lock(io_);
         ReadResult r;
         HRESULT hr = ReadLocked(array.data<BYTE>(), std::size_t(count), kReadDefault,
-                                Deadline::FromTimeout(timeout_), &r);
+                                CallDeadline(), &r);
         if (FAILED(hr)) return hr;
         // Shrink the bound to what arrived; the allocation stays with the array.
         array.get()->rgsabound[0].cElements = ULONG(r.bytes);
@@ -136,7 +161,7 @@ HRESULT MessageSession::ReadString(LONG count, BSTR* pBuffer) {
     if (count < 0) return Report(E_INVALIDARG, kIidMessage, "negative read count");
     return Guard(kIidMessage, [&] {
         std::lock_guard<std::mutex> lock(io_);
-        const Deadline deadline = Deadline::FromTimeout(timeout_);
+        const Deadline deadline = CallDeadline();
         std::string text;
         for (std::size_t left = std::size_t(count); left > 0;) {
             std::size_t chunk = std::min(left, kStringChunk);
@@ -161,7 +186,7 @@ HRESULT MessageSession::WriteBytes(const BYTE* data, std::size_t size, LONG* pRe
     std::string error;
     std::size_t written = 0;
     HRESULT hr =
-        transport_->Write(data, size, send_end_, Deadline::FromTimeout(timeout_), &written, &error);
+        transport_->Write(data, size, send_end_, CallDeadline(), &written, &error);
     if (pRetCount) *pRetCount = LONG(written);
     return FAILED(hr) ? Report(hr, kIidMessage, error) : hr;
 }
@@ -231,7 +256,7 @@ HRESULT MessageSession::ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActu
         std::lock_guard<std::mutex> lock(io_);
         ReadResult r;
         HRESULT hr =
-            ReadLocked(buf, std::size_t(count), flags, Deadline::FromTimeout(timeout_), &r);
+            ReadLocked(buf, std::size_t(count), flags, CallDeadline(), &r);
         *pActual = LONG(r.bytes);
         if (pEnd) *pEnd = r.end;
         return hr;

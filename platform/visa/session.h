@@ -6,6 +6,7 @@
 #include <atomic>
 #include <memory>
 #include <mutex>
+#include <thread>
 
 #include "platform/visa/resource_name.h"
 #include "platform/visa/transport.h"
@@ -45,6 +46,8 @@ class MessageSession final
     // IMessageDirect
     HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) override;
     HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) override;
+    HRESULT BeginOperation() override;
+    HRESULT EndOperation() override;
 
   private:
     // One transport read with the session's settings and deadline; the
@@ -53,6 +56,9 @@ class MessageSession final
                        ReadResult* result);
     HRESULT WriteBytes(const BYTE* data, std::size_t size, LONG* pRetCount);
     HRESULT Closed() const;
+    // The deadline of an I/O call starting now: the open operation's when
+    // the calling thread has one, else the session timeout from now.
+    Deadline CallDeadline();
 
     const ResourceName name_;
     std::mutex io_;
@@ -61,6 +67,11 @@ class MessageSession final
     std::atomic<bool> send_end_{true};
     std::atomic<bool> term_enabled_{false};
     std::atomic<BYTE> term_char_{'\n'};
+
+    std::mutex op_m_;  // guards the open operation below
+    std::thread::id op_thread_;
+    int op_depth_ = 0;
+    Deadline op_deadline_;
 };
 
 }  // namespace qn::visa

@@ -170,6 +170,14 @@ struct IMessageDirect : IUnknown {
     virtual HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) = 0;
     // Writes count bytes; *pActual (may be null) receives the count written.
     virtual HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) = 0;
+    // One deadline for several calls. From BeginOperation to the matching
+    // EndOperation, every read, write, clear and status-byte read that the
+    // calling thread makes on the session ends by one deadline: the session
+    // timeout counted from BeginOperation. Pairs nest (the outermost pair
+    // sets the deadline). S_OK opens a pair that EndOperation must close;
+    // S_FALSE (another thread has an operation open) opens none.
+    virtual HRESULT BeginOperation() = 0;
+    virtual HRESULT EndOperation() = 0;
 };
 
 // The resource manager: opens sessions by resource string.

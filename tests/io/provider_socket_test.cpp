@@ -1,0 +1,68 @@
+// The VISA-COM provider over a real socket session against a scripted peer:
+// deadlines of whole operations, replies kept in step.
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <future>
+#include <string>
+
+#include "Quorlen731XXErrors.h"
+#include "io/visa_provider.h"
+#include "tests/platform/visa/loopback_peer.h"
+
+namespace qn::test {
+namespace {
+
+using visa::test::LoopbackPeer;
+
+// A reply that never ends: 4 KiB pieces without a line feed, each well
+// within the session timeout of the previous one, for about six seconds.
+LoopbackPeer& SendEndlessLine(LoopbackPeer& peer) {
+    return peer.Send(std::string(200 * 4096, 'x'), 4096, 30);
+}
+
+class ProviderOnPeer : public ::testing::Test {
+protected:
+    void Open(bool status_check, LONG timeout_ms) {
+        flags_.query_instrument_status = status_check;
+        peer_.Start();
+        ASSERT_EQ(io_.Open(err_, &flags_, peer_.Resource()), S_OK);
+        ASSERT_EQ(io_.SetIOTimeout(err_, timeout_ms), S_OK);
+    }
+    void TearDown() override { io_.Close(); }
+
+    static bool Ready(std::future<void>& f) {
+        return f.wait_for(std::chrono::seconds(0)) == std::future_status::ready;
+    }
+
+    LoopbackPeer peer_;
+    CErrorManagerBase err_;
+    SessionFlags flags_;
+    CVisaComIOProvider io_;
+};
+
+// The rest of an over-long reply is dropped within the query's one deadline,
+// not chunk by chunk with a fresh timeout each.
+TEST_F(ProviderOnPeer, EndlessReplyEndsAtTheQueryDeadline) {
+    SendEndlessLine(peer_.Expect("LONG?\n")).Notify();
+    std::future<void> stream_done = peer_.Signal();
+    Open(false, 300);
+    std::string reply;
+    EXPECT_EQ(io_.Query(err_, "LONG?", &reply, 10, kTimeoutSession), E_QUORLEN731XX_IO_TIMEOUT);
+    EXPECT_TRUE(io_.IsTimeout());
+    EXPECT_FALSE(Ready(stream_done)) << "the query waited for the whole stream";
+}
+
+// The status check after an operation has one deadline of its own.
+TEST_F(ProviderOnPeer, EndlessStatusReplyEndsAtTheCheckDeadline) {
+    SendEndlessLine(peer_.Expect("Q?\n").Send("1\n").Expect("*ESR?\n")).Notify();
+    std::future<void> stream_done = peer_.Signal();
+    Open(true, 300);
+    std::string reply;
+    EXPECT_EQ(io_.Query(err_, "Q?", &reply, 100, kTimeoutSession), E_IVI_INSTRUMENT_STATUS);
+    EXPECT_EQ(reply, "1");
+    EXPECT_FALSE(Ready(stream_done)) << "the status check waited for the whole stream";
+}
+
+}  // namespace
+}  // namespace qn::test
