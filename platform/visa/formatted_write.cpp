@@ -24,6 +24,10 @@ SAFEARRAY* ArrayOf(const VARIANT& v) {
 
 HRESULT FormattedIO::SendBuffer() {
     if (wbuf_.empty()) return S_OK;
+    // A new message to the instrument ends interest in the unread rest of
+    // the last reply: it must not pass for the reply to this one.
+    rpos_ = rend_ = 0;
+    open_message_ = false;
     std::string out;
     out.swap(wbuf_);  // the buffer is emptied also when the write fails
     LONG written = 0;

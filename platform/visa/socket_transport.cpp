@@ -9,10 +9,10 @@
 //   "*CLS" would clear the instrument's status registers, which a device
 //   clear must not do);
 // - the status byte is read with the "*STB?" common query.
-// After a read or write fails (timeout, lost data) the next write first
-// drops whatever input is waiting, so a late reply is not taken for the
-// answer to the next query. A reply that arrives after that point cannot be
-// told apart from the new one: the protocol has no message ids.
+// Every write first drops whatever input is waiting (a stray line, the late
+// rest of a reply after a timeout), so that it is not taken for the answer to
+// what is written now. A reply that arrives after that point cannot be told
+// apart from the new one: the protocol has no message ids.
 #include <fcntl.h>
 #include <netdb.h>
 #include <netinet/in.h>
@@ -171,16 +171,11 @@ class SocketTransport final : public Transport {
     // Receives at least one byte into dst (at most n); waits until deadline.
     HRESULT RecvSome(BYTE* dst, std::size_t n, const Deadline& deadline, std::size_t* got,
                      std::string* error);
-    HRESULT Failed(HRESULT hr) {
-        stale_ = true;
-        return hr;
-    }
 
     FdHolder fd_;
     std::string peer_;  // "host:port", for messages
     std::vector<BYTE> buf_;
     std::size_t head_ = 0, tail_ = 0;  // unread bytes are buf_[head_, tail_)
-    bool stale_ = false;               // the last operation failed: drop input before a write
     bool drained_ = false;             // the last receive emptied the socket's queue
 };
 
@@ -271,7 +266,7 @@ HRESULT SocketTransport::Read(const ReadRequest& req, const Deadline& deadline, 
             hr = RecvSome(buf_.data(), buf_.size(), deadline, &got, error);
             tail_ = got;
         }
-        if (FAILED(hr)) return Failed(hr);
+        if (FAILED(hr)) return hr;
         if (result->bytes == req.count) return S_OK;
     }
 }
@@ -283,10 +278,9 @@ HRESULT SocketTransport::Write(const BYTE* data, std::size_t size, bool /*send_e
         *error = "session closed";
         return E_VISA_INVALID_OBJECT;
     }
-    if (stale_) {
-        DiscardInput();
-        stale_ = false;
-    }
+    // Whatever arrived unasked (a stray line, the late rest of an earlier
+    // reply) must not pass for the reply to what is written now.
+    DiscardInput();
     while (*written < size) {
         ssize_t r = ::send(fd_.get(), data + *written, size - *written, MSG_NOSIGNAL);
         if (r >= 0) {
@@ -296,21 +290,21 @@ HRESULT SocketTransport::Write(const BYTE* data, std::size_t size, bool /*send_e
         if (errno == EINTR) continue;
         if (errno == EPIPE || errno == ECONNRESET) {
             *error = "connection to " + peer_ + " lost while writing";
-            return Failed(E_VISA_CONNECTION_LOST);
+            return E_VISA_CONNECTION_LOST;
         }
         if (errno != EAGAIN && errno != EWOULDBLOCK) {
             *error = "send to " + peer_ + " failed: " + ErrnoText(errno);
-            return Failed(E_VISA_IO);
+            return E_VISA_IO;
         }
         pollfd p{fd_.get(), POLLOUT, 0};
         int k = ::poll(&p, 1, deadline.PollMs());
         if (k < 0 && errno != EINTR) {
             *error = "poll failed: " + ErrnoText(errno);
-            return Failed(E_VISA_IO);
+            return E_VISA_IO;
         }
         if (k == 0) {
             *error = "timeout writing to " + peer_;
-            return Failed(E_VISA_TIMEOUT);
+            return E_VISA_TIMEOUT;
         }
     }
     return S_OK;
@@ -345,7 +339,7 @@ HRESULT SocketTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
     if (r.end != kReadEndTermChar || ParseNumber(text, true, &v, &used) != NumberParse::kOk ||
         !(v >= 0 && v <= 255)) {
         *error = "unreadable status byte reply '" + std::string(text.substr(0, 32)) + "'";
-        return Failed(E_VISA_INVALID_FORMAT);
+        return E_VISA_INVALID_FORMAT;
     }
     *stb = BYTE(v);
     return S_OK;

@@ -64,5 +64,26 @@ TEST_F(ProviderOnPeer, EndlessStatusReplyEndsAtTheCheckDeadline) {
     EXPECT_FALSE(Ready(stream_done)) << "the status check waited for the whole stream";
 }
 
+// A line the instrument sends unasked is dropped before the next query is
+// written: every later query gets its own reply.
+TEST_F(ProviderOnPeer, StrayLineDoesNotShiftLaterReplies) {
+    peer_.Send("STRAY\n").Notify();
+    for (int i = 1; i <= 10; ++i) {
+        const std::string n = std::to_string(i);
+        peer_.Expect("Q" + n + "?\n").Send("A" + n + "\n");
+    }
+    std::future<void> stray_sent = peer_.Signal();
+    Open(false, 2000);
+    stray_sent.wait();
+    for (int i = 1; i <= 10; ++i) {
+        std::string reply;
+        const std::string n = std::to_string(i);
+        ASSERT_EQ(io_.Query(err_, "Q" + n + "?", &reply, 100, kTimeoutSession), S_OK);
+        EXPECT_EQ(reply, "A" + n);
+    }
+    io_.Close();
+    EXPECT_EQ(peer_.Finish(), "");
+}
+
 }  // namespace
 }  // namespace qn::test
