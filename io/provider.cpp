@@ -42,24 +42,21 @@ HRESULT CDriverIOProvider::WriteWithTerminator(std::string_view cmd) {
     return hr;
 }
 
-HRESULT CDriverIOProvider::ReadRaw(std::string* out, LONG max_chars, bool strip) {
-    out->assign(static_cast<std::size_t>(max_chars > 0 ? max_chars : 0), '\0');
+HRESULT CDriverIOProvider::ReadRaw(std::string* out, std::size_t max_chars) {
+    out->assign(max_chars, '\0');
     LONG actual = 0;
-    HRESULT hr = RawRead(reinterpret_cast<BYTE*>(out->data()), max_chars, &actual);
+    HRESULT hr = RawRead(reinterpret_cast<BYTE*>(out->data()), static_cast<LONG>(max_chars),
+                         &actual);
     out->resize(static_cast<std::size_t>(actual > 0 ? actual : 0));
-    if (FAILED(hr)) return hr;
-    if (strip && out->size() >= read_term_.size() && !read_term_.empty() &&
-        out->compare(out->size() - read_term_.size(), read_term_.size(), read_term_) == 0)
-        out->resize(out->size() - read_term_.size());
-    return S_OK;
+    return hr;
 }
 
 HRESULT CDriverIOProvider::ReadReply(std::string* out, LONG max_chars, bool strip) {
-    HRESULT hr = ReadRaw(out, max_chars, false);
+    const std::size_t limit = max_chars > 0 ? static_cast<std::size_t>(max_chars) : 0;
+    HRESULT hr = ReadRaw(out, limit);
     if (FAILED(hr)) return hr;
     const std::string_view term = read_term_;
-    const bool ended = term.empty() || max_chars <= 0 ||
-                       out->size() < static_cast<std::size_t>(max_chars) ||
+    const bool ended = term.empty() || out->size() < limit ||
                        std::string_view(*out).ends_with(term);
     // Each read of the rest ends at the terminator, at the end of the
     // message or when the chunk is full; only a full chunk that does not end
@@ -203,7 +200,7 @@ HRESULT CDriverIOProvider::Query(const CErrorManagerBase& err, std::string_view 
 
 HRESULT CDriverIOProvider::ReadText(const CErrorManagerBase& err, std::string* out,
                                     LONG max_chars, LONG timeout, bool strip, bool poll) {
-    return Run(err, timeout, poll, [&] { return ReadRaw(out, max_chars, strip); });
+    return Run(err, timeout, poll, [&] { return ReadReply(out, max_chars, strip); });
 }
 
 HRESULT CDriverIOProvider::ReadBytes(const CErrorManagerBase& err, SAFEARRAY** out, LONG count,

@@ -55,11 +55,15 @@ public:
 
     // String and byte I/O. `poll` runs the status check after success.
     HRESULT Write(const CErrorManagerBase& err, std::string_view cmd, LONG timeout, bool poll);
+    // Writes cmd and reads its reply as ReadText does (terminator stripped).
     HRESULT Query(const CErrorManagerBase& err, std::string_view cmd, std::string* reply,
                   LONG max_chars, LONG timeout, bool poll = true);
     // Numeric query: at most 100 characters read, parsed as a decimal number.
     template <class T>
     HRESULT QueryNumber(const CErrorManagerBase& err, std::string_view cmd, T* out, LONG timeout);
+    // Text of at most max_chars characters (0 or less: none). The rest of a
+    // longer reply is read and dropped, so the next read starts with the
+    // next message; max_chars 0 drops the whole reply.
     HRESULT ReadText(const CErrorManagerBase& err, std::string* out, LONG max_chars, LONG timeout,
                      bool strip, bool poll = true);
     HRESULT ReadBytes(const CErrorManagerBase& err, SAFEARRAY** out, LONG count, LONG timeout,
@@ -131,7 +135,7 @@ private:
     }
     HRESULT StatusCheck();  // sub-steps 2 to 5 of the check: S_OK or a failure
     HRESULT WriteWithTerminator(std::string_view cmd);
-    HRESULT ReadRaw(std::string* out, LONG max_chars, bool strip);
+    HRESULT ReadRaw(std::string* out, std::size_t max_chars);
     // The reply of a query, at most max_chars of it; a longer reply's rest
     // is read and dropped so that it cannot pass for the next reply.
     HRESULT ReadReply(std::string* out, LONG max_chars, bool strip);

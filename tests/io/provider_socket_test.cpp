@@ -85,5 +85,39 @@ TEST_F(ProviderOnPeer, StrayLineDoesNotShiftLaterReplies) {
     EXPECT_EQ(peer_.Finish(), "");
 }
 
+// A reply read with a character limit smaller than the message: the caller
+// gets the first characters, the rest of that message is dropped and the
+// next read starts with the next message.
+TEST_F(ProviderOnPeer, ShortReadsDropTheRestOfTheirMessage) {
+    struct Case {
+        bool query;  // Query, or Write then ReadText
+        LONG limit;
+        const char* first;
+    };
+    const Case cases[] = {
+        {false, 5, "HELLO"},  {false, 0, ""},  {false, -3, ""},
+        {false, 10, "HELLOWORLD"}, {false, 11, "HELLOWORLD"}, {false, 64, "HELLOWORLD"},
+        {true, 5, "HELLO"},   {true, 0, ""},   {true, 10, "HELLOWORLD"},
+    };
+    for (std::size_t i = 0; i < std::size(cases); ++i)
+        peer_.Expect("R?\n").Send("HELLOWORLD\nSECOND\n");
+    Open(false, 2000);
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::to_string(c.limit) + (c.query ? " query" : " read"));
+        std::string first, second;
+        if (c.query) {
+            ASSERT_EQ(io_.Query(err_, "R?", &first, c.limit, kTimeoutSession), S_OK);
+        } else {
+            ASSERT_EQ(io_.Write(err_, "R?", kTimeoutSession, false), S_OK);
+            ASSERT_EQ(io_.ReadText(err_, &first, c.limit, kTimeoutSession, true, false), S_OK);
+        }
+        EXPECT_EQ(first, c.first);
+        ASSERT_EQ(io_.ReadText(err_, &second, 100, kTimeoutSession, true, false), S_OK);
+        EXPECT_EQ(second, "SECOND");
+    }
+    io_.Close();
+    EXPECT_EQ(peer_.Finish(), "");
+}
+
 }  // namespace
 }  // namespace qn::test
