@@ -10,11 +10,27 @@ namespace qn {
 
 namespace {
 
+// Appends the text of one snprintf conversion, however long it is: the
+// first try uses a stack buffer, a longer text is formatted again into the
+// output at its measured size.
+template <class T>
+void AppendPrintf(std::string& out, const std::string& format, T value) {
+    char buf[128];
+    const int n = std::snprintf(buf, sizeof buf, format.c_str(), value);
+    if (n <= 0) return;
+    if (static_cast<std::size_t>(n) < sizeof buf) {
+        out.append(buf, static_cast<std::size_t>(n));
+        return;
+    }
+    const std::size_t at = out.size();
+    out.resize(at + static_cast<std::size_t>(n) + 1);
+    std::snprintf(out.data() + at, static_cast<std::size_t>(n) + 1, format.c_str(), value);
+    out.resize(at + static_cast<std::size_t>(n));
+}
+
 // Appends one conversion. `spec` is the whole conversion text ("%.15g");
 // `conv` its conversion character.
 void AppendConversion(std::string& out, std::string spec, char conv, const CommandArg& arg) {
-    char buf[128];
-    int n = 0;
     const bool integral = conv == 'd' || conv == 'i' || conv == 'u' || conv == 'x' ||
                           conv == 'X' || conv == 'c';
     const bool floating = conv == 'g' || conv == 'G' || conv == 'f' || conv == 'e' || conv == 'E';
@@ -23,11 +39,7 @@ void AppendConversion(std::string& out, std::string spec, char conv, const Comma
     for (char c : spec.substr(1, spec.size() - 2))
         if (c != 'l' && c != 'h' && c != 'L' && c != 'z' && c != 'j') flags += c;
     if (const auto* s = std::get_if<std::string_view>(&arg)) {
-        if (conv == 's' && flags.empty()) {
-            out += *s;
-            return;
-        }
-        out += *s;  // a string where a number was expected: insert it as text
+        out += *s;  // a string (also where a number was expected) is inserted as text
         return;
     }
     if (integral) {
@@ -38,22 +50,17 @@ void AppendConversion(std::string& out, std::string spec, char conv, const Comma
             out += static_cast<char>(v);
             return;
         }
-        std::string f = "%" + flags + "ll" + conv;
-        n = std::snprintf(buf, sizeof buf, f.c_str(), v);
+        AppendPrintf(out, "%" + flags + "ll" + conv, v);
     } else if (floating) {
         double v = std::holds_alternative<double>(arg)
                        ? std::get<double>(arg)
                        : static_cast<double>(std::get<std::int64_t>(arg));
-        std::string f = "%" + flags + conv;
-        n = std::snprintf(buf, sizeof buf, f.c_str(), v);
-    } else {  // %s with a number
-        if (std::holds_alternative<double>(arg))
-            n = std::snprintf(buf, sizeof buf, "%.15g", std::get<double>(arg));
-        else
-            n = std::snprintf(buf, sizeof buf, "%lld",
-                              static_cast<long long>(std::get<std::int64_t>(arg)));
+        AppendPrintf(out, "%" + flags + conv, v);
+    } else if (std::holds_alternative<double>(arg)) {  // %s with a number
+        AppendPrintf(out, "%.15g", std::get<double>(arg));
+    } else {
+        AppendPrintf(out, "%lld", static_cast<long long>(std::get<std::int64_t>(arg)));
     }
-    if (n > 0) out.append(buf, std::size_t(n) < sizeof buf ? std::size_t(n) : sizeof buf - 1);
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <cstdio>
 
 #include "io/command_format.h"
 #include "io/reply_number.h"
@@ -62,6 +63,27 @@ TEST(CommandFormat, FillsConversionsByArgumentType) {
     EXPECT_EQ(FormatCommandArgs("%q %d", 3), "%q 3");
     EXPECT_EQ(FormatCommandArgs("%999999999d", 3), "%999999999d");
     EXPECT_EQ(FormatCommandArgs("end %"), "end %");
+}
+
+// Long conversions are formatted completely, never cut at a buffer's size.
+TEST(CommandFormat, LongConversionsAreNeverCut) {
+    char f_text[512], e_text[512];
+    std::snprintf(f_text, sizeof f_text, "%f", -1e300);
+    std::snprintf(e_text, sizeof e_text, "%.300e", 1.0 / 3);
+    const std::string text(1000, 'a');
+    struct Case {
+        std::string got, want;
+    };
+    const Case cases[] = {
+        {FormatCommandArgs(":V %f", -1e300), ":V " + std::string(f_text)},
+        {FormatCommandArgs(":V %.300e", 1.0 / 3), ":V " + std::string(e_text)},
+        {FormatCommandArgs(":V %200d;", 42), ":V " + std::string(198, ' ') + "42;"},
+        {FormatCommandArgs(":V %-130i;", -7), ":V -7" + std::string(128, ' ') + ";"},
+        {FormatCommandArgs(":V %.17g", 0.1), ":V 0.10000000000000001"},
+        {FormatCommandArgs(":L \"%s\"", std::string_view(text)), ":L \"" + text + "\""},
+    };
+    for (const Case& c : cases) EXPECT_EQ(c.got, c.want);
+    EXPECT_GT(cases[0].got.size(), 300u);
 }
 
 }  // namespace
