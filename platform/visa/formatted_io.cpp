@@ -48,8 +48,7 @@ void FormattedIO::Consume(std::size_t n) {
     if (rpos_ == rend_) rpos_ = rend_ = 0;
 }
 
-// Adds what the session has of the current message to the read buffer.
-HRESULT FormattedIO::Fill(const Deadline& deadline) {
+HRESULT FormattedIO::Fill(const Deadline& deadline, DWORD extra) {
     if (deadline.Expired())
         return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout reading the reply");
     if (rpos_ > 0) {
@@ -61,10 +60,13 @@ HRESULT FormattedIO::Fill(const Deadline& deadline) {
         return Report(E_VISA_INVALID_FORMAT, kFormattedIid,
                       "reply item longer than the read buffer");
     LONG got = 0, end = kReadEndCount;
-    HRESULT hr = direct_->ReadInto(rbuf_.data() + rend_, LONG(rbuf_.size() - rend_), kReadAvailable,
-                                   &got, &end);
+    HRESULT hr = direct_->ReadInto(rbuf_.data() + rend_, LONG(rbuf_.size() - rend_),
+                                   kReadAvailable | extra, &got, &end);
     rend_ += std::size_t(got);
-    if (got > 0 || SUCCEEDED(hr)) open_message_ = !(end == kReadEndTermChar || end == kReadEndEnd);
+    if (got > 0 || SUCCEEDED(hr)) {
+        open_message_ = !(end == kReadEndTermChar || end == kReadEndEnd);
+        last_end_ = end;
+    }
     return hr;
 }
 
@@ -84,7 +86,7 @@ HRESULT FormattedIO::StartMessage(const Deadline& deadline) {
     return Fill(deadline);
 }
 
-HRESULT FormattedIO::ReadRest(const Deadline& deadline, std::string* out) {
+HRESULT FormattedIO::ReadRest(const Deadline& deadline, std::string* out, DWORD extra) {
     out->clear();
     HRESULT hr = StartMessage(deadline);
     for (;;) {
@@ -94,7 +96,7 @@ HRESULT FormattedIO::ReadRest(const Deadline& deadline, std::string* out) {
         if (!open_message_) return S_OK;
         if (LONGLONG(out->size()) > max_block_)
             return Resync(E_VISA_INVALID_FORMAT, "reply longer than the largest block accepted");
-        hr = Fill(deadline);
+        hr = Fill(deadline, extra);
     }
 }
 
@@ -156,23 +158,35 @@ HRESULT FormattedIO::ReadField(LONG type, const Deadline& deadline, VARIANT* out
 }
 
 HRESULT FormattedIO::DrainMessage(const Deadline& deadline) {
-    // Bytes buffered while the termination character was disabled may hold
-    // the message's terminator: with it enabled again, that terminator ends
-    // the message (a transport without END would otherwise wait for more).
-    VARIANT_BOOL term_enabled = VARIANT_FALSE;
+    if (!open_message_) {
+        rpos_ = rend_ = 0;  // the buffer ends where the message does
+        return S_OK;
+    }
+    // The message ends at the termination character when it is enabled;
+    // without it, at END, or on a bus without END at the line feed.
+    VARIANT_BOOL has_end = VARIANT_FALSE, term_enabled = VARIANT_FALSE;
     BYTE term = '\n';
-    if (open_message_ && rpos_ < rend_ && io_ &&
-        SUCCEEDED(io_->get_TerminationCharacterEnabled(&term_enabled)) && term_enabled &&
-        SUCCEEDED(io_->get_TerminationCharacter(&term)) &&
-        std::memchr(rbuf_.data() + rpos_, term, rend_ - rpos_))
-        open_message_ = false;
+    direct_->get_HasEnd(&has_end);
+    io_->get_TerminationCharacterEnabled(&term_enabled);
+    if (term_enabled) io_->get_TerminationCharacter(&term);
+    if (term_enabled || !has_end) {
+        // Bytes buffered while that character did not end reads may hold
+        // the message's end; what follows it belongs to the next message.
+        const void* hit = std::memchr(rbuf_.data() + rpos_, term, rend_ - rpos_);
+        if (hit) {
+            Consume(std::size_t(static_cast<const BYTE*>(hit) - (rbuf_.data() + rpos_)) + 1);
+            open_message_ = false;
+            return S_OK;
+        }
+    }
     rpos_ = rend_ = 0;
+    const DWORD flags = term_enabled ? kReadDefault : kReadToMessageEnd;
     BYTE scratch[4096];
     while (open_message_) {
         if (deadline.Expired())
             return Report(E_VISA_TIMEOUT, kFormattedIid, "timeout flushing the reply");
         LONG got = 0, end = kReadEndCount;
-        HRESULT hr = direct_->ReadInto(scratch, LONG(sizeof scratch), kReadDefault, &got, &end);
+        HRESULT hr = direct_->ReadInto(scratch, LONG(sizeof scratch), flags, &got, &end);
         if (FAILED(hr)) {
             open_message_ = false;
             return hr;
@@ -225,6 +239,9 @@ HRESULT FormattedIO::ReadDefiniteBody(std::size_t length, BYTE* dst, std::size_t
     std::size_t keep = std::min(have, room);
     if (keep) std::memcpy(dst, rbuf_.data() + rpos_, keep);
     Consume(have);
+    // A read that stopped at a termination character which turned out to be
+    // block data did not reach the end of the message.
+    if (have && rpos_ == rend_ && last_end_ == kReadEndTermChar) open_message_ = true;
     result->stored = keep;
     std::size_t done = have;
     BYTE scratch[4096];
@@ -251,6 +268,31 @@ HRESULT FormattedIO::ReadDefiniteBody(std::size_t length, BYTE* dst, std::size_t
     return S_OK;
 }
 
+// The data of a "#0" block: everything up to the end of the message, the
+// line feed that ends it removed. On a bus with END the data may hold line
+// feeds (a read that stopped at one was not the end); without END the first
+// line feed is the end, whatever the termination-character setting.
+HRESULT FormattedIO::ReadIndefiniteBody(const Deadline& deadline, std::string* data) {
+    VARIANT_BOOL has_end = VARIANT_FALSE;
+    direct_->get_HasEnd(&has_end);
+    if (has_end != VARIANT_FALSE) {
+        if (last_end_ == kReadEndTermChar) open_message_ = true;
+    } else if (open_message_) {
+        const std::string_view p = Pending();
+        const std::size_t lf = p.find('\n');
+        if (lf != std::string_view::npos) {
+            data->assign(p.substr(0, lf));
+            Consume(lf + 1);
+            open_message_ = false;
+            return S_OK;
+        }
+    }
+    HRESULT hr = ReadRest(deadline, data, kReadToMessageEnd);
+    if (FAILED(hr)) return hr;
+    if (!data->empty() && data->back() == '\n') data->pop_back();
+    return S_OK;
+}
+
 HRESULT FormattedIO::ReadBlock(std::size_t elem, bool seek, bool flush, BlockTarget& target,
                                BlockResult* result) {
     const Deadline deadline = OpDeadline();
@@ -260,11 +302,9 @@ HRESULT FormattedIO::ReadBlock(std::size_t elem, bool seek, bool flush, BlockTar
     BYTE* dst = nullptr;
     std::size_t room = 0;
     if (h.indefinite) {
-        // Data runs to the end of the message; the final line feed ends it.
         std::string data;
-        hr = ReadRest(deadline, &data);
+        hr = ReadIndefiniteBody(deadline, &data);
         if (FAILED(hr)) return hr;
-        if (!data.empty() && data.back() == '\n') data.pop_back();
         if (data.size() % elem)
             return Report(E_VISA_INVALID_FORMAT, kFormattedIid,
                           "block length is not a whole number of elements");

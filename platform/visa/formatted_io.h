@@ -72,10 +72,13 @@ class FormattedIO final
     Deadline OpDeadline() const;
     std::string_view Pending() const;
     void Consume(std::size_t n);
-    HRESULT Fill(const Deadline& deadline);
+    // Adds what the session has of the current message to the read buffer
+    // (extra: more ReadFlags for the session read).
+    HRESULT Fill(const Deadline& deadline, DWORD extra = 0);
     HRESULT Settle(HRESULT hr);
     HRESULT StartMessage(const Deadline& deadline);
-    HRESULT ReadRest(const Deadline& deadline, std::string* out);
+    HRESULT ReadRest(const Deadline& deadline, std::string* out, DWORD extra = 0);
+    HRESULT ReadIndefiniteBody(const Deadline& deadline, std::string* data);
     HRESULT SkipSeparators(const Deadline& deadline, bool* at_end);
     HRESULT ReadField(LONG type, const Deadline& deadline, VARIANT* out);
     HRESULT DrainMessage(const Deadline& deadline);
@@ -95,6 +98,7 @@ class FormattedIO final
     std::vector<BYTE> rbuf_;
     std::size_t rpos_ = 0, rend_ = 0;  // unread bytes are rbuf_[rpos_, rend_)
     bool open_message_ = false;        // part of a message was taken; its end not yet
+    LONG last_end_ = kReadEndCount;    // why the last Fill stopped
     std::string wbuf_;
     std::size_t wsize_;
     bool big_endian_ = true;

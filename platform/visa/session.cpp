@@ -51,6 +51,14 @@ HRESULT MessageSession::EndOperation() {
     return S_OK;
 }
 
+HRESULT MessageSession::get_HasEnd(VARIANT_BOOL* pVal) {
+    if (!pVal) return E_POINTER;
+    std::lock_guard<std::mutex> lock(io_);
+    if (!transport_) return Closed();
+    *pVal = Bool(transport_->HasEnd());
+    return S_OK;
+}
+
 HRESULT MessageSession::get_HardwareInterfaceType(SHORT* pVal) {
     if (!pVal) return E_POINTER;
     *pVal = SHORT(name_.interface_type);
@@ -130,6 +138,10 @@ HRESULT MessageSession::ReadLocked(BYTE* buf, std::size_t count, DWORD flags,
     req.count = count;
     req.term_char_enabled = term_enabled_ && !(flags & kReadIgnoreTermChar);
     req.term_char = term_char_;
+    if (flags & kReadToMessageEnd) {
+        req.term_char_enabled = !transport_->HasEnd();
+        req.term_char = '\n';
+    }
     req.return_available = (flags & kReadAvailable) != 0;
     std::string error;
     HRESULT hr = transport_->Read(req, deadline, result, &error);

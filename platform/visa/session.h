@@ -48,6 +48,7 @@ class MessageSession final
     HRESULT WriteFrom(const BYTE* buf, LONG count, LONG* pActual) override;
     HRESULT BeginOperation() override;
     HRESULT EndOperation() override;
+    HRESULT get_HasEnd(VARIANT_BOOL* pVal) override;
 
   private:
     // One transport read with the session's settings and deadline; the

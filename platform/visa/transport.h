@@ -46,6 +46,8 @@ class Transport {
     // reply is not taken for the answer to the next query).
     virtual void DiscardInput() = 0;
     virtual void Close() = 0;
+    // True when the bus marks the end of a message (END).
+    virtual bool HasEnd() const { return false; }
 };
 
 // The raw-socket transport (socket_transport.cpp): connects to host:port of

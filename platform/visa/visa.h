@@ -95,6 +95,10 @@ enum ReadFlags : DWORD {
     kReadDefault = 0,
     kReadIgnoreTermChar = 1,  // binary data: only END or the count ends the read
     kReadAvailable = 2,       // return as soon as some data has arrived and no more waits
+    // Read to the end of the message whatever the termination-character
+    // setting: END where the bus has it, else the line feed (raw sockets and
+    // serial lines, whose only message end it is).
+    kReadToMessageEnd = 4,
 };
 
 }  // namespace qn::visa
@@ -178,6 +182,9 @@ struct IMessageDirect : IUnknown {
     // S_FALSE (another thread has an operation open) opens none.
     virtual HRESULT BeginOperation() = 0;
     virtual HRESULT EndOperation() = 0;
+    // VARIANT_TRUE when the bus marks the end of a message (END); false for
+    // raw sockets and serial lines, where only a line feed can end one.
+    virtual HRESULT get_HasEnd(VARIANT_BOOL* pVal) = 0;
 };
 
 // The resource manager: opens sessions by resource string.

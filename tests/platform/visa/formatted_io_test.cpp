@@ -117,6 +117,50 @@ TEST(FormattedIOTest, WordBlocksHonourByteOrderAndDirectBuffers) {
     EXPECT_EQ(peer.Finish(), "");
 }
 
+// Blocks end where their message ends, with the termination character on
+// and off: "#0" data runs to the line feed that ends the message, and a
+// definite block whose last data byte is a line feed leaves the real
+// terminator to be dropped, so the next reply read is in step.
+TEST(FormattedIOTest, BlocksEndWithTheirMessageWithTheTerminationCharacterOnAndOff) {
+    struct Case {
+        bool term_char;
+        std::string reply;
+        std::string data;
+    };
+    const std::string words("\x01\x02\xff\xfe\x00\x09", 6);
+    const Case cases[] = {
+        {true, "#0" + words + "\n", words},
+        {false, "#0" + words + "\n", words},
+        {true, "#0\n", ""},
+        {false, "#0\n", ""},
+        {true, "#16ab\ncd\n\n", "ab\ncd\n"},
+        {false, "#16ab\ncd\n\n", "ab\ncd\n"},
+        {true, "#11\n\n", "\n"},
+    };
+    LoopbackPeer peer;
+    for (const Case& c : cases) peer.Expect("WAV?\n").Send(c.reply + "NEXT\n");
+    peer.Start();
+    Bound b = Bind(peer);
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.reply + (c.term_char ? " (term char on)" : " (term char off)"));
+        b.msg->put_TerminationCharacterEnabled(c.term_char ? VARIANT_TRUE : VARIANT_FALSE);
+        Write(b.msg.get(), "WAV?\n");
+        BYTE data[16] = {};
+        LONG actual = -1;
+        ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_UI1, data, 16, &actual, VARIANT_FALSE,
+                                              VARIANT_TRUE),
+                  S_OK)
+            << ThreadErrorText();
+        EXPECT_EQ(std::string(reinterpret_cast<char*>(data), std::size_t(actual)), c.data);
+        b.msg->put_TerminationCharacterEnabled(VARIANT_TRUE);
+        Bstr next;
+        ASSERT_EQ(b.io->ReadString(next.Out()), S_OK) << ThreadErrorText();
+        EXPECT_EQ(next.utf8(), "NEXT\n");
+    }
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
 // Lying, truncated and oversized headers fail cleanly, and the session is
 // usable for the next query afterwards.
 TEST(FormattedIOTest, BadBlockHeadersFailAndTheSessionRecovers) {
