@@ -80,6 +80,7 @@ HRESULT CDriverIOManager::GetIOTimeout(LONG* timeout) {
     return Provider().GetIOTimeout(node_.Errors(), timeout);
 }
 HRESULT CDriverIOManager::IsTimeout(bool* timed_out) {
+    IoTrace t(node_.Core(), "IsTimeout");
     if (!timed_out) return E_POINTER;
     *timed_out = Provider().IsTimeout();
     return S_OK;
@@ -89,21 +90,27 @@ HRESULT CDriverIOManager::GetVisaInterfaceType(LONG* type) {
     return Provider().GetVisaInterfaceType(node_.Errors(), type);
 }
 HRESULT CDriverIOManager::SetSendEndEnabled(bool on) {
+    IoTrace t(node_.Core(), "SetSendEndEnabled");
     return Provider().SetSendEndEnabled(node_.Errors(), on);
 }
 HRESULT CDriverIOManager::GetSendEndEnabled(bool* on) {
+    IoTrace t(node_.Core(), "GetSendEndEnabled");
     return Provider().GetSendEndEnabled(node_.Errors(), on);
 }
 HRESULT CDriverIOManager::SetTerminationCharacter(BYTE c) {
+    IoTrace t(node_.Core(), "SetTerminationCharacter");
     return Provider().SetTerminationCharacter(node_.Errors(), c);
 }
 HRESULT CDriverIOManager::GetTerminationCharacter(BYTE* c) {
+    IoTrace t(node_.Core(), "GetTerminationCharacter");
     return Provider().GetTerminationCharacter(node_.Errors(), c);
 }
 HRESULT CDriverIOManager::SetTerminationCharacterEnabled(bool on) {
+    IoTrace t(node_.Core(), "SetTerminationCharacterEnabled");
     return Provider().SetTerminationCharacterEnabled(node_.Errors(), on);
 }
 HRESULT CDriverIOManager::GetTerminationCharacterEnabled(bool* on) {
+    IoTrace t(node_.Core(), "GetTerminationCharacterEnabled");
     return Provider().GetTerminationCharacterEnabled(node_.Errors(), on);
 }
 
@@ -300,6 +307,7 @@ HRESULT CDriverIOManager::FormattedFlushRead(LONG timeout) {
                      [&](IFormattedIO488* io) { return io->FlushRead(); });
 }
 HRESULT CDriverIOManager::FormattedSetBufferSize(LONG mask, LONG size) {
+    IoTrace t(node_.Core(), "FormattedSetBufferSize");
     IFormattedIO488* io = Provider().FormattedInterface();
     return io ? io->SetBufferSize(mask, size) : E_FAIL;
 }

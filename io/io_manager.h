@@ -60,7 +60,9 @@ public:
     }
 
     // Queries: text of at most max_chars characters (one terminator
-    // stripped), or a number (bool, SHORT, LONG, float, double).
+    // stripped; the rest of a longer reply is dropped, and max_chars 0 gives
+    // "" and drops the whole reply), or a number (bool, SHORT, LONG, float,
+    // double).
     HRESULT InstrQuery(std::string_view cmd, std::string* out, LONG max_chars,
                        LONG timeout = kTimeoutSession) {
         return QueryText("InstrQuery", std::string(cmd), out, max_chars, timeout);

@@ -129,9 +129,15 @@ HRESULT CDriverIOProvider::ReportIOError(const CErrorManagerBase& err, HRESULT h
     return reported;
 }
 
-HRESULT CDriverIOProvider::DeviceClear() { return initialized_ ? RawClear() : E_FAIL; }
+// Device clear and serial poll are operations of their own: they end the
+// timed-out state of an earlier one.
+HRESULT CDriverIOProvider::DeviceClear() {
+    timed_out_ = false;
+    return initialized_ ? RawClear() : E_FAIL;
+}
 HRESULT CDriverIOProvider::ReadSTB(SHORT* stb) {
     if (!stb) return E_POINTER;
+    timed_out_ = false;
     return initialized_ ? RawReadSTB(stb) : E_FAIL;
 }
 

@@ -1,10 +1,15 @@
 #include <gtest/gtest.h>
 
+#include <unistd.h>
+
 #include <cmath>
+#include <filesystem>
+#include <functional>
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
+#include "services/trace_document.h"
 #include "tests/support/scripted_driver.h"
 
 namespace qn::test {
@@ -127,6 +132,69 @@ TEST_F(IoManagerTest, TimeoutIsReportedAndTheSessionTimeoutRestored) {
     EXPECT_EQ(Io().InstrWrite(":RUN"), S_OK);
     Io().IsTimeout(&timed_out);
     EXPECT_FALSE(timed_out);
+}
+
+// Device clear, serial poll and any other operation that succeeds end the
+// timed-out state a timeout left.
+TEST_F(IoManagerTest, OperationsAfterATimeoutClearTheTimedOutState) {
+    Open();
+    const std::function<HRESULT()> next[] = {
+        [&] { return Io().DeviceClear(); },
+        [&] {
+            SHORT stb = -1;
+            return Io().ReadSTB(&stb);
+        },
+        [&] {
+            io_->Expect(":RUN\n");
+            return Io().InstrWrite(":RUN");
+        },
+    };
+    for (const auto& op : next) {
+        io_->ExpectTimeout("*IDN?\n");
+        std::string reply;
+        EXPECT_EQ(Io().InstrQuery("*IDN?", &reply, 100), E_QUORLEN731XX_IO_TIMEOUT);
+        bool timed_out = false;
+        Io().IsTimeout(&timed_out);
+        ASSERT_TRUE(timed_out);
+        EXPECT_EQ(op(), S_OK);
+        Io().IsTimeout(&timed_out);
+        EXPECT_FALSE(timed_out);
+    }
+}
+
+// Every operation of the I/O manager leaves its own trace record.
+TEST_F(IoManagerTest, EveryOperationOpensItsTraceRecord) {
+    const auto dir = std::filesystem::temp_directory_path() /
+                     ("qn-io-trace-" + std::to_string(::getpid()));
+    std::filesystem::create_directories(dir);
+    Open(("DriverSetup=Trace=true,TraceName=" + (dir / "io").string()).c_str());
+    bool b = false;
+    BYTE c = 0;
+    SHORT stb = 0;
+    const std::pair<const char*, std::function<void()>> ops[] = {
+        {"IsTimeout", [&] { Io().IsTimeout(&b); }},
+        {"SetSendEndEnabled", [&] { Io().SetSendEndEnabled(true); }},
+        {"GetSendEndEnabled", [&] { Io().GetSendEndEnabled(&b); }},
+        {"SetTerminationCharacter", [&] { Io().SetTerminationCharacter('\n'); }},
+        {"GetTerminationCharacter", [&] { Io().GetTerminationCharacter(&c); }},
+        {"SetTerminationCharacterEnabled", [&] { Io().SetTerminationCharacterEnabled(true); }},
+        {"GetTerminationCharacterEnabled", [&] { Io().GetTerminationCharacterEnabled(&b); }},
+        {"FormattedSetBufferSize", [&] { Io().FormattedSetBufferSize(16, 4096); }},
+        {"DeviceClear", [&] { Io().DeviceClear(); }},
+        {"ReadSTB", [&] { Io().ReadSTB(&stb); }},
+    };
+    for (const auto& [name, op] : ops) {
+        op();
+        int records = 0;
+        const auto& doc = driver_->Core().tracer.Document();
+        ASSERT_TRUE(doc);
+        for (pugi::xml_node m : doc->records.children("Method"))
+            records += std::string(m.attribute("Interface").value()) == "CDriverIOManager" &&
+                       std::string(m.attribute("Name").value()) == name;
+        EXPECT_EQ(records, 1) << name;
+    }
+    driver_->Close();
+    std::filesystem::remove_all(dir);
 }
 
 TEST_F(IoManagerTest, CommandStackQueries) {
