@@ -11,7 +11,7 @@ work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 cp -r "$package" "$work/pkg"
 rm -rf "$work/pkg/build" "$work/pkg"/*.egg-info
-"$venv/bin/python" -m pip install -q --no-index --no-build-isolation --no-deps "$work/pkg"
+"$venv/bin/python" -m pip install -q --no-cache-dir --no-index --no-build-isolation --no-deps "$work/pkg"
 cd "$work"
 "$venv/bin/python" - <<'PY'
 import quorlen731xx as qn
