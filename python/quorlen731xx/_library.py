@@ -83,7 +83,11 @@ class Library:
 
     def __init__(self, path: str):
         self.path = path
-        self.dll = ctypes.CDLL(path)  # CDLL: the GIL is released during each call
+        try:
+            self.dll = ctypes.CDLL(path)  # CDLL: the GIL is released during each call
+        except OSError as e:
+            raise OSError(f"cannot load the driver library {path!r} ({e}); pass library= "
+                          "or set QN731XX_LIBRARY to the path of libquorlen731xx.so") from e
         self.missing = set()
         for name, argtypes in PROTOTYPES.items():
             try:

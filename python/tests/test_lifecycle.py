@@ -71,3 +71,8 @@ def test_close_while_another_thread_reads():
     t.join(timeout=30)
     stop.set()
     assert not t.is_alive() and not failures
+
+
+def test_missing_library_names_the_way_to_fix_it(tmp_path):
+    with pytest.raises(OSError, match="QN731XX_LIBRARY"):
+        qn.Scope("", options="Simulate=true", library=str(tmp_path / "libnothing.so"))
