@@ -254,9 +254,10 @@ TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEven
     EXPECT_EQ(Measurements()->Initiate(), S_OK);
     EXPECT_TRUE(driver_->Core().acquisition_control.pending);
 
-    // Status reads only the status byte while pending; the event ends it and
-    // puts the saved enable back.
-    io_->stb = {0x00, 0x20};
+    // Status reads only the status byte while pending; its event summary bit
+    // alone ends it (every other bit set does not) and puts the saved enable
+    // back.
+    io_->stb = {0xDF, 0x20};
     Quorlen731XXAcquisitionStatusEnum s = Quorlen731XXAcqStatusUnknown;
     EXPECT_EQ(Measurements()->Status(&s), S_OK);
     EXPECT_EQ(s, Quorlen731XXAcqInProgress);
@@ -265,8 +266,8 @@ TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEven
     EXPECT_EQ(s, Quorlen731XXAcqComplete);
     EXPECT_FALSE(driver_->Core().acquisition_control.pending);
 
-    // Not pending: the run bit of the operation condition decides.
-    io_->Expect("OPER?\n", "8\n").Expect("OPER?\n", "0\n");
+    // Not pending: the run bit of the operation condition alone decides.
+    io_->Expect("OPER?\n", "8\n").Expect("OPER?\n", "32759\n");
     EXPECT_EQ(Measurements()->Status(&s), S_OK);
     EXPECT_EQ(s, Quorlen731XXAcqInProgress);
     IviScopeAcquisitionStatusEnum cs = IviScopeAcqStatusUnknown;
