@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <iterator>
 #include <set>
 #include <sstream>
 #include <string>
@@ -95,6 +96,64 @@ TEST(FixedFeatures, EveryEarlyModelAndTheDefaults) {
         EXPECT_FALSE(f.digitize_command);
         EXPECT_FALSE(f.sequence_trigger);
         EXPECT_FALSE(f.counted_maximum_points);
+    }
+}
+
+// A newer model's whole discovery, with each feature token alone in its
+// reply: it sets its own flag and no other; tokens match case-sensitively.
+TEST(Discovery, EachFeatureTokenAloneSetsItsOwnFlag) {
+    using F = bool FeatureRecord::*;
+    const F flags[] = {&FeatureRecord::ground_coupling,  &FeatureRecord::auto_level_sweep,
+                       &FeatureRecord::fifty_ohm_input,  &FeatureRecord::channel_protection,
+                       &FeatureRecord::probe_skew,       &FeatureRecord::external_trigger_input,
+                       &FeatureRecord::sequence_trigger, &FeatureRecord::digitize_command};
+    struct Case {
+        const char* chan;
+        const char* trig;
+        const char* mode;
+        const char* analog;
+        int flag;  // index into flags; -1: none
+    };
+    const Case cases[] = {
+        {"GCO", "", "", "", 0},  {"ALEV", "", "", "", 1}, {"FIFT", "", "", "", 2},
+        {"PROT", "", "", "", 3}, {"PSK", "", "", "", 4},  {"", "EXT", "", "", 5},
+        {"", "", "SEQ", "", 6},  {"", "", "", "DDIG", 7}, {"psk", "ext", "seq", "ddig", -1},
+    };
+    const auto val = [](const char* key) { return std::string(":SYST:DATA:VAL? \"") + key + "\"\n"; };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.flag);
+        ScriptedProvider* io = nullptr;
+        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
+        const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
+        io->Expect("*IDN?\n", idn)
+            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
+            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "3\n")
+            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "5\n")
+            .Expect("*IDN?\n", idn)
+            .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
+            .Expect(val("DISP:LAB"), "0\n")
+            .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "1\n")
+            .Expect(val("WAV:FEAT"), "DEC\n")
+            .Expect(val("COUN:POD"), "3\n")
+            .Expect(val("POD:SIZE"), "5\n")
+            .Expect(val("COUN:CHAN"), "2\n")
+            .Expect(val("CHAN:BAND"), "1.2345678901234567E9\n")
+            .Expect(val("CHAN:BWL"), "2.0000000000000004E7\n")
+            .Expect(val("CHAN:FEAT"), std::string(c.chan) + "\n")
+            .Expect(val("TRIG:FEAT"), std::string(c.trig) + "\n")
+            .Expect(val("TRIG:MOD"), std::string(c.mode) + "\n")
+            .Expect(val("ANAL:FEAT"), std::string(c.analog) + "\n");
+        com::Bstr r("scripted"), o("");
+        ASSERT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+        EXPECT_TRUE(io->Done());
+        const FeatureRecord& f = driver->Core().features;
+        for (int k = 0; k < int(std::size(flags)); ++k) EXPECT_EQ(f.*flags[k], k == c.flag) << k;
+        EXPECT_FALSE(f.display_labels);
+        EXPECT_TRUE(f.counted_maximum_points);
+        EXPECT_EQ(f.digital_channel_count, 15);
+        EXPECT_EQ(f.analog_channel_count, 2);
+        EXPECT_EQ(f.bandwidth, 1.2345678901234567e9);
+        EXPECT_EQ(f.bandwidth_limit, 2.0000000000000004e7);
     }
 }
 
