@@ -13,6 +13,32 @@ namespace {
 constexpr ViInt32 kQueryTextSize = 1024;
 constexpr ViInt32 kRevisionTextSize = 256;
 
+// The next record of one of the driver's queues by the string rule; a record
+// that does not fit stays with the session for the next call.
+ViStatus NextRecord(ViSession vi, SessionData::Queue queue, ViInt32 bufferSize, ViChar buffer[],
+                    HRESULT (IIviDriverOperation::*next)(BSTR*)) {
+    return Guard(vi, [&]() -> ViStatus {
+        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, buffer);
+        SessionRef session;
+        ViStatus status = SessionOf(vi, &session);
+        if (status != VI_SUCCESS) return status;
+        std::string text;
+        if (!session->TakePending(queue, &text)) {
+            status = CallOn<IIviDriverOperation>(
+                vi, [&](IIviDriverOperation* op) {
+                    com::Bstr record;
+                    HRESULT hr = (op->*next)(record.Out());
+                    text = record.utf8();
+                    return hr;
+                });
+            if (status < 0) return status;
+        }
+        const ViStatus copied = CopyString(vi, text, bufferSize, buffer);
+        if (copied > 0 && !text.empty()) session->KeepPending(queue, std::move(text));
+        return First(status, copied);
+    });
+}
+
 }  // namespace
 
 extern "C" {
@@ -78,23 +104,13 @@ ViStatus Qn731XX_ClearInterchangeWarnings(ViSession vi) {
 }
 
 ViStatus Qn731XX_GetNextInterchangeWarning(ViSession vi, ViInt32 bufferSize, ViChar warning[]) {
-    return Guard(vi, [&]() -> ViStatus {
-        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, warning);
-        TextResult text{bufferSize, warning};
-        ViStatus status = CallOn<IIviDriverOperation>(
-            vi, [&](IIviDriverOperation* op) { return op->GetNextInterchangeWarning(&text.text); });
-        return status < 0 ? status : First(status, text.CopyOut(vi));
-    });
+    return NextRecord(vi, SessionData::Queue::kInterchange, bufferSize, warning,
+                      &IIviDriverOperation::GetNextInterchangeWarning);
 }
 
 ViStatus Qn731XX_GetNextCoercionRecord(ViSession vi, ViInt32 bufferSize, ViChar record[]) {
-    return Guard(vi, [&]() -> ViStatus {
-        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, record);
-        TextResult text{bufferSize, record};
-        ViStatus status = CallOn<IIviDriverOperation>(
-            vi, [&](IIviDriverOperation* op) { return op->GetNextCoercionRecord(&text.text); });
-        return status < 0 ? status : First(status, text.CopyOut(vi));
-    });
+    return NextRecord(vi, SessionData::Queue::kCoercion, bufferSize, record,
+                      &IIviDriverOperation::GetNextCoercionRecord);
 }
 
 }  // extern "C"

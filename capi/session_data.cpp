@@ -41,4 +41,20 @@ void SessionData::Expose() {
     items_.clear();
 }
 
+bool SessionData::TakePending(Queue q, std::string* text) {
+    std::lock_guard<std::mutex> g(m_);
+    const auto i = static_cast<std::size_t>(q);
+    if (!has_pending_[i]) return false;
+    *text = std::move(pending_[i]);
+    has_pending_[i] = false;
+    return true;
+}
+
+void SessionData::KeepPending(Queue q, std::string text) {
+    std::lock_guard<std::mutex> g(m_);
+    const auto i = static_cast<std::size_t>(q);
+    pending_[i] = std::move(text);
+    has_pending_[i] = true;
+}
+
 }  // namespace qn::capi

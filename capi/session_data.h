@@ -43,6 +43,14 @@ public:
     // A client got hold of the driver object: stop caching items.
     void Expose();
 
+    // Records taken from the driver's queues (coercion records, interchange
+    // warnings) that did not fit the caller's buffer: the next call delivers
+    // them instead of taking the next one, so asking for the size first loses
+    // nothing.
+    enum class Queue { kCoercion, kInterchange };
+    bool TakePending(Queue q, std::string* text);
+    void KeepPending(Queue q, std::string text);
+
 private:
     ~SessionData() {
         for (std::atomic<IUnknown*>& itf : interfaces_)
@@ -61,6 +69,8 @@ private:
     std::atomic<IUnknown*> interfaces_[kInterfaceSlots] = {};  // each holds a reference
     std::vector<CachedItem> items_;
     bool items_cacheable_;
+    std::string pending_[2];
+    bool has_pending_[2] = {false, false};
 };
 
 // A counted reference to a session's data for the length of a call.

@@ -189,3 +189,29 @@ TEST_F(CSession, WaveformsFillNoMoreThanTheCallersArray) {
 
 }  // namespace
 }  // namespace qn::test
+
+namespace qn::test {
+namespace {
+
+TEST_F(CSession, ARecordTooLongForTheBufferIsDeliveredByTheNextCall) {
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    com::Bstr r(""), o("Simulate=true,RecordCoercions=true");
+    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    driver->Core().coercions.AddCoercionRecord("first record");
+    driver->Core().coercions.AddCoercionRecord("second record");
+    ASSERT_EQ(Qn731XX_AttachToExistingCOMSession(static_cast<IIviDriver*>(driver.get()), &vi_), 0);
+    char text[32];
+    // The size first, then the same record; a buffer one short keeps it too.
+    EXPECT_EQ(Qn731XX_GetNextCoercionRecord(vi_, 0, nullptr), 13);
+    EXPECT_EQ(Qn731XX_GetNextCoercionRecord(vi_, 12, text), 13);
+    EXPECT_STREQ(text, "first recor");
+    EXPECT_EQ(Qn731XX_GetNextCoercionRecord(vi_, sizeof text, text), VI_SUCCESS);
+    EXPECT_STREQ(text, "first record");
+    EXPECT_EQ(Qn731XX_GetNextCoercionRecord(vi_, sizeof text, text), VI_SUCCESS);
+    EXPECT_STREQ(text, "second record");
+    EXPECT_EQ(Qn731XX_GetNextCoercionRecord(vi_, sizeof text, text), VI_SUCCESS);
+    EXPECT_STREQ(text, "");
+}
+
+}  // namespace
+}  // namespace qn::test
