@@ -3,6 +3,7 @@
 // result; results are copied back only after success.
 #pragma once
 
+#include <tuple>
 #include <type_traits>
 
 #include "capi/c_session.h"
@@ -22,6 +23,43 @@ ViStatus CallOn(ViSession vi, Member&& member) {
 template <class Itf>
 ViStatus CallSimple(ViSession vi, HRESULT (Itf::*member)()) {
     return Guard(vi, [&] { return CallOn<Itf>(vi, [&](Itf* itf) { return (itf->*member)(); }); });
+}
+
+// A C argument as the member's parameter type `P`: enumerations from their
+// ViInt32 value, texts as BSTRs, booleans as VARIANT_BOOL (any nonzero value
+// true), numbers as they are.
+template <class P>
+struct MemberArg {
+    template <class A>
+    explicit MemberArg(A a) : value(static_cast<P>(a)) {}
+    P get() const { return value; }
+    P value;
+};
+template <>
+struct MemberArg<BSTR> {
+    explicit MemberArg(ViConstString s) : value(s) {}
+    BSTR get() const { return value.get(); }
+    com::Bstr value;
+};
+template <>
+struct MemberArg<VARIANT_BOOL> {
+    explicit MemberArg(ViBoolean b) : value(b ? VARIANT_TRUE : VARIANT_FALSE) {}
+    VARIANT_BOOL get() const { return value; }
+    VARIANT_BOOL value;
+};
+
+// A member with input parameters only, as one C function: each C argument
+// becomes the member's parameter of the same position.
+template <class Itf, class... P, class... A>
+ViStatus CallMethod(ViSession vi, HRESULT (Itf::*member)(P...), A... args) {
+    static_assert(sizeof...(P) == sizeof...(A), "one C argument per member parameter");
+    return Guard(vi, [&] {
+        std::tuple<MemberArg<P>...> converted{MemberArg<P>(args)...};
+        return CallOn<Itf>(vi, [&](Itf* itf) {
+            return std::apply([&](const auto&... a) { return (itf->*member)(a.get()...); },
+                              converted);
+        });
+    });
 }
 
 // A text result copied by the string rule into a buffer of `size`.

@@ -87,10 +87,7 @@ ViStatus Qn731XX_MeasurementFunctionName(ViSession vi, ViConstString measurement
 }
 
 ViStatus Qn731XX_ConfigureRefLevels(ViSession vi, ViReal64 low, ViReal64 mid, ViReal64 high) {
-    return Guard(vi, [&] {
-        return CallOn<IIviScopeReferenceLevel>(
-            vi, [&](IIviScopeReferenceLevel* r) { return r->Configure(low, mid, high); });
-    });
+    return CallMethod(vi, &IIviScopeReferenceLevel::Configure, low, mid, high);
 }
 
 ViStatus Qn731XX_MultiWaveformMeasurementResetActivity(ViSession vi) {
@@ -117,16 +114,8 @@ ViStatus Qn731XX_MultiWaveformMeasurementConfigureDelay(ViSession vi, ViConstStr
                                                         ViInt32 slope1, ViInt32 slope2,
                                                         ViInt32 delayOccurence1,
                                                         ViInt32 delayOccurence2) {
-    return Guard(vi, [&] {
-        com::Bstr source(source2);
-        return CallOn<IQuorlen731XXMultiWaveformMeasurement>(
-            vi, [&](IQuorlen731XXMultiWaveformMeasurement* m) {
-                return m->ConfigureDelay(source.get(),
-                                         static_cast<Quorlen731XXMeasurementSlopeEnum>(slope1),
-                                         static_cast<Quorlen731XXMeasurementSlopeEnum>(slope2),
-                                         delayOccurence1, delayOccurence2);
-            });
-    });
+    return CallMethod(vi, &IQuorlen731XXMultiWaveformMeasurement::ConfigureDelay, source2, slope1,
+                      slope2, delayOccurence1, delayOccurence2);
 }
 
 ViStatus Qn731XX_DigitalChannelFetchDigitalWaveform(ViSession vi, ViConstString digitalChannel,

@@ -29,11 +29,8 @@ extern "C" {
 
 ViStatus Qn731XX_ConfigureAcquisitionRecord(ViSession vi, ViReal64 timePerRecord, ViInt32 minNumPts,
                                             ViReal64 acquisitionStartTime) {
-    return Guard(vi, [&] {
-        return CallOn<IIviScopeAcquisition>(vi, [&](IIviScopeAcquisition* a) {
-            return a->ConfigureRecord(timePerRecord, minNumPts, acquisitionStartTime);
-        });
-    });
+    return CallMethod(vi, &IIviScopeAcquisition::ConfigureRecord, timePerRecord, minNumPts,
+                      acquisitionStartTime);
 }
 
 ViStatus Qn731XX_ConfigureChannel(ViSession vi, ViConstString channel, ViReal64 range,

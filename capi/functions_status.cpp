@@ -12,11 +12,7 @@ ViStatus Qn731XX_StatusPreset(ViSession vi) { return CallSimple(vi, &IQuorlen731
 ViStatus Qn731XX_StatusClear(ViSession vi) { return CallSimple(vi, &IQuorlen731XXStatus::Clear); }
 
 ViStatus Qn731XX_StatusConfigureServiceRequest(ViSession vi, ViInt32 reason) {
-    return Guard(vi, [&] {
-        return CallOn<IQuorlen731XXStatus>(vi, [&](IQuorlen731XXStatus* s) {
-            return s->ConfigureServiceRequest(static_cast<Quorlen731XXSRQReasonEnum>(reason));
-        });
-    });
+    return CallMethod(vi, &IQuorlen731XXStatus::ConfigureServiceRequest, reason);
 }
 
 ViStatus Qn731XX_StatusGetRegister(ViSession vi, ViInt32 statusRegister, ViInt32 subRegister,
@@ -35,12 +31,7 @@ ViStatus Qn731XX_StatusGetRegister(ViSession vi, ViInt32 statusRegister, ViInt32
 
 ViStatus Qn731XX_StatusSetRegister(ViSession vi, ViInt32 statusRegister, ViInt32 subRegister,
                                    ViInt32 value) {
-    return Guard(vi, [&] {
-        return CallOn<IQuorlen731XXStatus>(vi, [&](IQuorlen731XXStatus* s) {
-            return s->put_Register(static_cast<Quorlen731XXStatusRegisterEnum>(statusRegister),
-                                   static_cast<Quorlen731XXStatusSubRegisterEnum>(subRegister), value);
-        });
-    });
+    return CallMethod(vi, &IQuorlen731XXStatus::put_Register, statusRegister, subRegister, value);
 }
 
 }  // extern "C"
