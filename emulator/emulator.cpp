@@ -1,3 +1,5 @@
+// The emulator's servers: listeners, one thread per connection, the shared instrument and the
+// fault injection. The VXI-11 and portmapper protocols are in emulator_vxi11.cpp.
 #include "emulator/emulator.h"
 
 #include <arpa/inet.h>
@@ -14,6 +16,7 @@
 
 #include "emulator/instrument.h"
 #include "emulator/models.h"
+#include "emulator/scpi_parser.h"
 
 namespace qn::emu {
 namespace {
@@ -39,86 +42,233 @@ Emulator::~Emulator() {
     Stop();
 }
 
-std::uint16_t Emulator::Start(std::uint16_t port) {
-    if (thread_.joinable()) throw std::logic_error("emulator already started");
-    listener_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    if (listener_ < 0) ThrowErrno("socket");
+void Emulator::EnableVxi11() {
+    vxi11_ = true;
+}
+
+void Emulator::EnablePortmapper(std::uint16_t port) {
+    portmapper_ = port;
+}
+
+void Emulator::SetIdleTimeout(std::chrono::milliseconds idle) {
+    idle_ = idle;
+}
+
+int Emulator::Listen(std::uint16_t port, int type) {
+    const int fd = ::socket(AF_INET, type | SOCK_CLOEXEC, 0);
+    if (fd < 0) ThrowErrno("socket");
     const int one = 1;
-    ::setsockopt(listener_, SOL_SOCKET, SO_REUSEADDR, &one, sizeof one);
+    ::setsockopt(fd, SOL_SOCKET, SO_REUSEADDR, &one, sizeof one);
     sockaddr_in addr{};
     addr.sin_family = AF_INET;
     addr.sin_port = htons(port);
     addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    socklen_t len = sizeof addr;
-    if (::bind(listener_, reinterpret_cast<sockaddr*>(&addr), sizeof addr) != 0 ||
-        ::listen(listener_, 8) != 0 ||
-        ::getsockname(listener_, reinterpret_cast<sockaddr*>(&addr), &len) != 0) {
+    if (::bind(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr) != 0 ||
+        (type == SOCK_STREAM && ::listen(fd, SOMAXCONN) != 0)) {
         const int saved = errno;
-        ::close(listener_);
-        listener_ = -1;
-        throw std::system_error(saved, std::generic_category(), "bind/listen on 127.0.0.1");
+        ::close(fd);
+        throw std::system_error(saved, std::generic_category(),
+                                "bind/listen on 127.0.0.1:" + std::to_string(port));
+    }
+    return fd;
+}
+
+namespace {
+std::uint16_t BoundPort(int fd) {
+    sockaddr_in addr{};
+    socklen_t len = sizeof addr;
+    ::getsockname(fd, reinterpret_cast<sockaddr*>(&addr), &len);
+    return ntohs(addr.sin_port);
+}
+}  // namespace
+
+std::uint16_t Emulator::Start(std::uint16_t port) {
+    if (acceptor_.joinable()) throw std::logic_error("emulator already started");
+    if (portmapper_ && !vxi11_) throw std::logic_error("the portmapper needs the VXI-11 server");
+    auto close_all = [this] {
+        for (const Listener& l : listeners_) ::close(l.fd);
+        listeners_.clear();
+        if (portmapper_udp_ >= 0) ::close(portmapper_udp_);
+        portmapper_udp_ = -1;
+    };
+    try {
+        listeners_.push_back({Server::kRaw, Listen(port, SOCK_STREAM)});
+        port_ = BoundPort(listeners_.back().fd);
+        if (vxi11_) {
+            listeners_.push_back({Server::kVxi11Core, Listen(0, SOCK_STREAM)});
+            vxi11_port_ = BoundPort(listeners_.back().fd);
+            listeners_.push_back({Server::kVxi11Abort, Listen(0, SOCK_STREAM)});
+            abort_port_ = BoundPort(listeners_.back().fd);
+        }
+        if (portmapper_) {
+            listeners_.push_back({Server::kPortmapper, Listen(*portmapper_, SOCK_STREAM)});
+            portmapper_port_ = BoundPort(listeners_.back().fd);
+            portmapper_udp_ = Listen(portmapper_port_, SOCK_DGRAM);
+        }
+    } catch (...) {
+        close_all();
+        throw;
     }
     if (::pipe2(wake_, O_CLOEXEC | O_NONBLOCK) != 0) {
-        ::close(listener_);
-        listener_ = -1;
+        close_all();
         ThrowErrno("pipe2");
     }
-    port_ = ntohs(addr.sin_port);
     stopping_ = false;
-    thread_ = std::thread([this] { Run(); });
+    acceptor_ = std::thread([this] { Accept(); });
     return port_;
 }
 
 void Emulator::Stop() {
-    if (!thread_.joinable()) return;
+    if (!acceptor_.joinable()) return;
     stopping_ = true;
     const char byte = 1;
     [[maybe_unused]] const auto written = ::write(wake_[1], &byte, 1);
-    thread_.join();
-    for (int* fd : {&listener_, &wake_[0], &wake_[1]}) {
+    acceptor_.join();
+    ReapWorkers(true);
+    for (const Listener& l : listeners_) ::close(l.fd);
+    listeners_.clear();
+    if (portmapper_udp_ >= 0) ::close(portmapper_udp_);
+    portmapper_udp_ = -1;
+    for (int* fd : {&wake_[0], &wake_[1]}) {
         if (*fd >= 0) ::close(*fd);
         *fd = -1;
     }
 }
 
-void Emulator::Run() {
+void Emulator::Accept() {
+    std::vector<pollfd> fds;
+    for (const Listener& l : listeners_) fds.push_back({l.fd, POLLIN, 0});
+    if (portmapper_udp_ >= 0) fds.push_back({portmapper_udp_, POLLIN, 0});
+    fds.push_back({wake_[0], POLLIN, 0});
     while (!stopping_) {
-        pollfd fds[2] = {{listener_, POLLIN, 0}, {wake_[0], POLLIN, 0}};
-        if (::poll(fds, 2, -1) < 0) {
+        if (::poll(fds.data(), fds.size(), -1) < 0) {
             if (errno == EINTR) continue;
             return;
         }
-        if (fds[1].revents != 0) return;
-        const int client = ::accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC);
-        if (client < 0) continue;
-        const int one = 1;
-        ::setsockopt(client, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-        Serve(client);
-        ::close(client);
+        if (fds.back().revents != 0) return;
+        ReapWorkers(false);
+        for (std::size_t i = 0; i < listeners_.size(); ++i) {
+            if (fds[i].revents == 0) continue;
+            const int client = ::accept4(listeners_[i].fd, nullptr, nullptr, SOCK_CLOEXEC);
+            if (client < 0) continue;
+            const int one = 1;
+            ::setsockopt(client, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+            Spawn(listeners_[i].server, client);
+        }
+        if (portmapper_udp_ >= 0 && fds[listeners_.size()].revents != 0)
+            AnswerPortmapperDatagram(portmapper_udp_);
     }
 }
 
-void Emulator::Serve(int client) {
-    MessageFramer framer;
-    std::string chunk(kReadChunk, '\0');
+void Emulator::Spawn(Server server, int client) {
+    auto done = std::make_shared<std::atomic<bool>>(false);
+    std::lock_guard lock(workers_mutex_);
+    workers_.push_back({std::thread([this, server, client, done] {
+                            switch (server) {
+                                case Server::kRaw: ServeRaw(client); break;
+                                case Server::kVxi11Core: ServeVxi11(client, false); break;
+                                case Server::kVxi11Abort: ServeVxi11(client, true); break;
+                                case Server::kPortmapper: ServePortmapper(client); break;
+                            }
+                            ::close(client);
+                            *done = true;
+                        }),
+                        done});
+}
+
+void Emulator::ReapWorkers(bool all) {
+    std::list<Worker> finished;
+    {
+        std::lock_guard lock(workers_mutex_);
+        for (auto it = workers_.begin(); it != workers_.end();) {
+            if (all || *it->done) {
+                finished.splice(finished.end(), workers_, it++);
+            } else {
+                ++it;
+            }
+        }
+    }
+    for (Worker& w : finished) w.thread.join();
+}
+
+bool Emulator::WaitReadable(int fd) const {
+    const int timeout = idle_.count() > 0 ? static_cast<int>(idle_.count()) : -1;
     while (!stopping_) {
-        pollfd fds[2] = {{client, POLLIN, 0}, {wake_[0], POLLIN, 0}};
+        pollfd fds[2] = {{fd, POLLIN, 0}, {wake_[0], POLLIN, 0}};
+        const int n = ::poll(fds, 2, timeout);
+        if (n < 0 && errno == EINTR) continue;
+        if (n <= 0 || fds[1].revents != 0) return false;  // failed, idle or stopping
+        return true;
+    }
+    return false;
+}
+
+bool Emulator::WaitWritable(int fd) const {
+    while (!stopping_) {
+        pollfd fds[2] = {{fd, POLLOUT, 0}, {wake_[0], POLLIN, 0}};
         if (::poll(fds, 2, -1) < 0) {
             if (errno == EINTR) continue;
-            return;
+            return false;
         }
-        if (fds[1].revents != 0) return;
+        if (fds[1].revents != 0) return false;
+        if ((fds[0].revents & (POLLERR | POLLHUP)) != 0) return false;
+        if ((fds[0].revents & POLLOUT) != 0) return true;
+    }
+    return false;
+}
+
+bool Emulator::SendAll(int fd, std::string_view bytes) const {
+    std::size_t sent = 0;
+    while (sent < bytes.size()) {
+        const ssize_t n =
+            ::send(fd, bytes.data() + sent, bytes.size() - sent, MSG_NOSIGNAL | MSG_DONTWAIT);
+        if (n > 0) {
+            sent += static_cast<std::size_t>(n);
+            continue;
+        }
+        if (n < 0 && errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) return false;
+        if (!WaitWritable(fd)) return false;
+    }
+    return true;
+}
+
+bool Emulator::SleepInterruptible(std::chrono::milliseconds duration) const {
+    pollfd fd{wake_[0], POLLIN, 0};
+    return ::poll(&fd, 1, static_cast<int>(duration.count())) == 0;
+}
+
+void Emulator::ServeRaw(int client) {
+    MessageFramer framer;
+    std::string chunk(kReadChunk, '\0');
+    while (WaitReadable(client)) {
         const ssize_t n = ::recv(client, chunk.data(), chunk.size(), 0);
         if (n <= 0) return;  // closed by the client or failed
         framer.Append(std::string_view(chunk.data(), static_cast<std::size_t>(n)));
-        // All messages that arrived together run before any reply is sent, so a query
-        // followed by another message without reading its reply is interrupted (-410).
-        while (auto message = framer.Next()) {
-            if (!HandleMessage(*message)) return;
+        std::string reply;
+        const bool keep = RunMessages(framer, &reply);
+        if (!reply.empty()) {
+            const auto delay = reply_delay();
+            if (delay.count() > 0 && !SleepInterruptible(delay)) return;
+            if (!SendAll(client, reply)) return;
         }
-        if (framer.TakeOverrun()) instrument_->Error(err::kInputBufferOverrun);
-        if (instrument_->output_pending() && !SendReply(client, instrument_->TakeOutput())) return;
+        if (!keep) return;
     }
+}
+
+bool Emulator::RunMessages(MessageFramer& framer, std::string* reply) {
+    std::lock_guard lock(instrument_mutex_);
+    // All messages that arrived together run before any reply is sent, so a query followed by
+    // another message without reading its reply is interrupted (-410).
+    bool keep = true;
+    while (auto message = framer.Next()) {
+        if (!HandleMessage(*message)) {
+            keep = false;
+            break;
+        }
+    }
+    if (framer.TakeOverrun()) instrument_->Error(err::kInputBufferOverrun);
+    if (instrument_->output_pending()) *reply = ProduceReply();
+    return keep;
 }
 
 bool Emulator::HandleMessage(const std::string& message) {
@@ -145,59 +295,50 @@ bool Emulator::HandleMessage(const std::string& message) {
     return !drop;
 }
 
-bool Emulator::SendReply(int client, std::string reply) {
-    std::chrono::milliseconds delay;
+std::string Emulator::ProduceReply() {
+    std::string reply = instrument_->TakeOutput();
     bool garble = false;
     {
         std::lock_guard lock(mutex_);
-        delay = faults_.delay;
         if (faults_.garble > 0) {
             --faults_.garble;
             garble = true;
         }
     }
-    if (delay.count() > 0 && !SleepInterruptible(delay)) return false;
     if (garble) {
         // High-bit bytes never form a terminator, so the reply keeps its one line feed.
         for (std::size_t i = 0; i + 1 < reply.size(); ++i) {
             reply[i] = static_cast<char>((reply[i] ^ 0x5A) | 0x80);
         }
     }
-    std::size_t sent = 0;
-    while (sent < reply.size()) {
-        const ssize_t n =
-            ::send(client, reply.data() + sent, reply.size() - sent, MSG_NOSIGNAL | MSG_DONTWAIT);
-        if (n > 0) {
-            sent += static_cast<std::size_t>(n);
-            continue;
-        }
-        if (n < 0 && errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) return false;
-        if (!WaitWritable(client)) return false;
-    }
-    return true;
+    return reply;
 }
 
-bool Emulator::WaitWritable(int fd) {
-    while (!stopping_) {
-        pollfd fds[2] = {{fd, POLLOUT, 0}, {wake_[0], POLLIN, 0}};
-        if (::poll(fds, 2, -1) < 0) {
-            if (errno == EINTR) continue;
-            return false;
-        }
-        if (fds[1].revents != 0) return false;
-        if ((fds[0].revents & (POLLERR | POLLHUP)) != 0) return false;
-        if ((fds[0].revents & POLLOUT) != 0) return true;
-    }
-    return false;
+void Emulator::DeviceClear() {
+    std::lock_guard lock(instrument_mutex_);
+    instrument_->TakeOutput();
 }
 
-bool Emulator::SleepInterruptible(std::chrono::milliseconds duration) {
-    pollfd fd{wake_[0], POLLIN, 0};
-    return ::poll(&fd, 1, static_cast<int>(duration.count())) == 0;
+std::uint8_t Emulator::StatusByte(bool reply_waiting) {
+    std::lock_guard lock(instrument_mutex_);
+    return instrument_->status().StatusByte(instrument_->message_available() || reply_waiting);
+}
+
+std::chrono::milliseconds Emulator::reply_delay() const {
+    std::lock_guard lock(mutex_);
+    return faults_.delay;
 }
 
 void Emulator::LogLocked(const std::string& message) {
-    received_.push_back(message);
+    if (log_limit_ == 0) {
+        ++log_dropped_;
+    } else {
+        while (received_.size() >= log_limit_) {
+            received_.pop_front();
+            ++log_dropped_;
+        }
+        received_.push_back(message);
+    }
     if (log_file_.is_open()) log_file_ << message << '\n' << std::flush;
 }
 
@@ -210,12 +351,26 @@ void Emulator::SetLogFile(const std::string& path) {
 
 std::vector<std::string> Emulator::ReceivedMessages() const {
     std::lock_guard lock(mutex_);
-    return received_;
+    return {received_.begin(), received_.end()};
 }
 
 void Emulator::ClearReceivedMessages() {
     std::lock_guard lock(mutex_);
     received_.clear();
+}
+
+void Emulator::SetLogLimit(std::size_t entries) {
+    std::lock_guard lock(mutex_);
+    log_limit_ = entries;
+    while (received_.size() > log_limit_) {
+        received_.pop_front();
+        ++log_dropped_;
+    }
+}
+
+std::uint64_t Emulator::DroppedLogEntries() const {
+    std::lock_guard lock(mutex_);
+    return log_dropped_;
 }
 
 void Emulator::SetReplyDelay(std::chrono::milliseconds delay) {

@@ -1,6 +1,6 @@
 // The resource manager: parses the resource string and opens the transport
-// for its kind. Only raw sockets have a transport so far; the other kinds
-// parse and then report that the resource cannot be found.
+// for its kind (kTransports); kinds without one parse and then report that
+// the resource cannot be found.
 #include <string>
 
 #include "platform/visa/errors.h"
@@ -16,14 +16,31 @@ constexpr GUID kManagerIid = iid_of<IResourceManager>;
 
 using Opener = HRESULT (*)(const ResourceName&, LONG, std::unique_ptr<Transport>*, std::string*);
 
+// A LAN instrument whose device name starts with "hislip" speaks HiSLIP, any
+// other speaks VXI-11.
+bool IsHislip(const ResourceName& n) {
+    return n.device_name.size() >= 6 && (n.device_name[0] | 0x20) == 'h' &&
+           (n.device_name[1] | 0x20) == 'i' && (n.device_name[2] | 0x20) == 's' &&
+           (n.device_name[3] | 0x20) == 'l' && (n.device_name[4] | 0x20) == 'i' &&
+           (n.device_name[5] | 0x20) == 'p';
+}
+bool Any(const ResourceName&) {
+    return true;
+}
+bool IsVxi11(const ResourceName& n) {
+    return !IsHislip(n);
+}
+
 struct TransportKind {
     int interface_type;
     std::string_view resource_class;
+    bool (*matches)(const ResourceName&);
     Opener open;
 };
 
 constexpr TransportKind kTransports[] = {
-    {kInterfaceTcpip, "SOCKET", OpenSocketTransport},
+    {kInterfaceTcpip, "SOCKET", Any, OpenSocketTransport},
+    {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport},
 };
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {
@@ -49,7 +66,7 @@ class ResourceManager final : public qn::com::ComObject<ResourceManager, IResour
             openTimeout = kDefaultOpenTimeoutMs;
         for (const TransportKind& kind : kTransports) {
             if (kind.interface_type != name->interface_type ||
-                kind.resource_class != name->resource_class)
+                kind.resource_class != name->resource_class || !kind.matches(*name))
                 continue;
             std::unique_ptr<Transport> transport;
             HRESULT hr = kind.open(*name, openTimeout, &transport, &error);

@@ -101,6 +101,25 @@ bool ParseTcpip(std::string_view board, Fields f, ResourceName& r, std::string& 
         return false;
     }
     std::string_view host = f[1];
+    // An INSTR resource may name the port of its server after the host
+    // ("host:port", "[v6]:port"): the VXI-11 core channel without asking the
+    // portmapper.
+    std::string_view port_text;
+    if (cls != "SOCKET") {
+        const std::size_t colon = host.rfind(':');
+        const bool v6 = host.front() == '[';
+        if (colon != std::string_view::npos && (v6 ? colon > 0 && host[colon - 1] == ']'
+                                                   : host.find(':') == colon)) {
+            port_text = host.substr(colon + 1);
+            host = host.substr(0, colon);
+            auto port = Number(port_text, 65535);
+            if (!port || *port == 0 || host.empty()) {
+                err = "invalid port after the host (host:port, port 1..65535)";
+                return false;
+            }
+            r.port = std::uint16_t(*port);
+        }
+    }
     if (host.front() == '[') {
         if (host.back() != ']' || host.size() < 3) {
             err = "invalid IPv6 host";
@@ -242,6 +261,7 @@ std::string ResourceName::Canonical() const {
             std::string h = host.find(':') != std::string::npos ? "[" + host + "]" : host;
             if (resource_class == "SOCKET")
                 return "TCPIP" + b + "::" + h + "::" + std::to_string(port) + "::SOCKET";
+            if (port) h += ":" + std::to_string(port);
             return "TCPIP" + b + "::" + h + "::" + device_name + "::INSTR";
         }
         case 4:

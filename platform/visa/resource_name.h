@@ -4,7 +4,8 @@
 // numbers keep theirs. Accepted forms ([n] is an optional board number):
 //
 //   TCPIP[n]::host::port::SOCKET
-//   TCPIP[n]::host[::device][::INSTR]          device defaults to "inst0"
+//   TCPIP[n]::host[:port][::device][::INSTR]   device defaults to "inst0"; port:
+//                                              the VXI-11 core channel, else the portmapper's
 //   ASRL[n][::INSTR]  and  ASRL/dev/path[::INSTR]
 //   USB[n]::vid::pid::serial[::interface][::INSTR]   vid, pid: 0x hex or decimal
 //   GPIB[n]::primary[::secondary][::INSTR]     addresses 0..30
@@ -25,7 +26,7 @@ struct ResourceName {
     std::string resource_class;  // "INSTR" or "SOCKET"
     // TCPIP
     std::string host;         // without IPv6 brackets
-    std::uint16_t port = 0;   // SOCKET only
+    std::uint16_t port = 0;   // SOCKET; INSTR when given after the host (0: not given)
     std::string device_name;  // INSTR only ("inst0", "hislip0", ...)
     // ASRL
     std::string device_path;  // "/dev/ttyUSB0" for ASRL/dev/...; empty for ASRLn

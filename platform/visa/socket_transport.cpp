@@ -13,8 +13,6 @@
 // rest of a reply after a timeout), so that it is not taken for the answer to
 // what is written now. A reply that arrives after that point cannot be told
 // apart from the new one: the protocol has no message ids.
-#include <fcntl.h>
-#include <netdb.h>
 #include <netinet/in.h>
 #include <netinet/tcp.h>
 #include <poll.h>
@@ -23,14 +21,12 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <condition_variable>
 #include <cstring>
-#include <mutex>
-#include <thread>
 #include <vector>
 
 #include "platform/visa/ieee488.h"
 #include "platform/visa/resource_name.h"
+#include "platform/visa/tcp_connect.h"
 #include "platform/visa/transport.h"
 
 namespace qn::visa {
@@ -42,110 +38,6 @@ constexpr std::size_t kBufferSize = 64 * 1024;
 constexpr std::size_t kDirectReadMin = 4096;
 // DiscardInput stops after this much, should the peer never pause.
 constexpr std::size_t kMaxDiscard = 256u * 1024 * 1024;
-
-std::string ErrnoText(int err) {
-    return std::strerror(err);
-}
-
-struct AddrInfoFree {
-    void operator()(addrinfo* p) const {
-        if (p) freeaddrinfo(p);
-    }
-};
-using AddrList = std::unique_ptr<addrinfo, AddrInfoFree>;
-
-// Name resolution on a helper thread, so that a slow resolver cannot hold
-// Open past its timeout. The thread owns its share of the state and ends on
-// its own when the resolver returns.
-struct ResolveState {
-    std::mutex m;
-    std::condition_variable cv;
-    bool done = false;
-    int rc = 0;
-    AddrList list;
-};
-
-int Resolve(const std::string& host, std::uint16_t port, const Deadline& deadline, AddrList* out,
-            std::string* error) {
-    addrinfo hints{};
-    hints.ai_family = AF_UNSPEC;
-    hints.ai_socktype = SOCK_STREAM;
-    hints.ai_flags = AI_NUMERICSERV | AI_NUMERICHOST;
-    const std::string service = std::to_string(port);
-    addrinfo* res = nullptr;
-    if (getaddrinfo(host.c_str(), service.c_str(), &hints, &res) == 0) {
-        out->reset(res);
-        return 0;
-    }
-    auto st = std::make_shared<ResolveState>();
-    hints.ai_flags = AI_NUMERICSERV | AI_ADDRCONFIG;
-    std::thread([st, host, service, hints] {
-        addrinfo* r = nullptr;
-        int rc = getaddrinfo(host.c_str(), service.c_str(), &hints, &r);
-        std::lock_guard<std::mutex> lock(st->m);
-        st->rc = rc;
-        st->list.reset(rc == 0 ? r : nullptr);
-        st->done = true;
-        st->cv.notify_all();
-    }).detach();
-    std::unique_lock<std::mutex> lock(st->m);
-    for (;;) {
-        if (st->done) break;
-        if (deadline.infinite()) {
-            st->cv.wait(lock);
-        } else if (st->cv.wait_for(lock, std::chrono::milliseconds(deadline.PollMs())) ==
-                       std::cv_status::timeout &&
-                   deadline.Expired() && !st->done) {
-            *error = "resolving host '" + host + "' timed out";
-            return -1;
-        }
-    }
-    if (st->rc != 0) {
-        *error = "unknown host '" + host + "': " + gai_strerror(st->rc);
-        return -1;
-    }
-    *out = std::move(st->list);
-    return 0;
-}
-
-class FdHolder {
-  public:
-    explicit FdHolder(int fd = -1) : fd_(fd) {}
-    FdHolder(const FdHolder&) = delete;
-    FdHolder& operator=(const FdHolder&) = delete;
-    ~FdHolder() { reset(); }
-    int get() const { return fd_; }
-    int release() { return std::exchange(fd_, -1); }
-    void reset(int fd = -1) {
-        if (fd_ >= 0) ::close(fd_);
-        fd_ = fd;
-    }
-
-  private:
-    int fd_;
-};
-
-// Non-blocking connect to one address; 0 or an errno value (ETIMEDOUT when
-// the deadline passed).
-int ConnectOne(const addrinfo* a, const Deadline& deadline, FdHolder* fd) {
-    fd->reset(
-        ::socket(a->ai_family, a->ai_socktype | SOCK_NONBLOCK | SOCK_CLOEXEC, a->ai_protocol));
-    if (fd->get() < 0) return errno;
-    if (::connect(fd->get(), a->ai_addr, a->ai_addrlen) == 0) return 0;
-    if (errno != EINPROGRESS) return errno;
-    pollfd p{fd->get(), POLLOUT, 0};
-    for (;;) {
-        int n = ::poll(&p, 1, deadline.PollMs());
-        if (n < 0 && errno == EINTR) continue;
-        if (n < 0) return errno;
-        if (n == 0) return ETIMEDOUT;
-        break;
-    }
-    int err = 0;
-    socklen_t len = sizeof err;
-    if (::getsockopt(fd->get(), SOL_SOCKET, SO_ERROR, &err, &len) != 0) return errno;
-    return err;
-}
 
 class SocketTransport final : public Transport {
   public:
@@ -281,33 +173,7 @@ HRESULT SocketTransport::Write(const BYTE* data, std::size_t size, bool /*send_e
     // Whatever arrived unasked (a stray line, the late rest of an earlier
     // reply) must not pass for the reply to what is written now.
     DiscardInput();
-    while (*written < size) {
-        ssize_t r = ::send(fd_.get(), data + *written, size - *written, MSG_NOSIGNAL);
-        if (r >= 0) {
-            *written += std::size_t(r);
-            continue;
-        }
-        if (errno == EINTR) continue;
-        if (errno == EPIPE || errno == ECONNRESET) {
-            *error = "connection to " + peer_ + " lost while writing";
-            return E_VISA_CONNECTION_LOST;
-        }
-        if (errno != EAGAIN && errno != EWOULDBLOCK) {
-            *error = "send to " + peer_ + " failed: " + ErrnoText(errno);
-            return E_VISA_IO;
-        }
-        pollfd p{fd_.get(), POLLOUT, 0};
-        int k = ::poll(&p, 1, deadline.PollMs());
-        if (k < 0 && errno != EINTR) {
-            *error = "poll failed: " + ErrnoText(errno);
-            return E_VISA_IO;
-        }
-        if (k == 0) {
-            *error = "timeout writing to " + peer_;
-            return E_VISA_TIMEOUT;
-        }
-    }
-    return S_OK;
+    return SendAll(fd_.get(), data, size, deadline, peer_, written, error);
 }
 
 void SocketTransport::DiscardInput() {
@@ -349,26 +215,13 @@ HRESULT SocketTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
 
 HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
                             std::unique_ptr<Transport>* out, std::string* error) {
-    const Deadline deadline = Deadline::FromTimeout(open_timeout_ms);
-    const std::string peer = name.host + ":" + std::to_string(name.port);
-    AddrList list;
-    if (Resolve(name.host, name.port, deadline, &list, error) != 0)
-        return E_VISA_RESOURCE_NOT_FOUND;
-    int err = ENOENT;
-    for (const addrinfo* a = list.get(); a; a = a->ai_next) {
-        FdHolder fd;
-        err = ConnectOne(a, deadline, &fd);
-        if (err == 0) {
-            int one = 1;
-            ::setsockopt(fd.get(), IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-            *out = std::make_unique<SocketTransport>(fd.release(), peer);
-            return S_OK;
-        }
-        if (err == ETIMEDOUT) break;
-    }
-    *error = err == ETIMEDOUT ? "connecting to " + peer + " timed out"
-                              : "cannot connect to " + peer + ": " + ErrnoText(err);
-    return E_VISA_RESOURCE_NOT_FOUND;
+    FdHolder fd;
+    HRESULT hr =
+        ConnectTcp(name.host, name.port, Deadline::FromTimeout(open_timeout_ms), &fd, error);
+    if (FAILED(hr)) return hr;
+    *out = std::make_unique<SocketTransport>(fd.release(),
+                                             name.host + ":" + std::to_string(name.port));
+    return S_OK;
 }
 
 }  // namespace qn::visa

@@ -55,4 +55,10 @@ class Transport {
 HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
                             std::unique_ptr<Transport>* out, std::string* error);
 
+// The VXI-11 transport (vxi11_transport.cpp): the core channel of a
+// TCPIP INSTR resource, found through the host's portmapper unless the
+// resource names its port.
+HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
+                           std::unique_ptr<Transport>* out, std::string* error);
+
 }  // namespace qn::visa

@@ -3,6 +3,7 @@
 
 #include <stdexcept>
 #include <thread>
+#include <vector>
 
 #include "emulator/emulator.h"
 #include "tests/emulator/scpi_client.h"
@@ -176,12 +177,35 @@ TEST_F(EmulatorCore, ForcedEventBitsAppearInEveryEventRead) {
     EXPECT_EQ(c().Query("*ESR?"), "0");
 }
 
-TEST_F(EmulatorCore, ClientsAreServedOneAfterAnother) {
-    client_->Close();
-    for (int i = 0; i < 3; ++i) {
-        ScpiClient client(port_);
-        EXPECT_EQ(client.Query("*TST?"), "0");
-    }
+// Clients connected at the same time are all served, a burst of them too,
+// and they share the one instrument.
+TEST_F(EmulatorCore, ClientsAreServedAtTheSameTime) {
+    std::vector<std::unique_ptr<ScpiClient>> burst;
+    for (int i = 0; i < 40; ++i) burst.push_back(std::make_unique<ScpiClient>(port_));
+    EXPECT_EQ(c().Query("*ESE 36;*ESE?"), "36");
+    for (auto& other : burst) EXPECT_EQ(other->Query("*ESE?"), "36");
+}
+
+// The log keeps the newest messages up to its limit and counts the others.
+TEST_F(EmulatorCore, MessageLogIsBoundedAndCountsWhatItDropped) {
+    emu_.ClearReceivedMessages();
+    emu_.SetLogLimit(3);
+    const std::uint64_t before = emu_.DroppedLogEntries();
+    for (const char* m : {"*ESE 1", "*ESE 2", "*ESE 3", "*ESE 4"}) c().Send(m);
+    EXPECT_EQ(c().Query("*ESE?"), "4");
+    EXPECT_EQ(emu_.ReceivedMessages(), (std::vector<std::string>{"*ESE 3", "*ESE 4", "*ESE?"}));
+    EXPECT_EQ(emu_.DroppedLogEntries() - before, 2u);
+}
+
+TEST(EmulatorSetup, IdleClientsAreClosed) {
+    Emulator emu("QDS2014A");
+    emu.SetIdleTimeout(std::chrono::milliseconds(100));
+    const std::uint16_t port = emu.Start();
+    ScpiClient idle(port);
+    EXPECT_EQ(idle.Query("*TST?"), "0");
+    EXPECT_TRUE(idle.PeerClosed());  // waits well past the idle time
+    ScpiClient fresh(port);
+    EXPECT_EQ(fresh.Query("*TST?"), "0");
 }
 
 TEST_F(EmulatorCore, StopReturnsWhileAClientIsConnectedAndIsIdempotent) {

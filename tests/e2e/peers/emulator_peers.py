@@ -1,6 +1,13 @@
-"""Drives qn731xx-emulator with independent SCPI clients: pyvisa (pyvisa-py raw socket
-backend) and lxi-tools. Usage: emulator_peers.py <path to qn731xx-emulator>"""
+"""Drives qn731xx-emulator with independent SCPI clients: pyvisa (pyvisa-py backend) and
+lxi-tools, over the raw socket and over VXI-11. Usage: emulator_peers.py <path to
+qn731xx-emulator>
+
+The VXI-11 clients find the core channel through the portmapper on port 111, so the emulator
+serves one there when this runs as root and the port is free; otherwise the VXI-11 checks are
+skipped, and the output says so and why."""
+import os
 import shutil
+import socket
 import subprocess
 import sys
 
@@ -17,21 +24,43 @@ def check(what, got, expected):
         passed[0] += 1
 
 
-def start(emulator):
-    proc = subprocess.Popen([emulator, "--model", "QDS2014A", "--port", "0"],
+def start(emulator, *extra):
+    proc = subprocess.Popen([emulator, "--model", "QDS2014A", "--port", "0", *extra],
                             stdout=subprocess.PIPE, text=True)
-    line = proc.stdout.readline().strip()
-    prefix = "listening on 127.0.0.1:"
-    if not line.startswith(prefix):
-        proc.kill()
-        sys.exit(f"unexpected first line {line!r}")
-    return proc, int(line[len(prefix):])
+    ports = {}
+    expected = ["listening"]
+    if "--vxi11" in extra:
+        expected.append("vxi11 listening")
+    if "--portmapper" in extra:
+        expected.append("portmapper listening")
+    for name in expected:
+        line = proc.stdout.readline().strip()
+        prefix = name + " on 127.0.0.1:"
+        if not line.startswith(prefix):
+            proc.kill()
+            sys.exit(f"unexpected line {line!r}, expected {prefix!r}...")
+        ports[name.split()[0]] = int(line[len(prefix):])
+    return proc, ports
 
 
-def drive_with_pyvisa(port):
+def portmapper_port_free():
+    """Why port 111 cannot be served here, or None when it can."""
+    if os.geteuid() != 0:
+        return "not running as root"
+    for kind in (socket.SOCK_STREAM, socket.SOCK_DGRAM):
+        with socket.socket(socket.AF_INET, kind) as s:
+            s.setsockopt(socket.SOL_SOCKET, socket.SO_REUSEADDR, 1)
+            try:
+                s.bind(("127.0.0.1", 111))
+            except OSError as e:
+                return f"port 111 is in use ({e.strerror})"
+    return None
+
+
+def drive_with_pyvisa(resource):
     rm = pyvisa.ResourceManager("@py")
-    inst = rm.open_resource(f"TCPIP0::127.0.0.1::{port}::SOCKET",
-                            read_termination="\n", write_termination="\n", timeout=10000)
+    inst = rm.open_resource(resource, read_termination="\n", write_termination="\n",
+                            timeout=10000)
     idn = inst.query("*IDN?").split(",")
     check("IDN maker/model", idn[:2], ["QUORLEN TECHNOLOGIES", "QDS2014A"])
     inst.write("*CLS")
@@ -56,26 +85,44 @@ def drive_with_pyvisa(port):
     rm.close()
 
 
-def drive_with_lxi(port):
+def drive_with_lxi(port=None):
+    """lxi scpi over the raw socket on port, or over VXI-11 when port is None."""
     lxi = shutil.which("lxi")
     if lxi is None:
         failures.append("lxi not installed")
         return
-    out = subprocess.run([lxi, "scpi", "-a", "127.0.0.1", "-p", str(port), "-r", "-t", "10",
-                          "*IDN?"], capture_output=True, text=True, timeout=60)
+    raw = ["-p", str(port), "-r"] if port else []
+    out = subprocess.run([lxi, "scpi", "-a", "127.0.0.1", *raw, "-t", "10", "*IDN?"],
+                         capture_output=True, text=True, timeout=60)
     check("lxi exit status", out.returncode, 0)
     check("lxi IDN", out.stdout.strip().split(",")[:2], ["QUORLEN TECHNOLOGIES", "QDS2014A"])
 
 
 def main():
-    proc, port = start(sys.argv[1])
+    proc, ports = start(sys.argv[1])
     try:
-        drive_with_pyvisa(port)
-        drive_with_lxi(port)
+        drive_with_pyvisa(f"TCPIP0::127.0.0.1::{ports['listening']}::SOCKET")
+        drive_with_lxi(ports["listening"])
     finally:
         proc.terminate()
         proc.wait(timeout=30)
     check("emulator exit status", proc.returncode, 0)
+
+    why_not = portmapper_port_free()
+    if why_not:
+        print(f"SKIPPED: the VXI-11 checks with pyvisa-py and lxi need the portmapper on port "
+              f"111, and {why_not}")
+    else:
+        proc, ports = start(sys.argv[1], "--vxi11", "--portmapper")
+        try:
+            check("portmapper port", ports["portmapper"], 111)
+            drive_with_pyvisa("TCPIP0::127.0.0.1::inst0::INSTR")
+            drive_with_lxi()
+        finally:
+            proc.terminate()
+            proc.wait(timeout=30)
+        check("emulator exit status (VXI-11)", proc.returncode, 0)
+
     for f in failures:
         print("FAIL:", f)
     print(f"{passed[0]} passed, {len(failures)} failed")

@@ -1,0 +1,385 @@
+// VXI-11 transport (TCPIP[n]::host[:port][::name]::INSTR, name "inst0" by
+// default): ONC RPC calls on the device's core channel.
+//
+// - The core channel's port comes from the resource string or, when it has
+//   none, from the host's portmapper (port 111).
+// - Every call carries the time left of the operation's deadline as the
+//   device's I/O timeout; the wait for the reply ends a short grace after
+//   that deadline, so a device that never answers is a timeout too.
+// - Replies are matched by transaction id: the late reply of a call that
+//   timed out is dropped, never taken for the reply of a later call.
+// - Records are bounded before they are held; a reply that breaks the
+//   protocol (a giant record, a short or garbled one) ends the connection,
+//   and later calls fail cleanly.
+// - device_write is split at the device's maxRecvSize, END on the last
+//   piece; device_read ends at END, at the termination character when it is
+//   enabled, or at the count.
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
+#include <cstring>
+#include <random>
+#include <vector>
+
+#include "platform/visa/onc_rpc.h"
+#include "platform/visa/resource_name.h"
+#include "platform/visa/tcp_connect.h"
+#include "platform/visa/transport.h"
+#include "platform/visa/vxi11_protocol.h"
+
+namespace qn::visa {
+namespace {
+
+using namespace qn::vxi11;
+
+constexpr std::uint16_t kPortmapPort = 111;
+// The largest read asked for in one call, and the bound of a reply record.
+constexpr std::uint32_t kMaxReadRequest = 8u << 20;
+constexpr std::size_t kMaxRecord = kMaxReadRequest + 1024;
+// How long after the deadline a reply is still awaited (the device reports
+// its own timeout at the deadline).
+constexpr auto kReplyGrace = std::chrono::milliseconds(250);
+// Setting up and tearing down a link.
+constexpr LONG kCloseTimeoutMs = 300;
+constexpr std::uint32_t kInfiniteIoTimeout = 0xFFFFFFFFu;
+
+std::uint32_t IoTimeout(const Deadline& d) {
+    const int ms = d.PollMs();
+    return ms < 0 ? kInfiniteIoTimeout : std::uint32_t(ms);
+}
+
+const char* DeviceErrorText(std::int32_t e) {
+    switch (e) {
+        case kSyntaxError: return "syntax error";
+        case kNotAccessible: return "device not accessible";
+        case kInvalidLinkId: return "invalid link identifier";
+        case kParameterError: return "parameter error";
+        case kNotSupported: return "operation not supported";
+        case kOutOfResources: return "out of resources";
+        case kLockedByAnother: return "device locked by another link";
+        case kNoLockHeld: return "no lock held by this link";
+        case kIoTimeout: return "I/O timeout";
+        case kIoError: return "I/O error";
+        case kAbort: return "aborted";
+        default: return "device error";
+    }
+}
+
+// One RPC client connection: calls of one program and version.
+class RpcConnection {
+  public:
+    RpcConnection(int fd, std::string peer, std::uint32_t program, std::uint32_t version)
+        : fd_(fd), peer_(std::move(peer)), program_(program), version_(version),
+          reader_(kMaxRecord), rx_(64 * 1024) {
+        std::random_device rd;
+        xid_ = rd();
+    }
+
+    // Calls procedure with args; on success *results views the results in
+    // *record. The wait for the reply ends by `until`.
+    HRESULT Call(std::uint32_t procedure, const std::string& args, const Deadline& until,
+                 std::string* record, std::string_view* results, std::string* error) {
+        if (fd_.get() < 0) {
+            *error = "connection to " + peer_ + " closed after a protocol error";
+            return E_VISA_CONNECTION_LOST;
+        }
+        const std::uint32_t xid = ++xid_;
+        const std::string call = rpc::FrameRecord(rpc::BuildCall(xid, program_, version_,
+                                                                 procedure, args));
+        std::size_t sent = 0;
+        HRESULT hr = SendAll(fd_.get(), call.data(), call.size(), until, peer_, &sent, error);
+        if (FAILED(hr)) return Broken(hr, sent > 0 && sent < call.size());
+        for (;;) {
+            // Records already received first, then more from the wire.
+            std::string_view input(pending_);
+            rpc::RecordReader::Status st = reader_.Feed(&input, record);
+            pending_.erase(0, pending_.size() - input.size());
+            if (st == rpc::RecordReader::Status::kTooLarge) {
+                *error = "reply record from " + peer_ + " exceeds " + std::to_string(kMaxRecord) +
+                         " bytes";
+                return Broken(E_VISA_IO, true);
+            }
+            if (st == rpc::RecordReader::Status::kRecord) {
+                std::uint32_t rxid = 0;
+                rpc::AcceptStat stat = rpc::kSuccess;
+                rpc::ReplyStatus rs = rpc::ParseReply(*record, &rxid, &stat, results);
+                if (rs == rpc::ReplyStatus::kMalformed) {
+                    *error = "malformed RPC reply from " + peer_;
+                    return Broken(E_VISA_IO, true);
+                }
+                if (rxid != xid) continue;  // the late reply of an earlier call
+                if (rs == rpc::ReplyStatus::kDenied || stat != rpc::kSuccess) {
+                    *error = "RPC call " + std::to_string(procedure) + " refused by " + peer_ +
+                             " (status " + std::to_string(int(stat)) + ")";
+                    return E_VISA_IO;
+                }
+                return S_OK;
+            }
+            std::size_t got = 0;
+            hr = RecvSome(fd_.get(), rx_.data(), rx_.size(), until, peer_, &got, error);
+            if (FAILED(hr)) return Broken(hr, hr != E_VISA_TIMEOUT);
+            pending_.assign(rx_.data(), got);
+        }
+    }
+
+    void Close() { fd_.reset(); }
+
+  private:
+    HRESULT Broken(HRESULT hr, bool close) {
+        if (close) Close();
+        return hr;
+    }
+
+    FdHolder fd_;
+    std::string peer_;
+    std::uint32_t program_, version_;
+    std::uint32_t xid_ = 0;
+    rpc::RecordReader reader_;
+    std::vector<char> rx_;
+    std::string pending_;  // received and not yet fed to the reader
+};
+
+Deadline WithGrace(const Deadline& d) {
+    if (d.infinite()) return d;
+    return Deadline::FromTimeout(LONG(d.PollMs() + kReplyGrace.count()));
+}
+
+class Vxi11Transport final : public Transport {
+  public:
+    Vxi11Transport(std::unique_ptr<RpcConnection> core, std::string peer)
+        : core_(std::move(core)), peer_(std::move(peer)) {}
+    ~Vxi11Transport() override { Close(); }
+
+    HRESULT CreateLink(const std::string& device, const Deadline& deadline, std::string* error);
+
+    HRESULT Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
+                 std::string* error) override;
+    HRESULT Write(const BYTE* data, std::size_t size, bool send_end, const Deadline& deadline,
+                  std::size_t* written, std::string* error) override;
+    HRESULT Clear(const Deadline& deadline, std::string* error) override;
+    HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) override;
+    // Each read is a request: nothing arrives unasked.
+    void DiscardInput() override {}
+    void Close() override;
+    bool HasEnd() const override { return true; }
+
+  private:
+    // A call whose results start with a device error code.
+    HRESULT DeviceCall(std::uint32_t procedure, const std::string& args, const Deadline& deadline,
+                       rpc::XdrReader* results, std::string* error);
+    std::string GenericParms(const Deadline& deadline) const;
+
+    std::unique_ptr<RpcConnection> core_;
+    std::string peer_;
+    std::string record_;
+    std::int32_t lid_ = -1;
+    std::uint32_t max_recv_ = 1024;
+};
+
+HRESULT Vxi11Transport::DeviceCall(std::uint32_t procedure, const std::string& args,
+                                   const Deadline& deadline, rpc::XdrReader* results,
+                                   std::string* error) {
+    std::string_view res;
+    HRESULT hr = core_->Call(procedure, args, WithGrace(deadline), &record_, &res, error);
+    if (FAILED(hr)) {
+        if (hr == E_VISA_TIMEOUT) *error = "timeout waiting for " + peer_;
+        return hr;
+    }
+    *results = rpc::XdrReader(res);
+    std::int32_t dev_error = 0;
+    if (!results->I32(&dev_error)) {
+        *error = "short reply from " + peer_;
+        core_->Close();
+        return E_VISA_IO;
+    }
+    if (dev_error == kNoError) return S_OK;
+    *error = std::string(DeviceErrorText(dev_error)) + " (VXI-11 error " +
+             std::to_string(dev_error) + ") from " + peer_;
+    return dev_error == kIoTimeout ? E_VISA_TIMEOUT : E_VISA_IO;
+}
+
+std::string Vxi11Transport::GenericParms(const Deadline& deadline) const {
+    rpc::XdrWriter w;
+    w.I32(lid_);
+    w.U32(0);  // flags
+    w.U32(IoTimeout(deadline));  // lock timeout
+    w.U32(IoTimeout(deadline));  // I/O timeout
+    return std::move(w.data());
+}
+
+HRESULT Vxi11Transport::CreateLink(const std::string& device, const Deadline& deadline,
+                                   std::string* error) {
+    rpc::XdrWriter w;
+    w.I32(std::int32_t(::getpid() & 0x7fffffff));  // client id
+    w.Bool(false);                                  // no lock
+    w.U32(0);                                       // lock timeout
+    w.Opaque(device);
+    rpc::XdrReader r("");
+    HRESULT hr = DeviceCall(kCreateLink, w.data(), deadline, &r, error);
+    if (FAILED(hr)) return hr;
+    std::uint32_t abort_port = 0;
+    if (!r.I32(&lid_) || !r.U32(&abort_port) || !r.U32(&max_recv_)) {
+        *error = "short create_link reply from " + peer_;
+        return E_VISA_IO;
+    }
+    // A device that takes less than a byte per call could not be written to.
+    max_recv_ = std::clamp<std::uint32_t>(max_recv_, 1, kMaxReadRequest);
+    return S_OK;
+}
+
+HRESULT Vxi11Transport::Write(const BYTE* data, std::size_t size, bool send_end,
+                              const Deadline& deadline, std::size_t* written,
+                              std::string* error) {
+    *written = 0;
+    do {
+        const std::size_t piece = std::min<std::size_t>(size - *written, max_recv_);
+        const bool last = *written + piece == size;
+        rpc::XdrWriter w;
+        w.data().reserve(piece + 32);
+        w.I32(lid_);
+        w.U32(IoTimeout(deadline));
+        w.U32(IoTimeout(deadline));
+        w.U32(last && send_end ? kFlagEnd : 0);
+        w.Opaque({reinterpret_cast<const char*>(data) + *written, piece});
+        rpc::XdrReader r("");
+        HRESULT hr = DeviceCall(kDeviceWrite, w.data(), deadline, &r, error);
+        if (FAILED(hr)) return hr;
+        std::uint32_t accepted = 0;
+        if (!r.U32(&accepted) || accepted > piece) {
+            *error = "bad device_write reply from " + peer_;
+            return E_VISA_IO;
+        }
+        if (accepted == 0 && piece > 0) {
+            *error = "device at " + peer_ + " accepted no data";
+            return E_VISA_IO;
+        }
+        *written += accepted;
+    } while (*written < size);
+    return S_OK;
+}
+
+HRESULT Vxi11Transport::Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
+                             std::string* error) {
+    *result = ReadResult{};
+    if (req.count == 0) return S_OK;
+    while (result->bytes < req.count) {
+        const std::uint32_t want =
+            std::uint32_t(std::min<std::size_t>(req.count - result->bytes, kMaxReadRequest));
+        rpc::XdrWriter w;
+        w.I32(lid_);
+        w.U32(want);
+        w.U32(IoTimeout(deadline));
+        w.U32(IoTimeout(deadline));
+        w.U32(req.term_char_enabled ? kFlagTermCharSet : 0);
+        w.U32(req.term_char);
+        rpc::XdrReader r("");
+        HRESULT hr = DeviceCall(kDeviceRead, w.data(), deadline, &r, error);
+        if (FAILED(hr)) return hr;
+        std::uint32_t reason = 0;
+        std::string_view data;
+        if (!r.U32(&reason) || !r.Opaque(&data, want)) {
+            *error = "bad device_read reply from " + peer_;
+            core_->Close();
+            return E_VISA_IO;
+        }
+        if (!data.empty()) std::memcpy(req.buf + result->bytes, data.data(), data.size());
+        result->bytes += data.size();
+        if (reason & kReasonEnd) {
+            result->end = kReadEndEnd;
+            return S_OK;
+        }
+        if ((reason & kReasonTermChar) && req.term_char_enabled) {
+            result->end = kReadEndTermChar;
+            return S_OK;
+        }
+        if (req.return_available && result->bytes > 0) {
+            result->end = kReadEndAvailable;
+            return S_OK;
+        }
+    }
+    result->end = kReadEndCount;
+    return S_OK;
+}
+
+HRESULT Vxi11Transport::Clear(const Deadline& deadline, std::string* error) {
+    rpc::XdrReader r("");
+    return DeviceCall(kDeviceClear, GenericParms(deadline), deadline, &r, error);
+}
+
+HRESULT Vxi11Transport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) {
+    rpc::XdrReader r("");
+    HRESULT hr = DeviceCall(kDeviceReadStb, GenericParms(deadline), deadline, &r, error);
+    if (FAILED(hr)) return hr;
+    std::uint32_t v = 0;
+    if (!r.U32(&v)) {
+        *error = "short device_readstb reply from " + peer_;
+        return E_VISA_IO;
+    }
+    *stb = BYTE(v);
+    return S_OK;
+}
+
+void Vxi11Transport::Close() {
+    if (!core_) return;
+    if (lid_ >= 0) {
+        rpc::XdrWriter w;
+        w.I32(lid_);
+        rpc::XdrReader r("");
+        std::string ignored;
+        DeviceCall(kDestroyLink, w.data(), Deadline::FromTimeout(kCloseTimeoutMs), &r, &ignored);
+        lid_ = -1;
+    }
+    core_.reset();
+}
+
+// The core channel's port from the portmapper of host.
+HRESULT PortFromPortmapper(const std::string& host, const Deadline& deadline, std::uint16_t* port,
+                           std::string* error) {
+    FdHolder fd;
+    HRESULT hr = ConnectTcp(host, kPortmapPort, deadline, &fd, error);
+    if (FAILED(hr)) {
+        *error = "no portmapper: " + *error;
+        return hr;
+    }
+    RpcConnection pm(fd.release(), host + ":111", rpc::kPortmapProgram, rpc::kPortmapVersion);
+    rpc::XdrWriter w;
+    for (std::uint32_t v : {kCoreProgram, kVersion, rpc::kProtocolTcp, 0u}) w.U32(v);
+    std::string record;
+    std::string_view results;
+    hr = pm.Call(rpc::kPortmapGetPort, w.data(), deadline, &record, &results, error);
+    if (FAILED(hr)) return E_VISA_RESOURCE_NOT_FOUND;
+    rpc::XdrReader r(results);
+    std::uint32_t p = 0;
+    if (!r.U32(&p) || p == 0 || p > 65535) {
+        *error = "no VXI-11 server registered with the portmapper of " + host;
+        return E_VISA_RESOURCE_NOT_FOUND;
+    }
+    *port = std::uint16_t(p);
+    return S_OK;
+}
+
+}  // namespace
+
+HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
+                           std::unique_ptr<Transport>* out, std::string* error) {
+    const Deadline deadline = Deadline::FromTimeout(open_timeout_ms);
+    std::uint16_t port = name.port;
+    HRESULT hr = port ? S_OK : PortFromPortmapper(name.host, deadline, &port, error);
+    if (FAILED(hr)) return hr;
+    FdHolder fd;
+    hr = ConnectTcp(name.host, port, deadline, &fd, error);
+    if (FAILED(hr)) return hr;
+    const std::string peer = name.host + ":" + std::to_string(port);
+    auto transport = std::make_unique<Vxi11Transport>(
+        std::make_unique<RpcConnection>(fd.release(), peer, kCoreProgram, kVersion), peer);
+    hr = transport->CreateLink(name.device_name, deadline, error);
+    if (FAILED(hr)) {
+        *error = "create_link '" + name.device_name + "': " + *error;
+        return E_VISA_RESOURCE_NOT_FOUND;
+    }
+    *out = std::move(transport);
+    return S_OK;
+}
+
+}  // namespace qn::visa

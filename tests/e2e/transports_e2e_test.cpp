@@ -1,0 +1,82 @@
+// One end-to-end flow over every transport the emulator serves: identify,
+// configure, capture and fetch a waveform, measure, with the status check on.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <vector>
+
+#include "Quorlen731XXErrors.h"
+#include "core/root.h"
+#include "emulator/emulator.h"
+#include "io/io_manager.h"
+
+namespace qn::test {
+namespace {
+
+enum class Transport { kSocket, kVxi11 };
+
+std::string ErrorText() {
+    com::ErrorRecord rec;
+    return com::TakeThreadError(&rec) ? rec.description : std::string();
+}
+
+class FlowOverTransport : public ::testing::TestWithParam<Transport> {
+  protected:
+    void SetUp() override {
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        emu_.EnableVxi11();
+        const std::uint16_t raw = emu_.Start();
+        resource_ = GetParam() == Transport::kSocket
+                        ? "TCPIP0::127.0.0.1::" + std::to_string(raw) + "::SOCKET"
+                        : "TCPIP0::127.0.0.1:" + std::to_string(emu_.vxi11_port()) +
+                              "::inst0::INSTR";
+    }
+    emu::Emulator emu_{"QDS4032A"};
+    std::string resource_;
+};
+
+TEST_P(FlowOverTransport, IdentifyConfigureCaptureFetchMeasure) {
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    com::Bstr r(resource_), o("QueryInstrStatus=true");
+    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_TRUE, VARIANT_TRUE, o.get()), S_OK)
+        << ErrorText();
+    com::Bstr model;
+    ASSERT_EQ(driver->get_InstrumentModel(model.Out()), S_OK);
+    EXPECT_EQ(model.utf8(), "QDS4032A");
+
+    ComPtr<IIviScopeAcquisition> acq;
+    ASSERT_EQ(ComPtr<IIviDriver>(driver.get()).As(acq), S_OK);
+    ASSERT_EQ(acq->put_TimePerRecord(0.002), S_OK) << ErrorText();
+    double tpr = 0;
+    ASSERT_EQ(acq->get_TimePerRecord(&tpr), S_OK);
+    EXPECT_DOUBLE_EQ(tpr, 0.002);
+
+    ComPtr<IIviScopeMeasurement> ch1;
+    com::Bstr name("Channel1");
+    ASSERT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(name.get(), ch1.Out()),
+              S_OK);
+    SAFEARRAY* a = nullptr;
+    double x0 = 0, dx = 0;
+    ASSERT_EQ(ch1->ReadWaveform(5000, &a, &x0, &dx), S_OK) << ErrorText();
+    com::SafeArray wave(a);
+    EXPECT_GT(wave.size(), 100u);
+    EXPECT_GT(dx, 0.0);
+    double vpp = 0;
+    ASSERT_EQ(ch1->FetchWaveformMeasurement(IviScopeMeasurementVoltagePeakToPeak, &vpp), S_OK)
+        << ErrorText();
+    EXPECT_GT(vpp, 0.0);
+
+    std::string idn;
+    EXPECT_EQ(qn::Io(*driver.get()).InstrQuery("*IDN?", &idn, 256), S_OK);
+    EXPECT_EQ(idn.rfind("QUORLEN TECHNOLOGIES,QDS4032A,", 0), 0u) << idn;
+    EXPECT_EQ(driver->Close(), S_OK);
+}
+
+INSTANTIATE_TEST_SUITE_P(Transports, FlowOverTransport,
+                         ::testing::Values(Transport::kSocket, Transport::kVxi11),
+                         [](const auto& p) {
+                             return p.param == Transport::kSocket ? "Socket" : "Vxi11";
+                         });
+
+}  // namespace
+}  // namespace qn::test
