@@ -235,7 +235,9 @@ TEST(SocketSessionTest, OpenFailuresAreCleanAndExplained) {
     const OpenCase kCases[] = {
         {"TCPIP0::127.0.0.1::" + closed_port + "::SOCKET", E_VISA_RESOURCE_NOT_FOUND, "connect"},
         {"TCPIP0::no-such-host.invalid::5025::SOCKET", E_VISA_RESOURCE_NOT_FOUND, "unknown host"},
-        {"TCPIP0::127.0.0.1::inst0::INSTR", E_VISA_RESOURCE_NOT_FOUND, "no transport"},
+        {"TCPIP0::127.0.0.1:" + closed_port + "::inst0::INSTR", E_VISA_RESOURCE_NOT_FOUND,
+         "connect"},
+        {"TCPIP0::127.0.0.1::hislip0::INSTR", E_VISA_RESOURCE_NOT_FOUND, "no transport"},
         {"GPIB0::7::INSTR", E_VISA_RESOURCE_NOT_FOUND, "no transport"},
         {"TCPIP0::host::99999::SOCKET", E_VISA_INVALID_RESOURCE_NAME, "port"},
         {"garbage", E_VISA_INVALID_RESOURCE_NAME, "unrecognised"},
