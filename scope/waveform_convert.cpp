@@ -11,7 +11,9 @@ namespace qn {
 // Where the processor has them, 256-bit vectors convert four points per
 // instruction; the default clone keeps the baseline instruction set. (FMA is
 // not among the targets: it would not be used anyway with contraction off.)
-#if defined(__x86_64__) && !defined(__SANITIZE_ADDRESS__)
+// Sanitizer builds use one plain version: a clone's resolver runs while the
+// program is being relocated, before the sanitizer's runtime has started.
+#if defined(__x86_64__) && !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
 #define QN_VECTOR_CLONES __attribute__((target_clones("avx2", "default")))
 #else
 #define QN_VECTOR_CLONES
