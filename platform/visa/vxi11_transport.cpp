@@ -263,7 +263,13 @@ HRESULT Vxi11Transport::Read(const ReadRequest& req, const Deadline& deadline, R
                              std::string* error) {
     *result = ReadResult{};
     if (req.count == 0) return S_OK;
-    while (result->bytes < req.count) {
+    for (bool first = true; result->bytes < req.count; first = false) {
+        // A device that keeps answering with less than asked (and no END)
+        // still ends by the deadline.
+        if (!first && deadline.Expired()) {
+            *error = "timeout reading from " + peer_;
+            return E_VISA_TIMEOUT;
+        }
         const std::uint32_t want =
             std::uint32_t(std::min<std::size_t>(req.count - result->bytes, kMaxReadRequest));
         rpc::XdrWriter w;

@@ -194,6 +194,15 @@ TEST(Vxi11Hostile, BadRepliesFailCleanly) {
         {"only a stale reply", [](std::uint32_t xid) { return RpcPeer::LinkReply(xid - 1); },
          E_VISA_TIMEOUT},
         {"no reply", [](std::uint32_t) { return std::string(); }, E_VISA_TIMEOUT},
+        {"endless empty replies",
+         [](std::uint32_t xid) {
+             rpc::XdrWriter w;
+             w.U32(0);
+             w.U32(0);  // no END, no termination character
+             w.Opaque({});
+             return RpcPeer::Reply(xid, w.data());
+         },
+         E_VISA_TIMEOUT},
         {"device timeout", [](std::uint32_t xid) { return RpcPeer::Reply(xid, RpcPeer::Words({15, 0, 0})); },
          E_VISA_TIMEOUT},
     };
