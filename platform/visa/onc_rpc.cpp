@@ -94,6 +94,7 @@ RecordReader::Status RecordReader::Feed(std::string_view* input, std::string* re
                 return Status::kTooLarge;
             }
             in_header_ = false;
+            record_.reserve(record_.size() + frag_left_);  // within the bound checked above
         }
         const std::size_t take = std::min(frag_left_, input->size());
         record_.append(input->substr(0, take));

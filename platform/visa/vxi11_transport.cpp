@@ -71,7 +71,7 @@ class RpcConnection {
   public:
     RpcConnection(int fd, std::string peer, std::uint32_t program, std::uint32_t version)
         : fd_(fd), peer_(std::move(peer)), program_(program), version_(version),
-          reader_(kMaxRecord), rx_(64 * 1024) {
+          reader_(kMaxRecord), rx_(256 * 1024) {
         std::random_device rd;
         xid_ = rd();
     }
@@ -90,11 +90,13 @@ class RpcConnection {
         std::size_t sent = 0;
         HRESULT hr = SendAll(fd_.get(), call.data(), call.size(), until, peer_, &sent, error);
         if (FAILED(hr)) return Broken(hr, sent > 0 && sent < call.size());
+        // Bytes received after an earlier call's record first, then more from
+        // the wire, fed to the reader straight from the receive buffer.
+        const std::string held = std::move(pending_);
+        pending_.clear();
+        std::string_view input(held);
         for (;;) {
-            // Records already received first, then more from the wire.
-            std::string_view input(pending_);
             rpc::RecordReader::Status st = reader_.Feed(&input, record);
-            pending_.erase(0, pending_.size() - input.size());
             if (st == rpc::RecordReader::Status::kTooLarge) {
                 *error = "reply record from " + peer_ + " exceeds " + std::to_string(kMaxRecord) +
                          " bytes";
@@ -109,6 +111,7 @@ class RpcConnection {
                     return Broken(E_VISA_IO, true);
                 }
                 if (rxid != xid) continue;  // the late reply of an earlier call
+                pending_.assign(input);      // what follows belongs to later calls
                 if (rs == rpc::ReplyStatus::kDenied || stat != rpc::kSuccess) {
                     *error = "RPC call " + std::to_string(procedure) + " refused by " + peer_ +
                              " (status " + std::to_string(int(stat)) + ")";
@@ -119,7 +122,7 @@ class RpcConnection {
             std::size_t got = 0;
             hr = RecvSome(fd_.get(), rx_.data(), rx_.size(), until, peer_, &got, error);
             if (FAILED(hr)) return Broken(hr, hr != E_VISA_TIMEOUT);
-            pending_.assign(rx_.data(), got);
+            input = std::string_view(rx_.data(), got);
         }
     }
 
@@ -137,7 +140,7 @@ class RpcConnection {
     std::uint32_t xid_ = 0;
     rpc::RecordReader reader_;
     std::vector<char> rx_;
-    std::string pending_;  // received and not yet fed to the reader
+    std::string pending_;  // received after the last call's record, not yet fed to the reader
 };
 
 Deadline WithGrace(const Deadline& d) {
