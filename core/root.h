@@ -203,6 +203,8 @@ private:
 
     template <class T>
     HRESULT Nav(T** out);
+    // Sends the running member's command unless the session simulates.
+    HRESULT SendRowCommand();
 };
 
 }  // namespace qn

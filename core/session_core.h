@@ -47,6 +47,9 @@ public:
     // Virtual names of the configuration store's driver session:
     // lower-case virtual name -> physical name.
     std::map<std::string, std::string> virtual_names;
+    // The external input's probe attenuation last written or read. -1
+    // (automatic sensing) is remembered without I/O and read back as is.
+    double external_probe_attenuation = 1.0;
 
     bool Initialized() const { return session.initialized; }
     bool Simulating() const { return session.flags.simulate; }

@@ -172,3 +172,8 @@ enum Quorlen731XXMeasurementReferenceModeEnum : LONG {
     Quorlen731XXMeasurementReferenceModePercent = 0,
     Quorlen731XXMeasurementReferenceModeAbsolute = 1,
 };
+
+enum Quorlen731XXExternalUnitsEnum : LONG {
+    Quorlen731XXUnitsVolts = 0,
+    Quorlen731XXUnitsAmps = 1,
+};

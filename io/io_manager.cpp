@@ -345,4 +345,23 @@ HRESULT CDriverIOManager::RegisterOut32(SHORT s, LONG o, LONG v) {
     return Register("RegisterOut32", [&](IRegister* r) { return r->Out32(s, o, v); });
 }
 
+HRESULT CDriverIOManager::RegisterMoveIn8(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveIn8", [&](IRegister* r) { return r->MoveIn8(s, o, n, b); });
+}
+HRESULT CDriverIOManager::RegisterMoveIn16(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveIn16", [&](IRegister* r) { return r->MoveIn16(s, o, n, b); });
+}
+HRESULT CDriverIOManager::RegisterMoveIn32(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveIn32", [&](IRegister* r) { return r->MoveIn32(s, o, n, b); });
+}
+HRESULT CDriverIOManager::RegisterMoveOut8(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveOut8", [&](IRegister* r) { return r->MoveOut8(s, o, n, b); });
+}
+HRESULT CDriverIOManager::RegisterMoveOut16(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveOut16", [&](IRegister* r) { return r->MoveOut16(s, o, n, b); });
+}
+HRESULT CDriverIOManager::RegisterMoveOut32(SHORT s, LONG o, LONG n, SAFEARRAY** b) {
+    return Register("RegisterMoveOut32", [&](IRegister* r) { return r->MoveOut32(s, o, n, b); });
+}
+
 }  // namespace qn

@@ -190,6 +190,14 @@ public:
     HRESULT RegisterOut8(SHORT space, LONG offset, BYTE val);
     HRESULT RegisterOut16(SHORT space, LONG offset, SHORT val);
     HRESULT RegisterOut32(SHORT space, LONG offset, LONG val);
+    // Block moves of `length` elements; *buf is a new array (MoveIn) or the
+    // caller's array of 8-, 16- or 32-bit elements (MoveOut).
+    HRESULT RegisterMoveIn8(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
+    HRESULT RegisterMoveIn16(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
+    HRESULT RegisterMoveIn32(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
+    HRESULT RegisterMoveOut8(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
+    HRESULT RegisterMoveOut16(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
+    HRESULT RegisterMoveOut32(SHORT space, LONG offset, LONG length, SAFEARRAY** buf);
 
     // Element-type codes passed on to the formatted operations.
     static LONG AsciiType(LONG type);   // 2,3,4,5,8,12,17 pass, anything else 2

@@ -259,4 +259,30 @@ HRESULT CDriverIOProvider::WriteBuffer(const CErrorManagerBase& err, const BYTE*
     });
 }
 
+namespace {
+
+template <class T>
+HRESULT HandOut(T* object, T** p, HRESULT absent) {
+    if (!p) return E_POINTER;
+    *p = object;
+    if (!object) return absent;
+    object->AddRef();
+    return S_OK;
+}
+
+}  // namespace
+
+HRESULT CDriverIOProvider::ioprvGetIVisaSessionPointer(IVisaSession** p) const {
+    return HandOut<IVisaSession>(MessageInterface(), p, S_OK);
+}
+HRESULT CDriverIOProvider::ioprvGetIMessagePointer(IMessage** p) const {
+    return HandOut(MessageInterface(), p, S_OK);
+}
+HRESULT CDriverIOProvider::ioprvGetIRegisterPointer(IRegister** p) const {
+    return HandOut(RegisterInterface(), p, S_OK);
+}
+HRESULT CDriverIOProvider::ioprvGetIFormattedIO488Pointer(IFormattedIO488** p) const {
+    return HandOut(FormattedInterface(), p, S_FALSE);
+}
+
 }  // namespace qn

@@ -100,6 +100,16 @@ public:
     virtual IFormattedIO488Direct* FormattedDirect() const = 0;
     virtual IRegister* RegisterInterface() const = 0;
 
+    // The same objects for code that talks to VISA-COM directly (the
+    // driver's IO property): each with a reference added for the caller.
+    // E_POINTER for a null argument; an absent object gives null with
+    // S_OK (S_FALSE for the formatted I/O object). The session is the
+    // message interface's IVisaSession.
+    HRESULT ioprvGetIVisaSessionPointer(IVisaSession** p) const;
+    HRESULT ioprvGetIMessagePointer(IMessage** p) const;
+    HRESULT ioprvGetIRegisterPointer(IRegister** p) const;
+    HRESULT ioprvGetIFormattedIO488Pointer(IFormattedIO488** p) const;
+
 protected:
     // Raw operations of the transport; results already translated
     // (VISA-COM's timeout becomes kProviderTimeout).

@@ -132,10 +132,11 @@ std::string MeasurementSCPISource(const Quorlen731XXUserMeasurement& m) {
     return MeasurementSourceName(m);
 }
 
-HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* out) {
+HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG element_type,
+                         com::SafeArray* out) {
     StatusPollingOff polling(node.Core());
     CDriverIOManager io(node);
-    HRESULT hr = io.InstrWrite(":WAV:DATA?");
+    HRESULT hr = io.InstrWrite(command);
     if (FAILED(hr)) return hr;
     TermCharOff term(node);
     hr = term.Disable();
@@ -153,10 +154,14 @@ HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* o
         element_type == visa::BinaryType_UI1 ? VARTYPE(VT_ARRAY | VT_UI1) : VARTYPE(VT_ARRAY | VT_I2);
     if (block.vt != expected || !block.parray)
         return node.Errors().Error(Msg::E_IVI_UNEXPECTED_RESPONSE);
-    // The array the block was read into becomes the record: no copy.
+    // The array the block was read into becomes the result: no copy.
     *out = com::SafeArray(std::exchange(block.parray, nullptr));
     block.vt = VT_EMPTY;
     return S_OK;
+}
+
+HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* out) {
+    return QueryBinaryBlock(node, ":WAV:DATA?", element_type, out);
 }
 
 HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak,

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 
 #include "core/node.h"
 #include "platform/com/safearray.h"
@@ -46,6 +47,12 @@ HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak
 // Sends ":WAV:PRE?" and reads the scaling factors from the preamble; a
 // preamble that does not parse is E_IVI_UNEXPECTED_RESPONSE.
 HRESULT ReadPreamble(CDriverNode& node, WaveformScaling* s);
+// Sends `command` and reads the IEEE 488.2 binary block of its reply
+// (elements of BinaryType_I2 or BinaryType_UI1; the declared length bounded
+// by the session's block limit) with the instrument-status check and the
+// termination character switched off; both are restored on every path.
+HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG element_type,
+                         com::SafeArray* out);
 
 // Sends ":WAV:DATA?" and reads the binary block of `element_type`
 // (BinaryType_I2 or BinaryType_UI1) with the instrument-status check and the

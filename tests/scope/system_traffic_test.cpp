@@ -1,0 +1,413 @@
+// Exact SCPI traffic of the system, display, marker, external-input and
+// setup-memory members against the strict scripted provider, with the
+// session's formatted I/O for the setup and screen blocks.
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <iterator>
+#include <vector>
+
+#include "Quorlen731XXErrors.h"
+#include "core/root.h"
+#include "tests/scope/scope_fixture.h"
+#include "tests/support/scripted_driver.h"
+#include "tests/support/scripted_formatted.h"
+
+namespace qn::test {
+namespace {
+
+// Records every timeout the session is given.
+class TimeoutProvider : public ScriptedFormattedProvider {
+public:
+    std::vector<LONG> timeouts;
+
+protected:
+    HRESULT RawSetTimeout(LONG ms) override {
+        timeouts.push_back(ms);
+        return ScriptedFormattedProvider::RawSetTimeout(ms);
+    }
+};
+
+class SystemTraffic : public ::testing::Test {
+protected:
+    void SetUp() override { Open(""); }
+    void TearDown() override {
+        if (!HasFailure() && io_) {
+            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
+        }
+    }
+    void Open(const char* options) {
+        driver_ = DriverOnScript(&io_);
+        const std::string idn = "QUORLEN TECHNOLOGIES,73141D,SN1,1.0\n";
+        io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
+        com::Bstr r("scripted"), o(options);
+        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    }
+public:
+    IQuorlen731XXSystem* System() { return driver_.get(); }
+    IQuorlen731XXCursors* Cursors() { return driver_.get(); }
+    IQuorlen731XXExternal* External() { return driver_.get(); }
+    IQuorlen731XXDisplay* Display() { return driver_.get(); }
+
+protected:
+    void PollingOn() {
+        io_->AnswerStatusWith("+0");
+        driver_->Core().session.flags.query_instrument_status = true;
+    }
+    static com::SafeArray Bytes(std::string_view text) {
+        com::SafeArray a = com::SafeArray::Vector(VT_UI1, ULONG(text.size()));
+        std::copy(text.begin(), text.end(), a.data<char>());
+        return a;
+    }
+    static std::string Text(SAFEARRAY* a) {
+        com::SafeArray owned(a);
+        return std::string(owned.data<char>(), owned.size());
+    }
+
+    ComPtr<Quorlen731XX> driver_;
+    TimeoutProvider* io_ = nullptr;
+};
+
+// One member call and the traffic it makes.
+struct Exchange {
+    const char* what;
+    std::vector<std::pair<std::string, std::string>> traffic;  // write, reply
+    std::function<HRESULT(SystemTraffic&)> call;
+};
+
+TEST_F(SystemTraffic, SingleCommandMembersSendTheirCommands) {
+    com::Bstr date("+2026,+12,+6"), slot("3");
+    const double precise = -0.12345678901234567;
+    const Exchange cases[] = {
+        {"Date", {{":SYST:DATE +2026,+12,+6\n", ""}},
+         [&](SystemTraffic& t) { return t.System()->put_Date(date.get()); }},
+        {"SaveState", {{"*SAV 3\n", ""}},
+         [&](SystemTraffic& t) { return t.System()->SaveState(slot.get()); }},
+        {"RecallState", {{"*RCL 3\n", ""}},
+         [&](SystemTraffic& t) { return t.System()->RecallState(slot.get()); }},
+        {"EnableLocalControls", {{":SYST:LOCK 0\n", ""}},
+         [](SystemTraffic& t) { return t.System()->EnableLocalControls(); }},
+        {"DisableLocalControls", {{":SYST:LOCK 1\n", ""}},
+         [](SystemTraffic& t) { return t.System()->DisableLocalControls(); }},
+        {"LabelEnabled", {{":DISP:LAB 1\n", ""}},
+         [](SystemTraffic& t) { return t.Display()->put_LabelEnabled(VARIANT_TRUE); }},
+        {"Persistence on", {{":DISP:PERS INF\n", ""}},
+         [](SystemTraffic& t) { return t.Display()->put_Persistence(VARIANT_TRUE); }},
+        {"Persistence off", {{":DISP:PERS MIN\n", ""}},
+         [](SystemTraffic& t) { return t.Display()->put_Persistence(VARIANT_FALSE); }},
+        {"Erase", {{":CDIS\n", ""}}, [](SystemTraffic& t) { return t.Display()->Erase(); }},
+        {"Cursors on", {{":MARK:MODE MAN\n", ""}},
+         [](SystemTraffic& t) { return t.Cursors()->put_Enabled(VARIANT_TRUE); }},
+        {"Cursors off", {{":MARK:MODE OFF\n", ""}},
+         [](SystemTraffic& t) { return t.Cursors()->put_Enabled(VARIANT_FALSE); }},
+        {"X2Position", {{":MARK:X2P -0.123456789012346\n", ""}},
+         [&](SystemTraffic& t) { return t.Cursors()->put_X2Position(precise); }},
+        {"Y1Position", {{":MARK:Y1P 2.5e-09\n", ""}},
+         [](SystemTraffic& t) { return t.Cursors()->put_Y1Position(2.5e-9); }},
+        {"External units", {{":EXT:UNIT AMP\n", ""}},
+         [](SystemTraffic& t) { return t.External()->put_Units(Quorlen731XXUnitsAmps); }},
+        {"External probe", {{":EXT:PROB 10\n", ""}},
+         [](SystemTraffic& t) { return t.External()->put_ProbeAttenuation(10.0); }},
+    };
+    for (const Exchange& c : cases) {
+        SCOPED_TRACE(c.what);
+        for (const auto& [write, reply] : c.traffic) io_->Expect(write, reply);
+        EXPECT_EQ(c.call(*this), S_OK);
+        EXPECT_TRUE(io_->Done());
+    }
+}
+
+TEST_F(SystemTraffic, TwoStateRepliesAreTrueOnlyForTheirOnToken) {
+    struct Case {
+        const char* reply;
+        bool persistence, markers;  // reply read as Persistence / as Cursors.Enabled
+    };
+    const Case cases[] = {{"INF\n", true, false},  {"MIN\n", false, false},
+                          {"inf\n", false, false}, {"INFINITE\n", false, false},
+                          {"MAN\n", false, true},  {" MAN \n", false, true},
+                          {"OFF\n", false, false}, {"1\n", false, false}};
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.reply);
+        VARIANT_BOOL v = VARIANT_TRUE;
+        io_->Expect(":DISP:PERS?\n", c.reply).Expect(":MARK:MODE?\n", c.reply);
+        EXPECT_EQ(Display()->get_Persistence(&v), S_OK);
+        EXPECT_EQ(v, c.persistence ? VARIANT_TRUE : VARIANT_FALSE);
+        EXPECT_EQ(Cursors()->get_Enabled(&v), S_OK);
+        EXPECT_EQ(v, c.markers ? VARIANT_TRUE : VARIANT_FALSE);
+    }
+}
+
+TEST_F(SystemTraffic, TimeoutBelowTheMinimumBecomesTheMinimum) {
+    const std::pair<LONG, LONG> cases[] = {{-5, 100}, {50, 100}, {99, 100},
+                                           {100, 100}, {101, 101}, {30000, 30000}};
+    for (const auto& [given, set] : cases) {
+        SCOPED_TRACE(given);
+        ASSERT_EQ(System()->put_TimeoutMilliseconds(given), S_OK);
+        LONG read = 0;
+        EXPECT_EQ(System()->get_TimeoutMilliseconds(&read), S_OK);
+        EXPECT_EQ(read, set);
+        EXPECT_EQ(io_->SessionTimeout(), set);
+    }
+    EXPECT_TRUE(io_->Written().size() == 2);  // the identity queries only
+}
+
+TEST_F(SystemTraffic, OperationCompleteWaitsWithoutPollingAndRestoresIt) {
+    PollingOn();
+    io_->timeouts.clear();
+    io_->Expect("*OPC?\n", "1\n");
+    EXPECT_EQ(System()->WaitForOperationComplete(10), S_OK);
+    EXPECT_EQ(io_->timeouts, (std::vector<LONG>{100, 2000}));  // the wait, then the session's
+    // Polling is on again: the next command is followed by "*ESR?".
+    io_->Expect(":CDIS\n");
+    ASSERT_EQ(Display()->Erase(), S_OK);
+    EXPECT_EQ(io_->Written().back(), "*ESR?\n");
+    EXPECT_EQ(std::count(io_->Written().begin(), io_->Written().end(), "*ESR?\n"), 1);
+}
+
+TEST_F(SystemTraffic, OperationCompleteWithoutReplyExceedsTheMaxTime) {
+    for (bool polling : {true, false}) {
+        SCOPED_TRACE(polling);
+        if (polling) PollingOn();
+        driver_->Core().session.flags.query_instrument_status = polling;
+        io_->timeouts.clear();
+        io_->ExpectTimeout("*OPC?\n");
+        EXPECT_EQ(System()->WaitForOperationComplete(2500), E_QUORLEN731XX_MAX_TIME_EXCEEDED);
+        EXPECT_NE(ErrorText().find("WaitForOperationComplete Max time exceeded."),
+                  std::string::npos);
+        EXPECT_EQ(io_->timeouts.front(), 2500);
+        EXPECT_EQ(io_->SessionTimeout(), 2000);
+        EXPECT_EQ(driver_->Core().session.flags.query_instrument_status, polling);
+        // The session stays usable.
+        BSTR serial = nullptr;
+        io_->Expect(":SER?\n", "QN1234\n");
+        EXPECT_EQ(System()->get_SerialNumber(&serial), S_OK);
+        EXPECT_EQ(com::BstrToUtf8(serial), "QN1234");
+        SysFreeString(serial);
+    }
+}
+
+TEST_F(SystemTraffic, SetupBlocksGoOutWithTheirExactLength) {
+    // Bytes that would end a text message (line feed, NUL) travel inside the block.
+    const std::string setup("a\nb\0c", 5);
+    com::SafeArray data = Bytes(setup);
+    io_->Expect(":SYST:SET #15" + setup + "\n");
+    EXPECT_EQ(System()->PutState(data.get()), S_OK);
+    const std::string big(1234, 'x');
+    com::SafeArray large = Bytes(big);
+    io_->Expect(":SYST:SET #41234" + big + "\n");
+    EXPECT_EQ(System()->PutState(large.get()), S_OK);
+}
+
+TEST_F(SystemTraffic, SetupDataThatIsNotBytesIsRefusedBeforeSending) {
+    EXPECT_EQ(System()->PutState(nullptr), E_IVI_NULL_POINTER);
+    com::SafeArray doubles = com::SafeArray::Vector(VT_R8, 4);
+    EXPECT_EQ(System()->PutState(doubles.get()), E_IVI_INVALID_VALUE);
+    EXPECT_NE(ErrorText().find("PutState"), std::string::npos);
+    EXPECT_EQ(io_->Written().size(), 2u);
+}
+
+TEST_F(SystemTraffic, SetupAndScreenBlocksAreReadWhole) {
+    SAFEARRAY* state = nullptr;
+    io_->Expect(":SYST:SET?\n", std::string("#16a\n\0b\nc\n", 10));
+    ASSERT_EQ(System()->GetState(&state), S_OK);
+    EXPECT_EQ(Text(state), std::string("a\n\0b\nc", 6));
+    SAFEARRAY* screen = nullptr;
+    io_->Expect(":DISP:DATA? BMP,SCR\n", "#0BM\x02\x00\n");
+    ASSERT_EQ(System()->GetScreenBitmap(&screen), S_OK);
+    EXPECT_EQ(Text(screen).substr(0, 2), "BM");
+}
+
+TEST_F(SystemTraffic, BadSetupBlocksFailAndLeaveTheSessionUsable) {
+    const char* replies[] = {
+        "#9999999999\n",  // longer than any block the instrument makes
+        "#2x1abc\n",      // a length that is not digits
+        "SETUP\n",        // not a block
+        "#\n",            // header cut short
+    };
+    for (const char* reply : replies) {
+        SCOPED_TRACE(reply);
+        SAFEARRAY* state = nullptr;
+        io_->Expect(":SYST:SET?\n", reply);
+        EXPECT_TRUE(FAILED(System()->GetState(&state)));
+        EXPECT_EQ(state, nullptr);
+        EXPECT_FALSE(ErrorText().empty());
+        BSTR date = nullptr;
+        io_->Expect(":SYST:DATE?\n", "+2026,+12,+6\n");
+        EXPECT_EQ(System()->get_Date(&date), S_OK);
+        EXPECT_EQ(com::BstrToUtf8(date), "+2026,+12,+6");
+        SysFreeString(date);
+    }
+}
+
+TEST_F(SystemTraffic, MarkerSourcesAreDisplayedAnalogChannels) {
+    com::Bstr user2("UserChannel2"), ivi3("Channel3"), digital("UserDigitalChannel0"),
+        external("VAL_EXTERNAL"), bogus("CHAN1");
+    io_->Expect(":STAT? CHAN2\n", "1\n").Expect(":MARK:X1Y1 CHAN2\n");
+    EXPECT_EQ(Cursors()->put_X1Y1Source(user2.get()), S_OK);
+    io_->Expect(":STAT? CHAN3\n", "1\n").Expect(":MARK:X2Y2 CHAN3\n");
+    EXPECT_EQ(Cursors()->put_X2Y2Source(ivi3.get()), S_OK);
+    io_->Expect(":STAT? CHAN2\n", "0\n");
+    EXPECT_EQ(Cursors()->put_X2Y2Source(user2.get()), E_IVISCOPE_CHANNEL_NOT_ENABLED);
+    EXPECT_NE(ErrorText().find("Specified channel is not enabled."), std::string::npos);
+    for (const com::Bstr* name : {&digital, &external, &bogus}) {
+        SCOPED_TRACE(name->utf8());
+        EXPECT_EQ(Cursors()->put_X1Y1Source(name->get()), E_IVI_INVALID_VALUE);
+    }
+    EXPECT_TRUE(io_->Done());
+}
+
+TEST_F(SystemTraffic, MarkerSourcesReadBackAsDriverNames) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"CHAN1\n", "UserChannel1"}, {"CHAN4\n", "UserChannel4"}, {"DIG3\n", "UserDigitalChannel3"},
+        {"EXT\n", "VAL_EXTERNAL"},   {"LINE\n", "LINE"}};
+    for (const auto& [reply, name] : cases) {
+        SCOPED_TRACE(name);
+        BSTR v = nullptr;
+        io_->Expect(":MARK:X2Y2?\n", reply);
+        EXPECT_EQ(Cursors()->get_X2Y2Source(&v), S_OK);
+        EXPECT_EQ(com::BstrToUtf8(v), name);
+        SysFreeString(v);
+    }
+}
+
+TEST_F(SystemTraffic, AutomaticExternalProbeSensingIsRememberedWithoutIo) {
+    double v = 0;
+    io_->Expect(":EXT:PROB?\n", "10\n");
+    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
+    EXPECT_EQ(v, 10.0);
+    EXPECT_EQ(External()->put_ProbeAttenuation(-1.0), S_OK);
+    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
+    EXPECT_EQ(v, -1.0);
+    EXPECT_EQ(io_->Written().size(), 3u);
+    // Another value is sent and read from the instrument again.
+    io_->Expect(":EXT:PROB -1.5\n").Expect(":EXT:PROB?\n", "-1.5\n");
+    EXPECT_EQ(External()->put_ProbeAttenuation(-1.5), S_OK);
+    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
+    EXPECT_EQ(v, -1.5);
+}
+
+TEST_F(SystemTraffic, ExternalUnitsTokens) {
+    Quorlen731XXExternalUnitsEnum units = Quorlen731XXUnitsVolts;
+    io_->Expect(":EXT:UNIT?\n", "AMP\n").Expect(":EXT:UNIT?\n", "OHM\n");
+    EXPECT_EQ(External()->get_Units(&units), S_OK);
+    EXPECT_EQ(units, Quorlen731XXUnitsAmps);
+    EXPECT_EQ(External()->get_Units(&units), E_IVI_UNEXPECTED_RESPONSE);
+    for (LONG bad : {-1, 2}) {
+        EXPECT_EQ(External()->put_Units(static_cast<Quorlen731XXExternalUnitsEnum>(bad)),
+                  E_IVI_INVALID_VALUE);
+        EXPECT_NE(ErrorText().find("put_Units"), std::string::npos);
+    }
+}
+
+TEST_F(SystemTraffic, TextWithALineFeedIsNotSent) {
+    com::Bstr date("+2026,+1,+1\n*RST"), slot(std::string_view("1\0", 2));
+    EXPECT_EQ(System()->put_Date(date.get()), E_IVI_INVALID_VALUE);
+    EXPECT_EQ(System()->SaveState(slot.get()), E_IVI_INVALID_VALUE);
+    EXPECT_EQ(io_->Written().size(), 2u);
+}
+
+// The members no model supports fail the same way with and without an
+// instrument, with the documented inserts.
+void ExpectUnsupported(Quorlen731XX& d) {
+    struct Case {
+        std::function<HRESULT()> call;
+        HRESULT hr;
+        const char* text;
+    };
+    IQuorlen731XXSetupMemory* memory = &d;
+    IQuorlen731XXDisplay* display = &d;
+    IQuorlen731XXSystem* system = &d;
+    com::Bstr file("setup.scp");
+    BSTR fetched = SysAllocString(u"x");
+    VARIANT_BOOL b = VARIANT_FALSE;
+    BSTR time = nullptr;
+    const Case cases[] = {
+        {[&] { return memory->Fetch(&fetched); }, E_QUORLEN731XX_MODEL_NOT_SUPPORTED, ": Fetch."},
+        {[&] { return memory->Download(file.get()); }, E_QUORLEN731XX_MODEL_NOT_SUPPORTED,
+         ": Download."},
+        {[&] { return display->get_PersistTime(&time); }, E_QUORLEN731XX_MODEL_NOT_SUPPORTED,
+         "get_IQuorlen731XXDisplayPersistTime"},
+        {[&] { return display->put_PersistTime(file.get()); }, E_QUORLEN731XX_MODEL_NOT_SUPPORTED,
+         "get_IQuorlen731XXDisplayPersistTime"},
+        {[&] { return display->Configure(file.get()); }, E_QUORLEN731XX_MODEL_NOT_SUPPORTED,
+         "_IQuorlen731XXDisplayConfigure"},
+        {[&] { return system->get_AsyncEventsEnabled(&b); }, E_IVI_PROPERTY_NOT_SUPPORTED,
+         "get_AsyncEventsEnabled"},
+        {[&] { return system->put_AsyncEventsEnabled(VARIANT_TRUE); },
+         E_IVI_PROPERTY_NOT_SUPPORTED, "put_AsyncEventsEnabled"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.text);
+        EXPECT_EQ(c.call(), c.hr);
+        EXPECT_NE(ErrorText().find(c.text), std::string::npos);
+    }
+    EXPECT_EQ(fetched, nullptr);  // Fetch clears its string first (the frame freed nothing: the
+    SysFreeString(fetched);       // caller's string stays the caller's)
+}
+
+TEST_F(SystemTraffic, UnsupportedMembersFailWithTheirInserts) { ExpectUnsupported(*driver_.get()); }
+
+class SimulatedSystem : public ::testing::Test {
+protected:
+    void SetUp() override {
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        driver_ = com::MakeComObject<Quorlen731XX>();
+        com::Bstr r(""), o("Simulate=true,DriverSetup=Model=QDS4032A");
+        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    }
+    ComPtr<Quorlen731XX> driver_;
+};
+
+TEST_F(SimulatedSystem, UnsupportedMembersFailAlsoWhileSimulating) { ExpectUnsupported(*driver_.get()); }
+
+TEST_F(SimulatedSystem, IoObjectIsNotAvailable) {
+    IFormattedIO488* io = reinterpret_cast<IFormattedIO488*>(0x1);
+    EXPECT_EQ(static_cast<IQuorlen731XXSystem*>(driver_.get())->get_IO(&io),
+              E_QUORLEN731XX_IO_GENERAL);
+    EXPECT_EQ(io, nullptr);
+    EXPECT_NE(ErrorText().find("IO error: I/O not available while Simulating."), std::string::npos);
+}
+
+TEST_F(SimulatedSystem, MethodsSucceedWithoutAnInstrument) {
+    IQuorlen731XXSystem* s = driver_.get();
+    EXPECT_EQ(s->WaitForOperationComplete(0), S_OK);
+    SAFEARRAY* state = nullptr;
+    EXPECT_EQ(s->GetState(&state), S_OK);
+    ASSERT_NE(state, nullptr);
+    EXPECT_EQ(com::SafeArrayCount(state), 0u);
+    SafeArrayDestroy(state);
+    com::SafeArray data = com::SafeArray::Vector(VT_UI1, 3);
+    EXPECT_EQ(s->PutState(data.get()), S_OK);
+    EXPECT_EQ(s->DisableLocalControls(), S_OK);
+    BSTR date = nullptr;
+    EXPECT_EQ(s->get_Date(&date), S_OK);
+    EXPECT_EQ(com::BstrToUtf8(date), "+2008,+2,+27");
+    SysFreeString(date);
+}
+
+TEST(SystemTracing, SwitchingTracingOffKeepsWhatWasRecorded) {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    const std::string path = ::testing::TempDir() + "qn_system_trace_switch.xml";
+    std::remove(path.c_str());
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=QDS4032A,TraceName=" + path);
+    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    IQuorlen731XXSystem* s = driver.get();
+    VARIANT_BOOL on = VARIANT_TRUE;
+    EXPECT_EQ(s->get_TraceEnabled(&on), S_OK);
+    EXPECT_EQ(on, VARIANT_FALSE);
+    ASSERT_EQ(s->put_TraceEnabled(VARIANT_TRUE), S_OK);
+    EXPECT_EQ(s->get_TraceEnabled(&on), S_OK);
+    EXPECT_EQ(on, VARIANT_TRUE);
+    EXPECT_EQ(s->DisableLocalControls(), S_OK);
+    ASSERT_EQ(s->put_TraceEnabled(VARIANT_FALSE), S_OK);
+    std::ifstream file(path);
+    const std::string xml((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+    EXPECT_NE(xml.find("DisableLocalControls"), std::string::npos);
+    std::remove(path.c_str());
+}
+
+}  // namespace
+}  // namespace qn::test
