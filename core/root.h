@@ -114,6 +114,13 @@ public:
     // ISupportErrorInfo
     HRESULT InterfaceSupportsErrorInfo(REFIID riid) override;
 
+    // The link to the IVI-C session of the C API (SessionCore's
+    // c_session_handle): attaching succeeds only when the object is already
+    // linked (E_IVI_METHOD_NOT_SUPPORTED otherwise); the handle reads as
+    // E_IVI_PROPERTY_NOT_SUPPORTED while none is linked.
+    HRESULT AttachToExistingCSession();
+    HRESULT get_NativeCHandle(LONG* pVal);
+
     // Entries of the table-driven interfaces.
 #include "core/member_entries_begin.h"
 #include "members/IQuorlen731XX.def"

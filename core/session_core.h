@@ -50,6 +50,9 @@ public:
     // The external input's probe attenuation last written or read. -1
     // (automatic sensing) is remembered without I/O and read back as is.
     double external_probe_attenuation = 1.0;
+    // The IVI-C session handle of the C API session this object is bound
+    // to; 0 while no C session is linked. Set by the C API.
+    LONG c_session_handle = 0;
 
     bool Initialized() const { return session.initialized; }
     bool Simulating() const { return session.flags.simulate; }

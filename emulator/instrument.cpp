@@ -12,7 +12,8 @@ namespace {
 std::vector<std::span<const CommandSpec>> AllTables() {
     return {CommonCommands(), SystemDataCommands(), ScopeCommands(),
             StatusCommands(), ChannelCommands(),    WaveformCommands(),
-            MeasureCommands(), DigitalCommands()};
+            MeasureCommands(), DigitalCommands(), SystemCommands(),
+            DisplayCommands()};
 }
 
 CommandTree BuildTree(const ModelInfo& model) {

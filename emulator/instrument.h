@@ -28,6 +28,15 @@ std::span<const CommandSpec> ChannelCommands();
 std::span<const CommandSpec> WaveformCommands();
 std::span<const CommandSpec> MeasureCommands();
 std::span<const CommandSpec> DigitalCommands();
+std::span<const CommandSpec> SystemCommands();
+std::span<const CommandSpec> DisplayCommands();
+
+// The instrument's clock and front panel: not part of a setup.
+struct SystemState {
+    std::array<int, 3> date{2026, 1, 1};  // year, month, day
+    std::array<int, 3> time{0, 0, 0};     // hours, minutes, seconds
+    bool locked = false;                  // front panel locked (:SYST:LOCK)
+};
 
 class Instrument {
   public:
@@ -46,6 +55,7 @@ class Instrument {
     void Error(ScpiError error) { status_.PushError(error); }
     StatusModel& status() { return status_; }
     ScopeSettings& settings() { return settings_; }
+    SystemState& system() { return system_; }
     const ModelInfo& model() const { return model_; }
     bool message_available() const { return !output_.empty() || !replies_.empty(); }
     void Reset();
@@ -85,6 +95,7 @@ class Instrument {
     CommandTree tree_;
     StatusModel status_;
     ScopeSettings settings_;
+    SystemState system_;
     std::array<std::optional<ScopeSettings>, kSetupSlots> saved_;
     std::string output_;
     std::vector<std::string> replies_;  // replies of the message being executed

@@ -55,6 +55,15 @@ struct ChannelSettings {
     std::string label;
 };
 
+// The manual markers (:MARK).
+struct MarkerSettings {
+    std::string mode = "OFF";  // "OFF" or "MAN"
+    double x1 = 0.0, x2 = 0.0;  // s
+    double y1 = 0.0, y2 = 0.0;  // V
+    std::string x1y1_source = "CHAN1";
+    std::string x2y2_source = "CHAN1";
+};
+
 struct ScopeSettings {
     double time_range = 1e-3;  // s, full screen
     double time_position = 0.0;
@@ -73,6 +82,11 @@ struct ScopeSettings {
     bool waveform_unsigned = false;
     std::string waveform_byte_order = "MSBF";
     int waveform_points = 1000;
+    bool labels = false;
+    std::string persistence = "MIN";  // "MIN" or "INF"
+    MarkerSettings markers;
+    double external_probe = 1.0;
+    std::string external_units = "VOLT";
 
     ScopeSettings() {
         channels[0].display = true;

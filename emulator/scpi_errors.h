@@ -21,6 +21,7 @@ inline constexpr ScpiError kInvalidBlock{-161, "Invalid block data"};
 inline constexpr ScpiError kExecution{-200, "Execution error"};
 inline constexpr ScpiError kSettingsConflict{-221, "Settings conflict"};
 inline constexpr ScpiError kDataOutOfRange{-222, "Data out of range"};
+inline constexpr ScpiError kDataCorrupt{-230, "Data corrupt or stale"};
 inline constexpr ScpiError kIllegalParameter{-224, "Illegal parameter value"};
 inline constexpr ScpiError kHardwareMissing{-241, "Hardware missing"};
 inline constexpr ScpiError kQueueOverflow{-350, "Queue overflow"};

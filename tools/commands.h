@@ -12,5 +12,9 @@ int ChannelCommand(std::span<char*> args);
 int TimebaseCommand(std::span<char*> args);
 int MeasureCommand(std::span<char*> args);
 int DigitalCommand(std::span<char*> args);
+int SystemCommand(std::span<char*> args);
+int ScreenshotCommand(std::span<char*> args);
+int SetupCommand(std::span<char*> args);
+int ScpiCommand(std::span<char*> args);
 
 }  // namespace qn::tools

@@ -29,6 +29,13 @@ constexpr Command kCommands[] = {
      "one measurement of a channel, or all with --all: --channel N (--function F | --all)"},
     {"digital", qn::tools::DigitalCommand,
      "set and print the settings of digital channel D (qn731xx digital --channel D --help)"},
+    {"system", qn::tools::SystemCommand,
+     "set and print the instrument's date and time, its serial number and the I/O timeout"},
+    {"screenshot", qn::tools::ScreenshotCommand, "write the instrument's screen to FILE.bmp"},
+    {"setup", qn::tools::SetupCommand,
+     "setup save FILE: keep the instrument's setup in FILE; setup load FILE: put it back"},
+    {"scpi", qn::tools::ScpiCommand,
+     "send one SCPI command through the driver's I/O object; a query prints its reply"},
 };
 
 int Usage(FILE* to) {

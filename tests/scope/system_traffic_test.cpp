@@ -387,6 +387,20 @@ TEST_F(SimulatedSystem, MethodsSucceedWithoutAnInstrument) {
     SysFreeString(date);
 }
 
+TEST_F(SimulatedSystem, CSessionLinkExistsOnlyWhenTheCApiMadeIt) {
+    LONG handle = 7;
+    EXPECT_EQ(driver_->get_NativeCHandle(&handle), E_IVI_PROPERTY_NOT_SUPPORTED);
+    EXPECT_EQ(handle, 0);
+    EXPECT_NE(ErrorText().find("get_NativeCHandle"), std::string::npos);
+    EXPECT_EQ(driver_->AttachToExistingCSession(), E_IVI_METHOD_NOT_SUPPORTED);
+    EXPECT_NE(ErrorText().find("AttachToExistingCSession"), std::string::npos);
+    EXPECT_EQ(driver_->get_NativeCHandle(nullptr), E_IVI_NULL_POINTER);
+    driver_->Core().c_session_handle = 4242;
+    EXPECT_EQ(driver_->AttachToExistingCSession(), S_OK);
+    EXPECT_EQ(driver_->get_NativeCHandle(&handle), S_OK);
+    EXPECT_EQ(handle, 4242);
+}
+
 TEST(SystemTracing, SwitchingTracingOffKeepsWhatWasRecorded) {
     ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
     const std::string path = ::testing::TempDir() + "qn_system_trace_switch.xml";
