@@ -114,7 +114,8 @@ void QueryScreen(Instrument& inst, Call& call) {
     const std::string image =
         last.valid ? RenderScreenBitmap(inst.settings(), last)
                    : RenderScreenBitmap(inst.settings(),
-                                        SynthesizeRecord(inst.settings(), inst.model(), 1));
+                                        SynthesizeRecord(inst.settings(), inst.model(),
+                                                         inst.inputs(), 1));
     call.reply = MakeBlock(image);
 }
 

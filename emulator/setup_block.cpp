@@ -40,6 +40,21 @@ void VisitSettings(S& s, V&& v) {
     for (std::size_t i = 0; i < s.pod_display.size(); ++i) {
         v("pod" + std::to_string(i + 1) + ".display", s.pod_display[i]);
     }
+    for (std::size_t i = 0; i < s.digital.size(); ++i) {
+        auto& d = s.digital[i];
+        const std::string p = "digital" + std::to_string(i) + ".";
+        v(p + "display", d.display);
+        v(p + "label", d.label);
+        v(p + "threshold", d.threshold);
+    }
+    v("measure.source1", s.measure.source1);
+    v("measure.source2", s.measure.source2);
+    v("measure.mode", s.measure.mode);
+    v("measure.high", s.measure.high);
+    v("measure.mid", s.measure.mid);
+    v("measure.low", s.measure.low);
+    v("measure.edge1", s.measure.edge1);
+    v("measure.edge2", s.measure.edge2);
     v("math.display", s.math_display);
     v("waveform.source", s.waveform_source);
     v("waveform.format", s.waveform_format);

@@ -77,13 +77,13 @@ HRESULT Quorlen731XX::IQuorlen731XXSystem_put_AsyncEventsEnabled_Body(VARIANT_BO
     return Errors().Error(Msg::E_IVI_PROPERTY_NOT_SUPPORTED, {"put_AsyncEventsEnabled"});
 }
 
-HRESULT Quorlen731XX::IQuorlen731XXSystem_get_IO_Body(IFormattedIO488** val) {
+HRESULT Quorlen731XX::IQuorlen731XXSystem_get_IO_Body(IFormattedIO488** pVal) {
     if (Core().Simulating())
         return Errors().Error(Msg::E_QUORLEN731XX_IO_GENERAL,
                               {"I/O not available while Simulating"});
-    HRESULT hr = Core().io->ioprvGetIFormattedIO488Pointer(val);
+    HRESULT hr = Core().io->ioprvGetIFormattedIO488Pointer(pVal);
     if (FAILED(hr)) return hr;
-    if (!*val)
+    if (!*pVal)
         return Errors().Error(Msg::E_QUORLEN731XX_IO_GENERAL,
                               {"the session has no formatted I/O object"});
     return S_OK;

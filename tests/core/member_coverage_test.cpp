@@ -140,7 +140,12 @@ const std::map<std::string_view, std::vector<std::string_view>>& Documented() {
 
 TEST(MemberCoverage, DocumentedMembersOfInterfacesWithRowsAreAllRows) {
     std::map<std::string_view, std::set<std::string_view>> rows;
-    for (const Row& r : kRows) rows[r.interface_name].insert(r.member);
+    // A property whose value is an interface is written as its getter method.
+    for (const Row& r : kRows) {
+        std::string_view member = r.member;
+        if (member.starts_with("get_") || member.starts_with("put_")) member.remove_prefix(4);
+        rows[r.interface_name].insert(member);
+    }
     std::vector<std::string_view> without_rows;
     for (std::string_view itf : kInterfaces) {
         if (!rows.count(itf)) {

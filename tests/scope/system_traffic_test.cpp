@@ -11,6 +11,7 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
+#include "io/io_manager.h"
 #include "tests/scope/scope_fixture.h"
 #include "tests/support/scripted_driver.h"
 #include "tests/support/scripted_formatted.h"
@@ -305,6 +306,37 @@ TEST_F(SystemTraffic, TextWithALineFeedIsNotSent) {
     com::Bstr date("+2026,+1,+1\n*RST"), slot(std::string_view("1\0", 2));
     EXPECT_EQ(System()->put_Date(date.get()), E_IVI_INVALID_VALUE);
     EXPECT_EQ(System()->SaveState(slot.get()), E_IVI_INVALID_VALUE);
+    EXPECT_EQ(io_->Written().size(), 2u);
+}
+
+TEST_F(SystemTraffic, IoIsTheSessionsFormattedIoObject) {
+    ComPtr<IFormattedIO488> io;
+    ASSERT_EQ(System()->get_IO(io.Out()), S_OK);
+    EXPECT_EQ(io.get(), io_->FormattedInterface());
+    io_->Expect("*CLS\n");
+    com::Bstr cls("*CLS\n");
+    EXPECT_EQ(io->WriteString(cls.get(), VARIANT_TRUE), S_OK);
+    EXPECT_EQ(System()->get_IO(nullptr), E_IVI_NULL_POINTER);
+}
+
+TEST_F(SystemTraffic, PointerGettersAndRegisterMovesOfAMessageSession) {
+    ScriptedProvider plain;  // no formatted I/O, no message or register interface
+    IFormattedIO488* formatted = reinterpret_cast<IFormattedIO488*>(0x1);
+    EXPECT_EQ(plain.ioprvGetIFormattedIO488Pointer(&formatted), S_FALSE);
+    EXPECT_EQ(formatted, nullptr);
+    IRegister* reg = reinterpret_cast<IRegister*>(0x1);
+    EXPECT_EQ(plain.ioprvGetIRegisterPointer(&reg), S_OK);
+    EXPECT_EQ(reg, nullptr);
+    EXPECT_EQ(plain.ioprvGetIMessagePointer(nullptr), E_POINTER);
+    IMessage* message = nullptr;
+    ASSERT_EQ(io_->ioprvGetIMessagePointer(&message), S_OK);
+    ComPtr<IMessage> held(message, false);  // adopts the reference the getter added
+    EXPECT_EQ(message, io_->MessageInterface());
+    // Register block moves are refused on a message-based session; nothing is sent.
+    SAFEARRAY* block = nullptr;
+    EXPECT_EQ(Io(*driver_.get()).RegisterMoveIn16(1, 0x40, 4, &block), E_QUORLEN731XX_IO_GENERAL);
+    EXPECT_NE(ErrorText().find("register access"), std::string::npos);
+    EXPECT_EQ(block, nullptr);
     EXPECT_EQ(io_->Written().size(), 2u);
 }
 
