@@ -59,6 +59,11 @@ private:
             if (pActual) *pActual = written;
             return hr;
         }
+        // No deadline of its own: the script answers at once.
+        HRESULT BeginOperation() override { return S_OK; }
+        HRESULT EndOperation() override { return S_OK; }
+        // Like a raw socket: a message ends with its line feed.
+        HRESULT get_HasEnd(VARIANT_BOOL* v) override { return *v = VARIANT_FALSE, S_OK; }
         HRESULT get_HardwareInterfaceType(SHORT* v) override { return *v = 6, S_OK; }
         HRESULT get_HardwareInterfaceNumber(SHORT* v) override { return *v = 0, S_OK; }
         HRESULT get_ResourceClass(BSTR*) override { return E_NOTIMPL; }
