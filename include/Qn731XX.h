@@ -505,6 +505,27 @@ QN731XX_API ViStatus Qn731XX_DigitalChannelReadDigitalWaveform(
     ViByte waveformArray[], ViInt32 *actualPoints, ViReal64 *initialX, ViReal64 *xIncrement);
 
 /* ------------------------------------------------------------------------ */
+/* System and display                                                        */
+/* ------------------------------------------------------------------------ */
+
+QN731XX_API ViStatus Qn731XX_SystemWaitForOperationComplete(ViSession vi,
+                                                            ViInt32 maxTimeMilliseconds);
+QN731XX_API ViStatus Qn731XX_SystemSaveState(ViSession vi, ViConstString identifier);
+QN731XX_API ViStatus Qn731XX_SystemRecallState(ViSession vi, ViConstString identifier);
+QN731XX_API ViStatus Qn731XX_SystemPutState(ViSession vi, ViInt32 size, ViByte data[]);
+/* At most size bytes are written; *actualSize is the number written. */
+QN731XX_API ViStatus Qn731XX_SystemGetState(ViSession vi, ViInt32 size, ViByte data[],
+                                            ViInt32 *actualSize);
+QN731XX_API ViStatus Qn731XX_SystemGetScreenBitmap(ViSession vi, ViInt32 size, ViByte data[],
+                                                   ViInt32 *actualSize);
+QN731XX_API ViStatus Qn731XX_SystemEnableLocalControls(ViSession vi);
+QN731XX_API ViStatus Qn731XX_SystemDisableLocalControls(ViSession vi);
+/* A message written to, and a reply read from, the instrument directly. */
+QN731XX_API ViStatus Qn731XX_SystemWrite(ViSession vi, ViConstString command);
+QN731XX_API ViStatus Qn731XX_SystemRead(ViSession vi, ViInt32 bufferSize, ViChar buffer[]);
+QN731XX_API ViStatus Qn731XX_DisplayErase(ViSession vi);
+
+/* ------------------------------------------------------------------------ */
 /* Status registers                                                          */
 /* ------------------------------------------------------------------------ */
 

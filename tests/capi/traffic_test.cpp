@@ -109,3 +109,24 @@ TEST_F(CTraffic, AMeasurementSelectsItsSourceAndCopiesOnlyAResult) {
 
 }  // namespace
 }  // namespace qn::test
+
+namespace qn::test {
+namespace {
+
+TEST_F(CTraffic, SystemFunctionsSendTheirCommands) {
+    OpenC();
+    io_->Expect("*SAV 3\n");
+    EXPECT_EQ(Qn731XX_SystemSaveState(vi_, "3"), VI_SUCCESS) << RecordedError(vi_);
+    io_->Expect(":CDIS\n");
+    EXPECT_EQ(Qn731XX_DisplayErase(vi_), VI_SUCCESS) << RecordedError(vi_);
+    // A text that would end the message is refused before anything is sent.
+    EXPECT_EQ(Qn731XX_SystemSaveState(vi_, "3\n*RST"), IVI_ERROR_INVALID_VALUE);
+    ViByte bytes[4];
+    ViInt32 actual = 0;
+    EXPECT_EQ(Qn731XX_SystemGetState(vi_, -1, bytes, &actual), IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(Qn731XX_SystemGetState(vi_, 4, bytes, nullptr), QN731XX_ERROR_FAILURE);
+    EXPECT_TRUE(io_->Done());
+}
+
+}  // namespace
+}  // namespace qn::test
