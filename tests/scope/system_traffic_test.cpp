@@ -353,6 +353,7 @@ void ExpectUnsupported(Quorlen731XX& d) {
     IQuorlen731XXSystem* system = &d;
     com::Bstr file("setup.scp");
     BSTR fetched = SysAllocString(u"x");
+    const BSTR callers = fetched;  // Fetch clears the pointer; the string stays the caller's
     VARIANT_BOOL b = VARIANT_FALSE;
     BSTR time = nullptr;
     const Case cases[] = {
@@ -375,8 +376,8 @@ void ExpectUnsupported(Quorlen731XX& d) {
         EXPECT_EQ(c.call(), c.hr);
         EXPECT_NE(ErrorText().find(c.text), std::string::npos);
     }
-    EXPECT_EQ(fetched, nullptr);  // Fetch clears its string first (the frame freed nothing: the
-    SysFreeString(fetched);       // caller's string stays the caller's)
+    EXPECT_EQ(fetched, nullptr);
+    SysFreeString(callers);
 }
 
 TEST_F(SystemTraffic, UnsupportedMembersFailWithTheirInserts) { ExpectUnsupported(*driver_.get()); }
