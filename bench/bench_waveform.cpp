@@ -2,10 +2,17 @@
 //
 // - BM_ConvertWords: raw 16-bit words to doubles with the invalid-point check,
 //   against BM_CopyDoubles, a plain memcpy of as many doubles.
-// - BM_Fetch_Driver: IQuorlen731XXMeasurement::FetchWaveform of a prepared
-//   record served from the emulator's memory over loopback, against
-//   BM_Fetch_BareSocket: a blocking socket that sends ":WAV:DATA?", reads the
-//   same block and converts it with the same formula.
+// - BM_Fetch_DriverLoop: IQuorlen731XXMeasurement::FetchWaveform in a loop
+//   with its output array passed back in, against the independent block
+//   server, beside BM_Wire_BareReader (the bare reader into a reused buffer:
+//   the limit of the wire) and BM_Wire_BareReaderConvert (the same plus the
+//   conversion into a reused array: the limit of a fetch);
+// - BM_Fetch_DriverFirst: the first fetch of a new session into a new array,
+//   with the peak memory it added;
+// - BM_Fetch_DriverEmulator: the loop against the emulator serving the same
+//   prepared record;
+// - BM_Fetch_Sessions: 1, 2 and 8 sessions in as many threads, each against
+//   an emulator of its own (items per second is the aggregate throughput).
 #include <arpa/inet.h>
 #include <benchmark/benchmark.h>
 #include <netinet/in.h>
@@ -13,11 +20,17 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
 #include <cstring>
+#include <map>
+#include <mutex>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "bench/block_server.h"
 #include "bench/ratio_reporter.h"
 #include "core/root.h"
 #include "emulator/emulator.h"
@@ -57,7 +70,8 @@ void BM_CopyDoubles(benchmark::State& state) {
     state.SetItemsProcessed(state.iterations() * static_cast<long>(n));
 }
 
-// A word block of n points as the instrument sends it (big-endian).
+// A word block of n points as the instrument sends it (big-endian), with
+// the message's final line feed.
 std::string WordBlock(std::size_t n) {
     const std::vector<std::int16_t> raw = RawRecord(n);
     std::string payload(2 * n, '\0');
@@ -67,119 +81,208 @@ std::string WordBlock(std::size_t n) {
         payload[2 * i + 1] = static_cast<char>(w & 0xFF);
     }
     const std::string len = std::to_string(payload.size());
-    return "#" + std::to_string(len.size()) + len + payload;
+    return "#" + std::to_string(len.size()) + len + payload + "\n";
 }
 
-std::unique_ptr<qn::emu::Emulator> StartEmulator(std::size_t points) {
-    auto emu = std::make_unique<qn::emu::Emulator>("QDS4032A");
-    emu->Start();
-    emu->ServeWaveformData(WordBlock(points));
-    return emu;
-}
-
-void BM_Fetch_Driver(benchmark::State& state) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    auto emu = StartEmulator(static_cast<std::size_t>(state.range(0)));
-    auto driver = qn::com::MakeComObject<qn::Quorlen731XX>();
-    qn::com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(emu->port()) + "::SOCKET"), o("");
-    if (FAILED(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get())) ||
-        FAILED(qn::Io(*driver.get()).SetIOTimeout(20000))) {
-        state.SkipWithError("cannot open the session");
-        return;
-    }
-    ComPtr<IQuorlen731XXMeasurement> m;
-    qn::com::Bstr name("Channel1");
-    static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(name.get(), m.Out());
-    for (auto _ : state) {
-        SAFEARRAY* a = nullptr;
-        double x0 = 0, dx = 0;
-        if (FAILED(m->FetchWaveform(&a, &x0, &dx))) {
-            state.SkipWithError("fetch failed");
-            break;
-        }
-        qn::com::SafeArray owner(a);
-        benchmark::DoNotOptimize(owner.data<double>());
-    }
-    state.SetItemsProcessed(state.iterations() * state.range(0));
-    driver->Close();
-}
-
-// The least a client can do: one query, one block, one conversion.
-class BareClient {
-public:
-    explicit BareClient(std::uint16_t port) {
-        fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_port = htons(port);
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        int one = 1;
-        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-        ok_ = ::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) == 0;
-    }
-    ~BareClient() { ::close(fd_); }
-    BareClient(const BareClient&) = delete;
-    BareClient& operator=(const BareClient&) = delete;
-    bool ok() const { return ok_; }
-
-    bool ReadExactly(void* buf, std::size_t n) {
-        auto* p = static_cast<char*>(buf);
-        while (n > 0) {
-            const ssize_t got = ::recv(fd_, p, n, 0);
-            if (got <= 0) return false;
-            p += got;
-            n -= static_cast<std::size_t>(got);
-        }
-        return true;
-    }
-    // Fetches and converts one record; false on any protocol surprise.
-    bool Fetch(const qn::WaveformScaling& s, std::vector<double>* out) {
-        static const char kQuery[] = ":WAV:DATA?\n";
-        if (::send(fd_, kQuery, sizeof kQuery - 1, 0) != sizeof kQuery - 1) return false;
-        char head[2];
-        if (!ReadExactly(head, 2) || head[0] != '#' || head[1] < '1' || head[1] > '9') return false;
-        char digits[10] = {};
-        if (!ReadExactly(digits, std::size_t(head[1] - '0'))) return false;
-        const std::size_t bytes = std::strtoul(digits, nullptr, 10);
-        std::vector<std::int16_t> raw(bytes / 2);
-        char end;
-        if (!ReadExactly(raw.data(), bytes) || !ReadExactly(&end, 1)) return false;
-        for (auto& w : raw) w = static_cast<std::int16_t>(__builtin_bswap16(static_cast<std::uint16_t>(w)));
-        out->resize(raw.size());
-        qn::ConvertWords(raw.data(), raw.size(), s, out->data());
-        return true;
-    }
-
-private:
-    int fd_ = -1;
-    bool ok_ = false;
+// One instrument per record size and kind, started on first use and kept for
+// the whole run: the emulator serving a prepared record, and the block server
+// (taught its small replies by an emulator of its own).
+struct Peers {
+    std::unique_ptr<qn::emu::Emulator> emulator;
+    std::unique_ptr<qn::emu::Emulator> teacher;
+    std::unique_ptr<qn::bench::BlockServer> server;
 };
 
-void BM_Fetch_BareSocket(benchmark::State& state) {
-    auto emu = StartEmulator(static_cast<std::size_t>(state.range(0)));
-    BareClient client(emu->port());
-    if (!client.ok()) {
-        state.SkipWithError("cannot connect");
-        return;
+Peers& PeersFor(std::size_t points) {
+    static std::map<std::size_t, Peers> all;
+    static std::mutex m;
+    std::lock_guard<std::mutex> lock(m);
+    Peers& p = all[points];
+    if (!p.server) {
+        const std::string block = WordBlock(points);
+        p.emulator = std::make_unique<qn::emu::Emulator>("QDS4032A");
+        p.emulator->Start();
+        p.emulator->ServeWaveformData(block.substr(0, block.size() - 1));
+        p.teacher = std::make_unique<qn::emu::Emulator>("QDS4032A");
+        p.teacher->Start();
+        p.server = std::make_unique<qn::bench::BlockServer>(block, p.teacher->port());
     }
-    const qn::WaveformScaling s{0, 0, 0.25, 1.25e-4, 0};
+    return p;
+}
+
+// A driver session on `resource` and its Channel1 measurement.
+struct DriverSession {
+    ComPtr<qn::Quorlen731XX> driver;
+    ComPtr<IQuorlen731XXMeasurement> measurement;
+
+    explicit DriverSession(const std::string& resource) {
+        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+        driver = qn::com::MakeComObject<qn::Quorlen731XX>();
+        qn::com::Bstr r(resource), o("");
+        if (FAILED(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get())) ||
+            FAILED(qn::Io(*driver.get()).SetIOTimeout(20000)))
+            return;
+        qn::com::Bstr name("Channel1");
+        static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(name.get(),
+                                                                         measurement.Out());
+    }
+    ~DriverSession() { driver->Close(); }
+};
+
+// Peak resident memory is reset (Linux: clear_refs 5) before a measured step
+// and read afterwards (VmHWM), in bytes.
+void ResetPeakMemory() {
+    if (std::FILE* f = std::fopen("/proc/self/clear_refs", "w")) {
+        std::fputs("5", f);
+        std::fclose(f);
+    }
+}
+double MemoryKb(const char* key) {
+    double kb = 0;
+    if (std::FILE* f = std::fopen("/proc/self/status", "r")) {
+        char line[256];
+        while (std::fgets(line, sizeof line, f))
+            if (std::strncmp(line, key, std::strlen(key)) == 0) kb = std::atof(line + std::strlen(key));
+        std::fclose(f);
+    }
+    return kb;
+}
+
+const qn::WaveformScaling kScaling{0, 0, 0.25, 1.25e-4, 0};
+
+// The limit of the wire: the bare reader into its reused buffer.
+void BM_Wire_BareReader(benchmark::State& state) {
+    const auto points = static_cast<std::size_t>(state.range(0));
+    qn::bench::BareReader reader(PeersFor(points).server->port());
     for (auto _ : state) {
-        std::vector<double> out;  // a new result per fetch, as the driver returns
-        if (!client.Fetch(s, &out)) {
+        std::size_t bytes = 0;
+        const std::uint8_t* data = reader.Fetch(&bytes);
+        if (!data || bytes != 2 * points) {
             state.SkipWithError("fetch failed");
             break;
         }
+        benchmark::DoNotOptimize(data);
+    }
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+
+// The limit of a fetch: the bare reader, then the byte order and the
+// conversion into a reused array of doubles.
+void BM_Wire_BareReaderConvert(benchmark::State& state) {
+    const auto points = static_cast<std::size_t>(state.range(0));
+    qn::bench::BareReader reader(PeersFor(points).server->port());
+    std::vector<std::int16_t> words(points);
+    std::vector<double> out(points);
+    for (auto _ : state) {
+        std::size_t bytes = 0;
+        const std::uint8_t* data = reader.Fetch(&bytes);
+        if (!data || bytes != 2 * points) {
+            state.SkipWithError("fetch failed");
+            break;
+        }
+        for (std::size_t i = 0; i < points; ++i)
+            words[i] = static_cast<std::int16_t>(data[2 * i] << 8 | data[2 * i + 1]);
+        qn::ConvertWords(words.data(), points, kScaling, out.data());
         benchmark::DoNotOptimize(out.data());
     }
     state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 
+// FetchWaveform in a loop, the output array passed back in each time.
+void FetchLoop(benchmark::State& state, const std::string& resource) {
+    DriverSession s(resource);
+    if (!s.measurement) {
+        state.SkipWithError("cannot open the session");
+        return;
+    }
+    qn::com::SafeArray array;
+    for (auto _ : state) {
+        SAFEARRAY* a = array.Detach();
+        double x0 = 0, dx = 0;
+        const HRESULT hr = s.measurement->FetchWaveform(&a, &x0, &dx);
+        array = qn::com::SafeArray(a);
+        if (FAILED(hr) || array.size() != std::size_t(state.range(0))) {
+            state.SkipWithError("fetch failed");
+            break;
+        }
+        benchmark::DoNotOptimize(array.data<double>());
+    }
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+
+void BM_Fetch_DriverLoop(benchmark::State& state) {
+    FetchLoop(state, PeersFor(std::size_t(state.range(0))).server->Resource());
+}
+
+// The same loop against the emulator serving the prepared record from memory.
+void BM_Fetch_DriverEmulator(benchmark::State& state) {
+    const auto& emu = *PeersFor(std::size_t(state.range(0))).emulator;
+    FetchLoop(state, "TCPIP0::127.0.0.1::" + std::to_string(emu.port()) + "::SOCKET");
+}
+
+// The first FetchWaveform of a new session into a new array: receive buffer
+// and output pages are fresh. Reports the peak memory the call added, as a
+// fraction of the raw block plus the output array.
+void BM_Fetch_DriverFirst(benchmark::State& state) {
+    const auto points = static_cast<std::size_t>(state.range(0));
+    const std::string resource = PeersFor(points).server->Resource();
+    double peak_ratio = 0;
+    for (auto _ : state) {
+        state.PauseTiming();
+        auto s = std::make_unique<DriverSession>(resource);
+        if (!s->measurement) {
+            state.SkipWithError("cannot open the session");
+            break;
+        }
+        ResetPeakMemory();
+        const double before = MemoryKb("VmRSS:");
+        state.ResumeTiming();
+        SAFEARRAY* a = nullptr;
+        double x0 = 0, dx = 0;
+        const HRESULT hr = s->measurement->FetchWaveform(&a, &x0, &dx);
+        state.PauseTiming();
+        const double added = (MemoryKb("VmHWM:") - before) * 1024;
+        peak_ratio = std::max(peak_ratio, added / double(points * (2 + 8)));
+        qn::com::SafeArray owner(a);
+        if (FAILED(hr)) state.SkipWithError("fetch failed");
+        s.reset();
+        state.ResumeTiming();
+    }
+    state.counters["peak_vs_block_plus_output"] = peak_ratio;
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+
+// Eight sessions in eight threads, each against an emulator of its own,
+// fetching 1,000,000 points in a loop: throughput grows with the threads
+// until the machine's cores are busy, when no lock is shared between sessions.
+void BM_Fetch_Sessions(benchmark::State& state) {
+    static std::vector<std::unique_ptr<qn::emu::Emulator>> emulators;
+    static std::once_flag once;
+    constexpr std::size_t kPoints = 1000000;
+    std::call_once(once, [] {
+        const std::string block = WordBlock(kPoints);
+        for (int i = 0; i < 8; ++i) {
+            emulators.push_back(std::make_unique<qn::emu::Emulator>("QDS4032A"));
+            emulators.back()->Start();
+            emulators.back()->ServeWaveformData(block.substr(0, block.size() - 1));
+        }
+    });
+    const auto& emu = *emulators[std::size_t(state.thread_index())];
+    FetchLoop(state, "TCPIP0::127.0.0.1::" + std::to_string(emu.port()) + "::SOCKET");
+}
+
 BENCHMARK(BM_ConvertWords)->Arg(1 << 20)->Repetitions(kRepetitions)->ReportAggregatesOnly(true);
 BENCHMARK(BM_CopyDoubles)->Arg(1 << 20)->Repetitions(kRepetitions)->ReportAggregatesOnly(true);
-BENCHMARK(BM_Fetch_Driver)->Arg(1000000)->Arg(8000000)->Repetitions(kRepetitions)->ReportAggregatesOnly(true)
-    ->Unit(benchmark::kMillisecond)->UseRealTime();
-BENCHMARK(BM_Fetch_BareSocket)->Arg(1000000)->Arg(8000000)->Repetitions(kRepetitions)->ReportAggregatesOnly(true)
-    ->Unit(benchmark::kMillisecond)->UseRealTime();
+#define QN_FETCH_BENCH(name)                                                              \
+    BENCHMARK(name)->Arg(1000000)->Arg(8000000)->Repetitions(kRepetitions)                \
+        ->ReportAggregatesOnly(true)->Unit(benchmark::kMillisecond)->UseRealTime()
+QN_FETCH_BENCH(BM_Wire_BareReader);
+QN_FETCH_BENCH(BM_Wire_BareReaderConvert);
+QN_FETCH_BENCH(BM_Fetch_DriverLoop);
+QN_FETCH_BENCH(BM_Fetch_DriverEmulator);
+QN_FETCH_BENCH(BM_Fetch_DriverFirst)->Iterations(5);
+BENCHMARK(BM_Fetch_Sessions)->Threads(1)->Threads(2)->Threads(8)->Repetitions(3)
+    ->ReportAggregatesOnly(true)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 }  // namespace
 
@@ -187,6 +290,10 @@ int main(int argc, char** argv) {
     return qn::bench::RunWithRatios(
         argc, argv,
         {{"BM_ConvertWords/1048576", "BM_CopyDoubles/1048576", 2.5, 2.5},
-         {"BM_Fetch_Driver/1000000", "BM_Fetch_BareSocket/1000000", 1.3, 0},
-         {"BM_Fetch_Driver/8000000", "BM_Fetch_BareSocket/8000000", 1.2, 0}});
+         {"BM_Fetch_DriverLoop/1000000", "BM_Wire_BareReader/1000000", 1.5, 0},
+         {"BM_Fetch_DriverLoop/8000000", "BM_Wire_BareReader/8000000", 2.0, 0},
+         {"BM_Fetch_DriverFirst/8000000", "BM_Wire_BareReader/8000000", 4.0, 0},
+         {"BM_Fetch_DriverLoop/1000000", "BM_Wire_BareReaderConvert/1000000", 0, 0},
+         {"BM_Fetch_DriverLoop/8000000", "BM_Wire_BareReaderConvert/8000000", 0, 0},
+         {"BM_Fetch_DriverEmulator/8000000", "BM_Fetch_DriverLoop/8000000", 1.2, 0}});
 }

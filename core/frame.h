@@ -114,6 +114,9 @@ template <class T>
 void Preset(T* p) {
     *p = T{};
 }
+// An output array is left as the caller passed it: the waveform members
+// reuse an array of the right type and size instead of replacing it.
+inline void Preset(SAFEARRAY** /*p*/) {}
 
 HRESULT CheckOut(CDriverNode& node, const MemberInfo& m, std::size_t index, const void* p);
 // The text with line feeds and NULs shown as \n and \0, for error messages.

@@ -297,6 +297,23 @@ HRESULT CDriverIOManager::FormattedReadIEEEBlockInto(LONG type, void* buf, LONG 
                                          flush ? VARIANT_TRUE : VARIANT_FALSE);
     });
 }
+HRESULT CDriverIOManager::FormattedReadIEEEBlockToSession(LONG type, const void** view,
+                                                          LONG* actual, bool seek, bool flush,
+                                                          LONG timeout, bool poll) {
+    if (!view || !actual) return E_POINTER;
+    *view = nullptr;
+    *actual = 0;
+    CDriverIOProvider& p = Provider();
+    IFormattedIO488Direct* direct = p.FormattedDirect();
+    return Formatted("FormattedReadIEEEBlock", timeout, poll, [&](IFormattedIO488*) -> HRESULT {
+        if (!direct) return E_FAIL;
+        HRESULT hr = direct->ReadIEEEBlockToSink(BinaryType(type), &p.Receive(), actual,
+                                                 seek ? VARIANT_TRUE : VARIANT_FALSE,
+                                                 flush ? VARIANT_TRUE : VARIANT_FALSE);
+        if (SUCCEEDED(hr)) *view = p.Receive().data();
+        return hr;
+    });
+}
 HRESULT CDriverIOManager::FormattedFlushWrite(bool send_end, LONG timeout) {
     return Formatted("FormattedFlushWrite", timeout, true, [&](IFormattedIO488* io) {
         return io->FlushWrite(send_end ? VARIANT_TRUE : VARIANT_FALSE);

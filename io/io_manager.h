@@ -121,6 +121,12 @@ public:
     HRESULT FormattedReadIEEEBlockInto(LONG type, void* buf, LONG max_count, LONG* actual,
                                        bool seek_to_block, bool flush_to_end,
                                        LONG timeout = kTimeoutSession, bool poll = true);
+    // A binary block into the session's receive buffer (kept between
+    // reads); *view receives the elements, valid until the next block read
+    // or Close.
+    HRESULT FormattedReadIEEEBlockToSession(LONG type, const void** view, LONG* actual,
+                                            bool seek_to_block, bool flush_to_end,
+                                            LONG timeout = kTimeoutSession, bool poll = true);
     HRESULT FormattedFlushWrite(bool send_end, LONG timeout = kTimeoutSession);
     // Typed and counted-array forms of the formatted operations (element
     // types SHORT, LONG, float, double; BYTE for blocks).

@@ -14,6 +14,7 @@
 
 #include "core/error_manager.h"
 #include "core/session.h"
+#include "io/receive_buffer.h"
 #include "platform/com/com.h"
 #include "platform/visa/visa.h"
 
@@ -93,6 +94,10 @@ public:
     // Releases the session; closing a closed provider does nothing.
     virtual void Close() = 0;
 
+    // The session's memory for binary blocks, kept between reads and
+    // released by Close.
+    ReceiveBuffer& Receive() { return receive_; }
+
     // Raw VISA-COM objects of the session (null when closed or when the
     // provider has none); no reference added.
     virtual IMessage* MessageInterface() const = 0;
@@ -133,6 +138,7 @@ protected:
 
     bool initialized_ = false;
     bool timed_out_ = false;
+    ReceiveBuffer receive_{std::size_t(visa::kDefaultMaxBlockBytes)};
 
 private:
     // Runs op as one operation of the session (one deadline for all of it).

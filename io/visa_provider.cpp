@@ -80,6 +80,7 @@ void CVisaComIOProvider::Close() {
     direct_.reset();
     message_.reset();
     register_.reset();
+    receive_.Release();
     initialized_ = false;
     timed_out_ = false;
     SetOwnerFlags(nullptr);

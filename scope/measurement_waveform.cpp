@@ -18,48 +18,57 @@ constexpr std::size_t kSimulatedMinMaxPoints = 3;
 
 // A simulated record: pseudo-random whole numbers times 0.01, different at
 // each call.
-SAFEARRAY* SimulatedRecord() {
+HRESULT SimulatedRecord(CDriverNode& node, const char* member, SAFEARRAY** array) {
+    double* dst = nullptr;
+    std::size_t n = 0;
+    HRESULT hr = PlaceOutput(node, member, "WaveformArray", array, kSimulatedPoints, &dst, &n);
+    if (FAILED(hr)) return hr;
     std::minstd_rand gen(static_cast<std::uint_fast32_t>(
         std::chrono::system_clock::now().time_since_epoch().count()));
     std::uniform_int_distribution<int> value(0, 32767);
-    com::SafeArray a = com::SafeArray::Vector(VT_R8, kSimulatedPoints);
-    if (!a) throw std::bad_alloc();
-    for (std::size_t i = 0; i < kSimulatedPoints; ++i) a.data<double>()[i] = value(gen) * 0.01;
-    return a.Detach();
+    for (std::size_t i = 0; i < n; ++i) dst[i] = value(gen) * 0.01;
+    return S_OK;
 }
 
-SAFEARRAY* Zeros(std::size_t n) {
-    com::SafeArray a = com::SafeArray::Vector(VT_R8, static_cast<ULONG>(n));
-    if (!a) throw std::bad_alloc();
-    for (std::size_t i = 0; i < n; ++i) a.data<double>()[i] = 0.0;
-    return a.Detach();
+HRESULT SimulatedMinMax(CDriverNode& node, const char* member, SAFEARRAY** min,
+                        SAFEARRAY** max) {
+    double* lo = nullptr;
+    double* hi = nullptr;
+    std::size_t n_lo = 0, n_hi = 0;
+    HRESULT hr = PlaceOutput(node, member, "MinWaveform", min, kSimulatedMinMaxPoints, &lo, &n_lo);
+    if (SUCCEEDED(hr))
+        hr = PlaceOutput(node, member, "MaxWaveform", max, kSimulatedMinMaxPoints, &hi, &n_hi);
+    if (FAILED(hr)) return hr;
+    for (std::size_t i = 0; i < n_lo; ++i) lo[i] = 0.0;
+    for (std::size_t i = 0; i < n_hi; ++i) hi[i] = 0.0;
+    return S_OK;
 }
 
 // Sends ":DIG" under the session timeout: the instrument acquires before it
 // runs the next command.
 HRESULT Digitize(CDriverNode& node) { return Io(node).InstrWrite(":DIG"); }
 
-HRESULT TransferRecord(Quorlen731XXUserMeasurement& m, LONG timeout, ScalingQuery scaling,
-                       SAFEARRAY** array, double* initial_x, double* x_increment) {
+HRESULT TransferRecord(Quorlen731XXUserMeasurement& m, const char* member, LONG timeout,
+                       ScalingQuery scaling, SAFEARRAY** array, double* initial_x, double* x_increment) {
     RawWaveform raw;
     HRESULT hr = TransferWaveform(m, timeout, false, scaling, &raw);
     if (FAILED(hr)) return hr;
     bool invalid = false;
-    hr = ConvertRecord(raw, array, &invalid);
+    hr = ConvertRecord(m, member, raw, array, &invalid);
     if (FAILED(hr)) return hr;
     *initial_x = raw.scaling.x_origin;
     *x_increment = raw.scaling.x_increment;
     return invalid ? ReportInvalidElements(m) : hr;
 }
 
-HRESULT TransferMinMax(Quorlen731XXUserMeasurement& m, LONG timeout, ScalingQuery scaling,
-                       SAFEARRAY** min, SAFEARRAY** max, double* initial_x,
+HRESULT TransferMinMax(Quorlen731XXUserMeasurement& m, const char* member, LONG timeout,
+                       ScalingQuery scaling, SAFEARRAY** min, SAFEARRAY** max, double* initial_x,
                        double* x_increment) {
     RawWaveform raw;
     HRESULT hr = TransferWaveform(m, timeout, true, scaling, &raw);
     if (FAILED(hr)) return hr;
     bool invalid = false;
-    hr = SplitMinMax(raw, min, max, &invalid);
+    hr = SplitMinMax(m, member, raw, min, max, &invalid);
     if (FAILED(hr)) return hr;
     *initial_x = raw.scaling.x_origin;
     *x_increment = raw.scaling.x_increment;
@@ -70,55 +79,43 @@ HRESULT TransferMinMax(Quorlen731XXUserMeasurement& m, LONG timeout, ScalingQuer
 
 HRESULT Quorlen731XXUserMeasurement::IQuorlen731XXMeasurement_FetchWaveform_Body(
     SAFEARRAY** WaveformArray, double* InitialX, double* XIncrement) {
-    if (Core().Simulating()) {
-        *WaveformArray = SimulatedRecord();
-        return S_OK;
-    }
+    if (Core().Simulating()) return SimulatedRecord(*this, "FetchWaveform", WaveformArray);
     LONG timeout = 0;
     HRESULT hr = Io(*this).GetIOTimeout(&timeout);
     if (FAILED(hr)) return hr;
-    return TransferRecord(*this, timeout, ScalingQuery::kPreamble, WaveformArray, InitialX,
+    return TransferRecord(*this, "FetchWaveform", timeout, ScalingQuery::kPreamble, WaveformArray, InitialX,
                           XIncrement);
 }
 
 HRESULT Quorlen731XXUserMeasurement::IQuorlen731XXMeasurement_ReadWaveform_Body(
     Quorlen731XXTimeOutEnum MaxTime, SAFEARRAY** WaveformArray, double* InitialX,
     double* XIncrement) {
-    if (Core().Simulating()) {
-        *WaveformArray = SimulatedRecord();
-        return S_OK;
-    }
+    if (Core().Simulating()) return SimulatedRecord(*this, "ReadWaveform", WaveformArray);
     HRESULT hr = Digitize(*this);
     if (FAILED(hr)) return hr;
-    return TransferRecord(*this, MaxTime, ScalingQuery::kFactors, WaveformArray, InitialX,
+    return TransferRecord(*this, "ReadWaveform", MaxTime, ScalingQuery::kFactors, WaveformArray, InitialX,
                           XIncrement);
 }
 
 HRESULT Quorlen731XXUserMeasurement::IQuorlen731XXMeasurement_FetchWaveformMinMax_Body(
     SAFEARRAY** MinWaveform, SAFEARRAY** MaxWaveform, double* InitialX, double* XIncrement) {
-    if (Core().Simulating()) {
-        *MinWaveform = Zeros(kSimulatedMinMaxPoints);
-        *MaxWaveform = Zeros(kSimulatedMinMaxPoints);
-        return S_OK;
-    }
+    if (Core().Simulating())
+        return SimulatedMinMax(*this, "FetchWaveformMinMax", MinWaveform, MaxWaveform);
     LONG timeout = 0;
     HRESULT hr = Io(*this).GetIOTimeout(&timeout);
     if (FAILED(hr)) return hr;
-    return TransferMinMax(*this, timeout, ScalingQuery::kPreamble, MinWaveform, MaxWaveform,
+    return TransferMinMax(*this, "FetchWaveformMinMax", timeout, ScalingQuery::kPreamble, MinWaveform, MaxWaveform,
                           InitialX, XIncrement);
 }
 
 HRESULT Quorlen731XXUserMeasurement::IQuorlen731XXMeasurement_ReadWaveformMinMax_Body(
     Quorlen731XXTimeOutEnum MaxTime, SAFEARRAY** MinWaveform, SAFEARRAY** MaxWaveform,
     double* InitialX, double* XIncrement) {
-    if (Core().Simulating()) {
-        *MinWaveform = Zeros(kSimulatedMinMaxPoints);
-        *MaxWaveform = Zeros(kSimulatedMinMaxPoints);
-        return S_OK;
-    }
+    if (Core().Simulating())
+        return SimulatedMinMax(*this, "ReadWaveformMinMax", MinWaveform, MaxWaveform);
     HRESULT hr = Digitize(*this);
     if (FAILED(hr)) return hr;
-    return TransferMinMax(*this, MaxTime, ScalingQuery::kFactors, MinWaveform, MaxWaveform,
+    return TransferMinMax(*this, "ReadWaveformMinMax", MaxTime, ScalingQuery::kFactors, MinWaveform, MaxWaveform,
                           InitialX, XIncrement);
 }
 

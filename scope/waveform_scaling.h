@@ -28,10 +28,16 @@ inline constexpr std::int16_t kInvalidWord = -32768;
 // overlap `raw`.
 bool ConvertWords(const std::int16_t* raw, std::size_t n, const WaveformScaling& s, double* out);
 
-// The same conversion of a record of (minimum, maximum) pairs: element 2k
-// goes to min[k], element 2k + 1 to max[k], for k < pairs.
-bool ConvertWordPairs(const std::int16_t* raw, std::size_t pairs, const WaveformScaling& s,
-                      double* min, double* max);
+// The same conversion of a record as the instrument sends it: 2 * n bytes,
+// each word most significant byte first.
+bool ConvertWordsMsbFirst(const std::uint8_t* raw, std::size_t n, const WaveformScaling& s,
+                          double* out);
+
+// The conversion of a record of (minimum, maximum) pairs sent most
+// significant byte first: word 2k goes to min[k], word 2k + 1 to max[k], for
+// k < pairs.
+bool ConvertWordPairsMsbFirst(const std::uint8_t* raw, std::size_t pairs,
+                              const WaveformScaling& s, double* min, double* max);
 
 // out[i] = 1.0 when bit `bit` (0..7) of raw[i] is set, else 0.0.
 void ExtractBit(const std::uint8_t* raw, std::size_t n, int bit, double* out);

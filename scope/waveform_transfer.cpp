@@ -2,6 +2,7 @@
 // measurement objects.
 #include "scope/waveform_transfer.h"
 
+#include <algorithm>
 #include <cctype>
 #include <cstring>
 #include <utility>
@@ -98,12 +99,6 @@ HRESULT CheckRecordType(CDriverNode& node, bool peak) {
     return S_OK;
 }
 
-com::SafeArray NewVector(std::size_t n) {
-    com::SafeArray a = com::SafeArray::Vector(VT_R8, static_cast<ULONG>(n));
-    if (!a) throw std::bad_alloc();
-    return a;
-}
-
 }  // namespace
 
 std::string MeasurementSourceName(const Quorlen731XXUserMeasurement& m) {
@@ -132,8 +127,13 @@ std::string MeasurementSCPISource(const Quorlen731XXUserMeasurement& m) {
     return MeasurementSourceName(m);
 }
 
-HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG element_type,
-                         com::SafeArray* out) {
+namespace {
+
+// Sends `command` and runs `read` for the binary block of its reply, with
+// the instrument-status check and the termination character switched off
+// (both restored on every path); the rest of the message is discarded.
+template <class Read>
+HRESULT QueryBlock(CDriverNode& node, std::string_view command, Read&& read) {
     StatusPollingOff polling(node.Core());
     CDriverIOManager io(node);
     HRESULT hr = io.InstrWrite(command);
@@ -141,14 +141,24 @@ HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG eleme
     TermCharOff term(node);
     hr = term.Disable();
     if (FAILED(hr)) return hr;
-    com::Variant block;
-    hr = io.FormattedReadIEEEBlock(element_type, false, false, &block);
+    hr = read(io);
     if (FAILED(hr)) return hr;
     // The rest of the message (its terminator, or bytes beyond the declared
     // length) is discarded with the termination character enabled again: a
     // transport without an end-of-message signal ends the message only there.
     hr = term.Restore();
     if (SUCCEEDED(hr)) hr = io.FormattedFlushRead();
+    return hr;
+}
+
+}  // namespace
+
+HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG element_type,
+                         com::SafeArray* out) {
+    com::Variant block;
+    HRESULT hr = QueryBlock(node, command, [&](CDriverIOManager& io) {
+        return io.FormattedReadIEEEBlock(element_type, false, false, &block);
+    });
     if (FAILED(hr)) return hr;
     const VARTYPE expected =
         element_type == visa::BinaryType_UI1 ? VARTYPE(VT_ARRAY | VT_UI1) : VARTYPE(VT_ARRAY | VT_I2);
@@ -160,9 +170,18 @@ HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG eleme
     return S_OK;
 }
 
-HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* out) {
-    return QueryBinaryBlock(node, ":WAV:DATA?", element_type, out);
+HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, RawWaveform* out) {
+    const void* view = nullptr;
+    LONG count = 0;
+    HRESULT hr = QueryBlock(node, ":WAV:DATA?", [&](CDriverIOManager& io) {
+        return io.FormattedReadIEEEBlockToSession(element_type, &view, &count, false, false);
+    });
+    if (FAILED(hr)) return hr;
+    out->data = view;
+    out->count = std::size_t(count);
+    return S_OK;
 }
+
 
 HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak,
                          ScalingQuery scaling, RawWaveform* out) {
@@ -180,9 +199,16 @@ HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak
                                                 : ReadFactors(m, &out->scaling);
     if (SUCCEEDED(hr)) hr = CheckRecordType(m, peak);
     if (SUCCEEDED(hr))
-        hr = ReadWaveformData(m, out->bytes ? visa::BinaryType_UI1 : visa::BinaryType_I2,
-                              &out->data);
+        hr = ReadWaveformData(m, visa::BinaryType_UI1, out);
     if (FAILED(hr)) return hr;
+    if (!out->bytes) {
+        // Words stay in the order they came in; the conversion reads them so.
+        if (out->count % 2)
+            return m.Errors().Error(Msg::E_QUORLEN731XX_IO_GENERAL,
+                                    {"block of " + std::to_string(out->count) +
+                                     " bytes is not a whole number of 16-bit words"});
+        out->count /= 2;
+    }
     const RepCapLists& r = m.Core().repcaps;
     if (out->bytes && r.digital_measurements.Contains(m.Position()))
         out->bit = static_cast<int>((m.Position() - r.digital_measurements.first) %
@@ -190,36 +216,73 @@ HRESULT TransferWaveform(Quorlen731XXUserMeasurement& m, LONG timeout, bool peak
     return S_OK;
 }
 
-HRESULT ConvertRecord(const RawWaveform& raw, SAFEARRAY** out, bool* invalid) {
-    const std::size_t n = raw.data.size();
-    com::SafeArray result = NewVector(n);
-    *invalid = false;
-    if (raw.bytes)
-        ExtractBit(raw.data.data<std::uint8_t>(), n, raw.bit, result.data<double>());
-    else
-        *invalid = ConvertWords(raw.data.data<std::int16_t>(), n, raw.scaling,
-                                result.data<double>());
-    *out = result.Detach();
+HRESULT PlaceOutput(CDriverNode& node, const char* member, const char* param, SAFEARRAY** array,
+                    VARTYPE vt, std::size_t n, void** dst, std::size_t* placed) {
+    SAFEARRAY* given = *array;
+    const bool plain_vector = given && given->cDims == 1 && given->vt == vt &&
+                              given->rgsabound[0].lLbound == 0 && given->cLocks == 0;
+    *placed = n;
+    if (given && (given->fFeatures & FADF_FIXEDSIZE)) {
+        if (!plain_vector)
+            return node.Errors().InvalidValue(member, param,
+                                              std::int32_t(com::SafeArrayCount(given)));
+        *placed = std::min<std::size_t>(n, given->rgsabound[0].cElements);
+        given->rgsabound[0].cElements = ULONG(*placed);
+        *dst = given->pvData;
+        return S_OK;
+    }
+    if (plain_vector && given->rgsabound[0].cElements == n) {
+        *dst = given->pvData;
+        return S_OK;
+    }
+    com::SafeArray fresh = com::SafeArray::Vector(vt, static_cast<ULONG>(n));
+    if (!fresh) throw std::bad_alloc();
+    if (given && given->cLocks == 0) SafeArrayDestroy(given);
+    *dst = fresh.get()->pvData;
+    *array = fresh.Detach();
     return S_OK;
 }
 
-HRESULT SplitMinMax(const RawWaveform& raw, SAFEARRAY** min, SAFEARRAY** max, bool* invalid) {
-    const std::size_t pairs = raw.data.size() / 2;
-    com::SafeArray lo = NewVector(pairs), hi = NewVector(pairs);
+HRESULT ConvertRecord(CDriverNode& node, const char* member, const RawWaveform& raw,
+                      SAFEARRAY** out, bool* invalid) {
+    double* dst = nullptr;
+    std::size_t n = 0;
+    HRESULT hr = PlaceOutput(node, member, "WaveformArray", out, raw.count, &dst, &n);
+    if (FAILED(hr)) return hr;
+    *invalid = false;
+    if (raw.bytes)
+        ExtractBit(static_cast<const std::uint8_t*>(raw.data), n, raw.bit, dst);
+    else
+        *invalid = ConvertWordsMsbFirst(static_cast<const std::uint8_t*>(raw.data), n, raw.scaling,
+                                        dst);
+    return S_OK;
+}
+
+HRESULT SplitMinMax(CDriverNode& node, const char* member, const RawWaveform& raw,
+                    SAFEARRAY** min, SAFEARRAY** max, bool* invalid) {
+    double* lo = nullptr;
+    double* hi = nullptr;
+    std::size_t n_lo = 0, n_hi = 0;
+    HRESULT hr = PlaceOutput(node, member, "MinWaveform", min, raw.count / 2, &lo, &n_lo);
+    if (SUCCEEDED(hr)) hr = PlaceOutput(node, member, "MaxWaveform", max, raw.count / 2, &hi, &n_hi);
+    if (FAILED(hr)) return hr;
+    // Arrays of the caller's memory with different room both get the pairs
+    // that fit into each.
+    const std::size_t pairs = std::min(n_lo, n_hi);
+    if (n_lo != pairs) (*min)->rgsabound[0].cElements = ULONG(pairs);
+    if (n_hi != pairs) (*max)->rgsabound[0].cElements = ULONG(pairs);
     *invalid = false;
     if (raw.bytes) {
-        std::vector<double> bits(2 * pairs);
-        ExtractBit(raw.data.data<std::uint8_t>(), bits.size(), raw.bit, bits.data());
+        const auto* bytes = static_cast<const std::uint8_t*>(raw.data);
+        const unsigned shift = static_cast<unsigned>(raw.bit) & 7u;
         for (std::size_t k = 0; k < pairs; ++k) {
-            lo.data<double>()[k] = bits[2 * k];
-            hi.data<double>()[k] = bits[2 * k + 1];
+            lo[k] = static_cast<double>((bytes[2 * k] >> shift) & 1u);
+            hi[k] = static_cast<double>((bytes[2 * k + 1] >> shift) & 1u);
         }
     } else {
-        *invalid = ConvertWordPairs(raw.data.data<std::int16_t>(), pairs, raw.scaling,
-                                    lo.data<double>(), hi.data<double>());
+        *invalid = ConvertWordPairsMsbFirst(static_cast<const std::uint8_t*>(raw.data), pairs,
+                                            raw.scaling, lo, hi);
     }
-    *min = lo.Detach();
-    *max = hi.Detach();
     return S_OK;
 }
 

@@ -3,6 +3,7 @@
 // the conversion of the raw record into the caller's arrays of doubles.
 #pragma once
 
+#include <cstddef>
 #include <string>
 #include <string_view>
 
@@ -18,9 +19,13 @@ class Quorlen731XXUserMeasurement;
 // the read members query each factor.
 enum class ScalingQuery { kPreamble, kFactors };
 
-// A record as it came from the instrument.
+// A record as it came from the instrument: its elements lie in the session's
+// receive buffer (host order), valid until the next block read or Close.
 struct RawWaveform {
-    com::SafeArray data;  // VT_I2 words, or VT_UI1 bytes of a digital source
+    // Signed 16-bit words most significant byte first as they were sent, or
+    // bytes of a digital source.
+    const void* data = nullptr;
+    std::size_t count = 0;  // words or bytes
     bool bytes = false;
     int bit = 0;  // the digital channel's bit within each byte
     WaveformScaling scaling;
@@ -55,17 +60,40 @@ HRESULT QueryBinaryBlock(CDriverNode& node, std::string_view command, LONG eleme
                          com::SafeArray* out);
 
 // Sends ":WAV:DATA?" and reads the binary block of `element_type`
-// (BinaryType_I2 or BinaryType_UI1) with the instrument-status check and the
-// termination character switched off; both are restored on every path.
-HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, com::SafeArray* out);
+// (BinaryType_I2 or BinaryType_UI1) into the session's receive buffer, with
+// the instrument-status check and the termination character switched off;
+// both are restored on every path.
+HRESULT ReadWaveformData(CDriverNode& node, LONG element_type, RawWaveform* out);
 
-// Converts the whole record into a new array of doubles; *invalid tells
-// whether any point had no data (NaN in the array).
-HRESULT ConvertRecord(const RawWaveform& raw, SAFEARRAY** out, bool* invalid);
+// The output array of a record of `n` points, in the order of preference:
+// - the caller's array over its own memory (FADF_FIXEDSIZE, as the C API
+//   passes it): it receives the first points that fit and its bound becomes
+//   their count; one of another type or shape fails with E_IVI_INVALID_VALUE
+//   naming `member` and `param`;
+// - the caller's array when it is a one-dimensional, unlocked array of `vt`
+//   of exactly n elements from index 0: reused as it is, no allocation;
+// - otherwise a new array, and the caller's array (unless locked) destroyed,
+//   as an array passed by reference is.
+// *dst receives the first element, *placed the number of points it has room for.
+HRESULT PlaceOutput(CDriverNode& node, const char* member, const char* param, SAFEARRAY** array,
+                    VARTYPE vt, std::size_t n, void** dst, std::size_t* placed);
+inline HRESULT PlaceOutput(CDriverNode& node, const char* member, const char* param,
+                           SAFEARRAY** array, std::size_t n, double** dst, std::size_t* placed) {
+    void* p = nullptr;
+    HRESULT hr = PlaceOutput(node, member, param, array, VT_R8, n, &p, placed);
+    *dst = static_cast<double*>(p);
+    return hr;
+}
+
+// Converts the whole record into the output array (PlaceOutput); *invalid
+// tells whether any point had no data (NaN in the array).
+HRESULT ConvertRecord(CDriverNode& node, const char* member, const RawWaveform& raw,
+                      SAFEARRAY** out, bool* invalid);
 
 // Splits a peak-detect record of N elements, minimum first in each pair, into
-// two new arrays of N / 2 doubles; an odd last element is not used.
-HRESULT SplitMinMax(const RawWaveform& raw, SAFEARRAY** min, SAFEARRAY** max, bool* invalid);
+// two arrays of N / 2 doubles (PlaceOutput); an odd last element is not used.
+HRESULT SplitMinMax(CDriverNode& node, const char* member, const RawWaveform& raw,
+                    SAFEARRAY** min, SAFEARRAY** max, bool* invalid);
 
 // The warning a transfer returns when points without data were delivered:
 // S_IVISCOPE_INVALID_WFM_ELEMENT, the invalid-element text as error information.

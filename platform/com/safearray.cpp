@@ -121,10 +121,26 @@ SAFEARRAY* SafeArrayCreateVector(VARTYPE vt, LONG lLbound, ULONG cElements) {
 HRESULT SafeArrayDestroy(SAFEARRAY* psa) {
     if (!psa) return S_OK;
     if (psa->cLocks) return DISP_E_ARRAYISLOCKED;
-    DestroyElements(psa);
-    std::free(psa->pvData);
+    if (!(psa->fFeatures & FADF_STATIC)) {
+        DestroyElements(psa);
+        std::free(psa->pvData);
+    }
     std::free(psa);
     return S_OK;
+}
+
+SAFEARRAY* SafeArrayCreateVectorOver(VARTYPE vt, void* data, ULONG count) {
+    if (vt != VT_R8 && vt != VT_R4 && vt != VT_I4 && vt != VT_I2 && vt != VT_UI1) return nullptr;
+    if (!data && count > 0) return nullptr;
+    auto* psa = static_cast<SAFEARRAY*>(std::calloc(1, sizeof(SAFEARRAY)));
+    if (!psa) return nullptr;
+    psa->cDims = 1;
+    psa->fFeatures = FADF_STATIC | FADF_FIXEDSIZE;
+    psa->cbElements = ElementSize(vt);
+    psa->vt = vt;
+    psa->pvData = data;
+    psa->rgsabound[0] = SAFEARRAYBOUND{count, 0};
+    return psa;
 }
 
 UINT SafeArrayGetDim(SAFEARRAY* psa) { return psa ? psa->cDims : 0; }

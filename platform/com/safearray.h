@@ -40,6 +40,12 @@ struct SAFEARRAYBOUND {
 
 constexpr USHORT kSafeArrayMaxDims = 2;
 
+// fFeatures flags. A static array's elements belong to its creator:
+// SafeArrayDestroy frees the descriptor only. A fixed-size array is never
+// replaced by a callee that fills it.
+constexpr USHORT FADF_STATIC = 0x0002;
+constexpr USHORT FADF_FIXEDSIZE = 0x0010;
+
 struct SAFEARRAY {
     USHORT cDims;
     USHORT fFeatures;
@@ -54,6 +60,11 @@ struct SAFEARRAY {
 SAFEARRAY* SafeArrayCreate(VARTYPE vt, UINT cDims, const SAFEARRAYBOUND* bounds);
 SAFEARRAY* SafeArrayCreateVector(VARTYPE vt, LONG lLbound, ULONG cElements);
 HRESULT SafeArrayDestroy(SAFEARRAY* psa);
+// A one-dimensional array (lower bound 0) over `count` elements of plain type
+// `vt` (VT_R8, VT_R4, VT_I4, VT_I2, VT_UI1) that the caller owns and keeps
+// alive as long as the array: FADF_STATIC | FADF_FIXEDSIZE. Null for any
+// other type or a null `data` with a nonzero count.
+SAFEARRAY* SafeArrayCreateVectorOver(VARTYPE vt, void* data, ULONG count);
 HRESULT SafeArrayCopy(SAFEARRAY* psa, SAFEARRAY** out);
 UINT SafeArrayGetDim(SAFEARRAY* psa);
 UINT SafeArrayGetElemsize(SAFEARRAY* psa);
@@ -91,6 +102,10 @@ public:
 
     static SafeArray Vector(VARTYPE vt, ULONG count, LONG lbound = 0) {
         return SafeArray(SafeArrayCreateVector(vt, lbound, count));
+    }
+    // An array over the caller's memory (SafeArrayCreateVectorOver).
+    static SafeArray Over(VARTYPE vt, void* data, ULONG count) {
+        return SafeArray(SafeArrayCreateVectorOver(vt, data, count));
     }
     SAFEARRAY* get() const { return p_; }
     SAFEARRAY** Out() {

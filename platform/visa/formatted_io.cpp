@@ -401,6 +401,45 @@ HRESULT FormattedIO::ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG
     });
 }
 
+HRESULT FormattedIO::ReadIEEEBlockToSink(LONG type, IBlockSink* sink, LONG* pActualCount,
+                                         VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND) {
+    if (!pActualCount || !sink) return E_POINTER;
+    *pActualCount = 0;
+    const VARTYPE vt = fmt::BinaryElementType(type);
+    if (vt == VT_EMPTY)
+        return Report(E_INVALIDARG, kFormattedIid, "unknown binary type");
+    return Guard(kFormattedIid, [&] {
+        std::lock_guard<std::mutex> lock(m_);
+        if (HRESULT b = Bound(); FAILED(b)) return b;
+        const std::size_t elem = fmt::PlainElementSize(vt);
+        struct SinkTarget final : BlockTarget {
+            IBlockSink* sink;
+            BYTE* data = nullptr;
+            std::size_t refused = 0;
+            HRESULT Place(std::size_t bytes, BYTE** dst, std::size_t* room) override {
+                data = bytes ? sink->Reserve(bytes) : nullptr;
+                if (!data) refused = bytes;
+                *dst = data;
+                *room = data ? bytes : 0;
+                return S_OK;
+            }
+        } target;
+        target.sink = sink;
+        BlockResult r;
+        // A refused reservation still reads the block to its end (into
+        // nothing), so the next reply is not taken from the middle of this one.
+        HRESULT hr = Settle(
+            ReadBlock(elem, seekToBlock != VARIANT_FALSE, flushToEND != VARIANT_FALSE, target, &r));
+        if (FAILED(hr)) return hr;
+        if (target.refused)
+            return Report(E_OUTOFMEMORY, kFormattedIid,
+                          "no room for a block of " + std::to_string(target.refused) + " bytes");
+        if (elem > 1 && fmt::NeedsSwap(big_endian_)) fmt::SwapBytes(target.data, r.stored, elem);
+        *pActualCount = LONG(r.stored / elem);
+        return S_OK;
+    });
+}
+
 HRESULT FormattedIO::ReadString(BSTR* pString) {
     if (!pString) return E_POINTER;
     *pString = nullptr;

@@ -50,6 +50,8 @@ class FormattedIO final
     // IFormattedIO488Direct
     HRESULT ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG* pActualCount,
                               VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND) override;
+    HRESULT ReadIEEEBlockToSink(LONG type, IBlockSink* sink, LONG* pActualCount,
+                                VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND) override;
     HRESULT get_MaxBlockBytes(LONGLONG* pVal) override;
     HRESULT put_MaxBlockBytes(LONGLONG val) override;
 

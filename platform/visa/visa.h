@@ -18,6 +18,8 @@
 // each chunk.
 #pragma once
 
+#include <cstddef>
+
 #include "platform/com/bstr.h"
 #include "platform/com/safearray.h"
 #include "platform/com/unknown.h"
@@ -244,6 +246,17 @@ struct IFormattedIO488 : IUnknown {
     virtual HRESULT SetBufferSize(LONG mask, LONG size) = 0;
 };
 
+// Where the data of a binary block goes once its header told the length: a
+// receiver that keeps one buffer across reads hands out room for `bytes`
+// bytes, or null when it cannot have that much (the read then fails with
+// E_OUTOFMEMORY and the session stays in step).
+struct IBlockSink {
+    virtual BYTE* Reserve(std::size_t bytes) = 0;
+
+  protected:
+    ~IBlockSink() = default;
+};
+
 // Block reads into the caller's memory (no SAFEARRAY, no VARIANT), and the
 // bound on declared block lengths.
 struct IFormattedIO488Direct : IUnknown {
@@ -254,6 +267,11 @@ struct IFormattedIO488Direct : IUnknown {
     // and fails with E_VISA_USER_BUFFER after storing the first maxCount.
     virtual HRESULT ReadIEEEBlockInto(LONG type, void* buf, LONG maxCount, LONG* pActualCount,
                                       VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND) = 0;
+    // Reads a binary block of elements of type into the room sink->Reserve
+    // gives for the whole block (asked once, after the header). Elements are
+    // in host order afterwards; *pActualCount receives the elements stored.
+    virtual HRESULT ReadIEEEBlockToSink(LONG type, IBlockSink* sink, LONG* pActualCount,
+                                        VARIANT_BOOL seekToBlock, VARIANT_BOOL flushToEND) = 0;
     // Largest block length (bytes) accepted from a header; longer blocks fail
     // with E_VISA_INVALID_FORMAT before anything is allocated.
     virtual HRESULT get_MaxBlockBytes(LONGLONG* pVal) = 0;

@@ -311,7 +311,7 @@ TEST_F(StatusTraffic, WaveformDataReadRestoresPollingAndTermCharOnEveryPath) {
         else io_->Expect(":WAV:DATA?\n");
         io_->fail_term_get = f == kTermGet;
         io_->fail_term_set = f == kTermSet;
-        com::SafeArray data;
+        RawWaveform data;
         EXPECT_TRUE(FAILED(ReadWaveformData(*driver_.get(), 2, &data)));
         EXPECT_TRUE(driver_->Core().session.flags.query_instrument_status);
         EXPECT_TRUE(io_->term_char);

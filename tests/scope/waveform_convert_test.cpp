@@ -47,20 +47,42 @@ void ExpectPoint(double got, std::int16_t raw, const WaveformScaling& s, std::si
     }
 }
 
+std::vector<std::uint8_t> MsbFirst(const std::vector<std::int16_t>& words) {
+    std::vector<std::uint8_t> bytes;
+    for (std::int16_t w : words) {
+        bytes.push_back(std::uint8_t(static_cast<std::uint16_t>(w) >> 8));
+        bytes.push_back(std::uint8_t(w & 0xFF));
+    }
+    return bytes;
+}
+
+// Lengths around the 16-word steps of the vector kernel, outputs starting at
+// every alignment, invalid points inside and outside the first step, and
+// records large enough to be written past the cache.
 TEST(WaveformConvert, WordsAndPairsMatchThePlainFormulaBitForBitWithNaNForInvalid) {
     std::mt19937 gen(7);
     for (const WaveformScaling& s : kScalings) {
         SCOPED_TRACE(s.y_origin);
-        // Odd lengths exercise the vector loops' remainders.
-        for (std::size_t n : {0u, 1u, 7u, 1001u}) {
-            const std::vector<std::int16_t> raw = RandomWords(n, gen);
+        for (std::size_t n : {0u, 1u, 7u, 15u, 16u, 17u, 33u, 1001u, 1200000u}) {
+            std::vector<std::int16_t> raw = RandomWords(n, gen);
+            if (n > 40) raw[40] = raw[n - 1] = kInvalidWord;
+            const std::vector<std::uint8_t> wire = MsbFirst(raw);
             std::vector<double> out(n, 99.0);
             EXPECT_EQ(ConvertWords(raw.data(), n, s, out.data()), n > 3);
             for (std::size_t i = 0; i < n; ++i) ExpectPoint(out[i], raw[i], s, i);
+            for (std::size_t shift : {0u, 1u, 2u, 3u}) {
+                SCOPED_TRACE(shift);
+                std::vector<double> msb(n + shift + 1, 99.0);
+                EXPECT_EQ(ConvertWordsMsbFirst(wire.data(), n, s, msb.data() + shift), n > 3);
+                for (std::size_t i = 0; i < n; ++i) ExpectPoint(msb[shift + i], raw[i], s, i);
+                EXPECT_EQ(msb[shift + n], 99.0);
+                EXPECT_EQ(msb[0], shift ? 99.0 : msb[0]);
+            }
 
             const std::size_t pairs = n / 2;
             std::vector<double> lo(pairs, 99.0), hi(pairs, 99.0);
-            EXPECT_EQ(ConvertWordPairs(raw.data(), pairs, s, lo.data(), hi.data()), pairs > 1);
+            EXPECT_EQ(ConvertWordPairsMsbFirst(wire.data(), pairs, s, lo.data(), hi.data()),
+                      pairs > 1);
             for (std::size_t k = 0; k < pairs; ++k) {
                 ExpectPoint(lo[k], raw[2 * k], s, 2 * k);
                 ExpectPoint(hi[k], raw[2 * k + 1], s, 2 * k + 1);
@@ -94,7 +116,8 @@ TEST(WaveformConvert, ReferenceCodeGivesTheOrigin) {
     EXPECT_EQ(out[0], -0.5);
     EXPECT_DOUBLE_EQ(out[1], 0.5);
     EXPECT_DOUBLE_EQ(out[2], -1.5);
-    EXPECT_TRUE(ConvertWordPairs(raw, 2, s, lo, hi));
+    const std::vector<std::uint8_t> wire = MsbFirst({raw, raw + 4});
+    EXPECT_TRUE(ConvertWordPairsMsbFirst(wire.data(), 2, s, lo, hi));
     EXPECT_EQ(lo[0], -0.5);
     EXPECT_DOUBLE_EQ(hi[0], 0.5);
     EXPECT_DOUBLE_EQ(lo[1], -1.5);

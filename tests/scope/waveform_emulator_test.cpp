@@ -152,6 +152,7 @@ TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     EXPECT_EQ(m->FetchWaveform(&a, &x0, &dx), E_IVISCOPE_INVALID_ACQ_TYPE);
     EXPECT_EQ(ErrorText(), "Quorlen731XX: Invalid acquisition type.");
     ASSERT_EQ(Io().InstrWrite(":ACQ:TYPE NORM;:DIG"), S_OK);
+    lo = hi = nullptr;  // the arrays went with Values(); a failed call leaves these as they are
     EXPECT_EQ(m->FetchWaveformMinMax(&lo, &hi, &x0, &dx), E_IVISCOPE_INVALID_ACQ_TYPE);
     EXPECT_EQ(a, nullptr);
     EXPECT_EQ(lo, nullptr);
@@ -199,6 +200,94 @@ TEST_F(WaveformOnEmulator, InitiateWithoutDigitizeStartsASingleAcquisition) {
     EXPECT_EQ(coll->Status(&s), S_OK);
     EXPECT_NE(s, Quorlen731XXAcqStatusUnknown);
     EXPECT_EQ(Received().back(), "OPER?");
+}
+
+// The output array a caller passes in: reused when it fits, filled in place
+// when it is the caller's own memory, replaced otherwise.
+TEST_F(WaveformOnEmulator, OutputArrayIsReusedFilledInPlaceOrReplaced) {
+    Start("QDS4032A");
+    ASSERT_EQ(Io().InstrWrite(":DIG"), S_OK);
+    ComPtr<IQuorlen731XXMeasurement> m = Measurement("Channel1");
+    double x0 = 0, dx = 0;
+    SAFEARRAY* first = nullptr;
+    ASSERT_EQ(m->FetchWaveform(&first, &x0, &dx), S_OK) << ErrorText();
+    const std::vector<double> expected = Values(first);
+    ASSERT_EQ(expected.size(), 1000u);
+
+    struct Case {
+        const char* what;
+        VARTYPE vt;
+        ULONG count;
+        LONG lbound;
+        bool locked;
+        bool same_array;  // the call keeps the caller's array
+    };
+    const Case cases[] = {
+        {"right type and size", VT_R8, 1000, 0, false, true},
+        {"one element short", VT_R8, 999, 0, false, false},
+        {"one element over", VT_R8, 1001, 0, false, false},
+        {"lower bound 1", VT_R8, 1000, 1, false, false},
+        {"floats", VT_R4, 1000, 0, false, false},
+        {"locked", VT_R8, 1000, 0, true, false},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.what);
+        com::SafeArray given = com::SafeArray::Vector(c.vt, c.count, c.lbound);
+        if (c.locked) {
+            void* p = nullptr;
+            ASSERT_EQ(SafeArrayAccessData(given.get(), &p), S_OK);
+        }
+        SAFEARRAY* a = given.get();
+        ASSERT_EQ(m->FetchWaveform(&a, &x0, &dx), S_OK) << ErrorText();
+        EXPECT_EQ(a == given.get(), c.same_array);
+        if (a != given.get()) {
+            if (!c.locked) (void)given.Detach();  // destroyed by the call
+            EXPECT_EQ(a->vt, VT_R8);
+            EXPECT_EQ(a->rgsabound[0].lLbound, 0);
+            EXPECT_EQ(Values(a), expected);
+        } else {
+            EXPECT_EQ(std::vector<double>(given.data<double>(), given.data<double>() + 1000),
+                      expected);
+        }
+        if (c.locked) {
+            EXPECT_EQ(SafeArrayUnaccessData(given.get()), S_OK);
+        }
+    }
+
+    // The caller's own memory (as the C API passes it): it receives the
+    // points that fit, its bound telling how many; nothing beyond is written.
+    for (const ULONG room : {1000u, 1500u, 999u, 0u}) {
+        SCOPED_TRACE(room);
+        std::vector<double> memory(room + 1, -7.0);
+        com::SafeArray over = com::SafeArray::Over(VT_R8, memory.data(), room);
+        SAFEARRAY* a = over.get();
+        ASSERT_EQ(m->FetchWaveform(&a, &x0, &dx), S_OK) << ErrorText();
+        EXPECT_EQ(a, over.get());
+        const std::size_t n = std::min<std::size_t>(room, 1000);
+        EXPECT_EQ(over.size(), n);
+        EXPECT_EQ(std::vector<double>(memory.begin(), memory.begin() + long(n)),
+                  std::vector<double>(expected.begin(), expected.begin() + long(n)));
+        EXPECT_EQ(memory[n], -7.0);
+    }
+    // One of another element type is refused, and the session goes on.
+    std::vector<float> floats(1000);
+    com::SafeArray wrong = com::SafeArray::Over(VT_R4, floats.data(), 1000);
+    SAFEARRAY* w = wrong.get();
+    EXPECT_EQ(m->FetchWaveform(&w, &x0, &dx), E_IVI_INVALID_VALUE);
+    EXPECT_NE(ErrorText().find("WaveformArray"), std::string::npos);
+    EXPECT_EQ(w, wrong.get());
+    std::vector<double> v;
+    EXPECT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
+    EXPECT_EQ(v.size(), 1000u);
+
+    // The block's memory stays with the session until Close.
+    const ReceiveBuffer& buffer = driver_->Core().io->Receive();
+    const BYTE* kept = buffer.data();
+    EXPECT_GE(buffer.capacity(), 2000u);
+    EXPECT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
+    EXPECT_EQ(buffer.data(), kept);
+    EXPECT_EQ(driver_->Close(), S_OK);
+    EXPECT_EQ(buffer.capacity(), 0u);
 }
 
 // Faults in the data block: each ends in an error within the timeout, with
@@ -263,12 +352,12 @@ TEST_F(WaveformOnEmulator, MissingReplyAndDroppedLinkDuringTheDataRead) {
     Start("QDS4032A", "QueryInstrStatus=true");
     ASSERT_EQ(Io().InstrWrite(":DIG;:WAV:SOUR CHAN1"), S_OK);
     ASSERT_EQ(Io().SetIOTimeout(300), S_OK);
-    com::SafeArray data;
+    RawWaveform data;
     emu_->SuppressReplies(1);
     EXPECT_EQ(ReadWaveformData(*driver_.get(), 2, &data), E_QUORLEN731XX_IO_TIMEOUT);
     ExpectRestored(300);
     ASSERT_EQ(ReadWaveformData(*driver_.get(), 2, &data), S_OK) << ErrorText();
-    EXPECT_EQ(data.size(), 1000u);
+    EXPECT_EQ(data.count, 1000u);
 
     emu_->DropConnectionOnNextQuery();
     EXPECT_TRUE(FAILED(ReadWaveformData(*driver_.get(), 2, &data)));

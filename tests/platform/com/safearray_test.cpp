@@ -179,6 +179,30 @@ TEST(SafeArray, LockedArrayIsNotDestroyed) {
     EXPECT_EQ(SafeArrayDestroy(nullptr), S_OK);
 }
 
+// An array over the caller's memory: elements read and written in place,
+// copies own their memory, destroying it leaves the memory alone (a stack
+// buffer: a free of it would be caught by the sanitizers).
+TEST(SafeArray, ArrayOverCallerMemoryNeverFreesIt) {
+    double memory[3] = {1.5, -2.5, 4.0};
+    SAFEARRAY* psa = SafeArrayCreateVectorOver(VT_R8, memory, 3);
+    ASSERT_NE(psa, nullptr);
+    EXPECT_EQ(psa->fFeatures & (FADF_STATIC | FADF_FIXEDSIZE), FADF_STATIC | FADF_FIXEDSIZE);
+    LONG i = 2;
+    double v = 9.0;
+    ASSERT_EQ(SafeArrayPutElement(psa, &i, &v), S_OK);
+    EXPECT_EQ(memory[2], 9.0);
+    SafeArray copy;
+    ASSERT_EQ(SafeArrayCopy(psa, copy.Out()), S_OK);
+    EXPECT_NE(copy.data<double>(), memory);
+    EXPECT_EQ(copy.get()->fFeatures & FADF_STATIC, 0);
+    EXPECT_EQ(SafeArrayDestroy(psa), S_OK);
+    EXPECT_EQ(memory[0], 1.5);
+    EXPECT_EQ(SafeArrayCreateVectorOver(VT_BSTR, memory, 3), nullptr);
+    EXPECT_EQ(SafeArrayCreateVectorOver(VT_R8, nullptr, 3), nullptr);
+    SafeArray empty = SafeArray::Over(VT_R8, nullptr, 0);
+    EXPECT_TRUE(empty);
+}
+
 TEST(SafeArray, NullArgumentsAreRejected) {
     LONG i = 0, v = 0;
     SafeArray sa = SafeArray::Vector(VT_I4, 1);

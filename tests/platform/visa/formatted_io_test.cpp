@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <vector>
 
 #include "platform/visa/visa.h"
 #include "tests/platform/visa/loopback_peer.h"
@@ -157,6 +158,54 @@ TEST(FormattedIOTest, BlocksEndWithTheirMessageWithTheTerminationCharacterOnAndO
         ASSERT_EQ(b.io->ReadString(next.Out()), S_OK) << ThreadErrorText();
         EXPECT_EQ(next.utf8(), "NEXT\n");
     }
+    Release(b);
+    EXPECT_EQ(peer.Finish(), "");
+}
+
+// A sink is asked once, for the whole block; one that refuses still has the
+// block read to its end, so the next reply is the next message.
+TEST(FormattedIOTest, BlockSinkGetsTheWholeBlockOrRefusesIt) {
+    struct Sink final : IBlockSink {
+        std::vector<BYTE> memory;
+        std::size_t limit = 0;
+        std::vector<std::size_t> asked;
+        BYTE* Reserve(std::size_t bytes) override {
+            asked.push_back(bytes);
+            if (bytes > limit) return nullptr;
+            memory.resize(bytes);
+            return memory.data();
+        }
+    } sink;
+    const std::string be("\x01\x02\xff\xfe\x80\x00", 6);
+    LoopbackPeer peer;
+    peer.Send(Block(be) + "\n").Send(Block(be) + "\n").Send(Block("") + "\n");
+    peer.Expect("*IDN?\n").Send("ok\n");
+    peer.Start();
+    Bound b = Bind(peer);
+    LONG actual = -1;
+    sink.limit = 6;
+    ASSERT_EQ(b.direct->ReadIEEEBlockToSink(BinaryType_I2, &sink, &actual, VARIANT_FALSE,
+                                            VARIANT_TRUE),
+              S_OK);
+    EXPECT_EQ(actual, 3);
+    const SHORT* words = reinterpret_cast<const SHORT*>(sink.memory.data());
+    EXPECT_EQ(words[0], 0x0102);
+    EXPECT_EQ(words[1], -2);
+    EXPECT_EQ(words[2], -32768);
+    sink.limit = 5;
+    EXPECT_EQ(b.direct->ReadIEEEBlockToSink(BinaryType_I2, &sink, &actual, VARIANT_FALSE,
+                                            VARIANT_TRUE),
+              E_OUTOFMEMORY);
+    EXPECT_EQ(actual, 0);
+    EXPECT_EQ(b.direct->ReadIEEEBlockToSink(BinaryType_I2, &sink, &actual, VARIANT_FALSE,
+                                            VARIANT_TRUE),
+              S_OK);
+    EXPECT_EQ(actual, 0);
+    EXPECT_EQ(sink.asked, (std::vector<std::size_t>{6, 6}));  // never for an empty block
+    EXPECT_EQ(Query(b, "*IDN?\n"), "ok\n");
+    EXPECT_EQ(b.direct->ReadIEEEBlockToSink(BinaryType_I2, nullptr, &actual, VARIANT_FALSE,
+                                            VARIANT_TRUE),
+              E_POINTER);
     Release(b);
     EXPECT_EQ(peer.Finish(), "");
 }
