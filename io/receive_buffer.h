@@ -1,4 +1,5 @@
-// ReceiveBuffer: the session's memory for binary blocks, kept from one read
+// ReceiveBuffer: the session's memory for binary blocks (mapped in huge
+// pages where the kernel offers them), kept from one read
 // to the next so that a test program fetching the same record in a loop pays
 // for the pages once, not at every call. It grows to the largest block read
 // so far (never beyond its bound) and is released when the session closes.

@@ -5,6 +5,7 @@
 #include <limits>
 
 #include "platform/com/bstr.h"
+#include "platform/com/large_memory.h"
 #include "platform/com/variant.h"
 
 namespace {
@@ -72,6 +73,37 @@ void DestroyElements(SAFEARRAY* psa) {
     }
 }
 
+// Elements of a large array live in a mapping of their own (its size kept
+// in front of them), so the pages of a multi-megabyte waveform come in
+// huge-page units and go back to the system when the array is destroyed.
+constexpr USHORT kFeatureMapped = 0x4000;  // internal: not one of the published flags
+constexpr std::size_t kMappingHeader = 64;
+
+void* AllocateElements(std::size_t bytes, USHORT* features) {
+    if (bytes >= qn::com::kLargeMemoryBytes) {
+        std::size_t mapped = 0;
+        auto* base = static_cast<char*>(qn::com::MapLargeMemory(bytes + kMappingHeader, &mapped));
+        if (base) {
+            std::memcpy(base, &mapped, sizeof mapped);
+            *features = USHORT(*features | kFeatureMapped);
+            return base + kMappingHeader;
+        }
+    }
+    // calloc: zero elements are valid null BSTRs, empty VARIANTs, null pointers.
+    return std::calloc(1, bytes);
+}
+
+void FreeElements(SAFEARRAY* psa) {
+    if (!(psa->fFeatures & kFeatureMapped)) {
+        std::free(psa->pvData);
+        return;
+    }
+    char* base = static_cast<char*>(psa->pvData) - kMappingHeader;
+    std::size_t mapped = 0;
+    std::memcpy(&mapped, base, sizeof mapped);
+    qn::com::UnmapLargeMemory(base, mapped);
+}
+
 }  // namespace
 
 namespace qn::com {
@@ -103,8 +135,7 @@ SAFEARRAY* SafeArrayCreate(VARTYPE vt, UINT cDims, const SAFEARRAYBOUND* bounds)
     psa->vt = vt;
     for (UINT d = 0; d < cDims; ++d) psa->rgsabound[d] = bounds[d];
     if (bytes) {
-        // calloc: zero elements are valid null BSTRs, empty VARIANTs, null pointers.
-        psa->pvData = std::calloc(1, static_cast<std::size_t>(bytes));
+        psa->pvData = AllocateElements(static_cast<std::size_t>(bytes), &psa->fFeatures);
         if (!psa->pvData) {
             std::free(psa);
             return nullptr;
@@ -123,7 +154,7 @@ HRESULT SafeArrayDestroy(SAFEARRAY* psa) {
     if (psa->cLocks) return DISP_E_ARRAYISLOCKED;
     if (!(psa->fFeatures & FADF_STATIC)) {
         DestroyElements(psa);
-        std::free(psa->pvData);
+        FreeElements(psa);
     }
     std::free(psa);
     return S_OK;

@@ -203,6 +203,26 @@ TEST(SafeArray, ArrayOverCallerMemoryNeverFreesIt) {
     EXPECT_TRUE(empty);
 }
 
+// Arrays from just below to well above the size that is mapped on its own:
+// zeroed, every element writable, copies equal, and a shrunk bound (as a
+// short read leaves) still gives the whole memory back.
+TEST(SafeArray, LargeArraysAreZeroedWritableAndFreedWhateverTheirBound) {
+    for (const ULONG count : {524287u, 524288u, 3000001u}) {
+        SCOPED_TRACE(count);
+        SafeArray sa = SafeArray::Vector(VT_R8, count);
+        ASSERT_TRUE(sa);
+        double* d = sa.data<double>();
+        bool zero = true;
+        for (ULONG i = 0; i < count; i += 4093) zero = zero && d[i] == 0.0;
+        EXPECT_TRUE(zero && d[count - 1] == 0.0);
+        for (ULONG i = 0; i < count; ++i) d[i] = double(i);
+        SafeArray copy;
+        ASSERT_EQ(SafeArrayCopy(sa.get(), copy.Out()), S_OK);
+        EXPECT_EQ(std::memcmp(copy.data<double>(), d, std::size_t(count) * sizeof(double)), 0);
+        sa.get()->rgsabound[0].cElements = 3;
+    }
+}
+
 TEST(SafeArray, NullArgumentsAreRejected) {
     LONG i = 0, v = 0;
     SafeArray sa = SafeArray::Vector(VT_I4, 1);
