@@ -64,12 +64,10 @@ QN_COLLECTION_BODIES(IQuorlen731XXDigitalChannels, RepCapClass::kUserDigitalChan
 #include "members/IIviScope.def"
 #include "members/IIviScopeChannels.def"
 #include "members/IIviScopeMeasurements.def"
-#include "members/IIviScopeTrigger.def"
 #include "members/IQuorlen731XX.def"
 #include "members/IQuorlen731XXChannels.def"
 #include "members/IQuorlen731XXDigitalChannels.def"
 #include "members/IQuorlen731XXMeasurements.def"
-#include "members/IQuorlen731XXTrigger.def"
 #include "QnEndMembers.h"
 #undef QN_CLASS
 

@@ -20,6 +20,7 @@
 #include "scope/acquisition_control.h"
 #include "scope/acquisition_state.h"
 #include "scope/measurement_settings.h"
+#include "scope/trigger_shadow.h"
 #include "services/coercion_log.h"
 #include "io/visa_provider.h"
 #include "services/tracer.h"
@@ -38,6 +39,7 @@ public:
     AcquisitionState acquisition;
     AcquisitionControl acquisition_control;
     MeasurementSettings measurement;
+    TriggerShadow trigger;
     RepCapLists repcaps;
     CCoercionLogManager coercions;
     CTraceOwner tracer;

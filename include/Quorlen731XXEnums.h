@@ -177,3 +177,166 @@ enum Quorlen731XXExternalUnitsEnum : LONG {
     Quorlen731XXUnitsVolts = 0,
     Quorlen731XXUnitsAmps = 1,
 };
+
+// Triggering. The class-compliant enumerations share the driver's numbers
+// except the trigger coupling, whose class values skip 2.
+enum Quorlen731XXTriggerTypeEnum : LONG {
+    Quorlen731XXTriggerEdge = 1,
+    Quorlen731XXTriggerWidth = 2,
+    Quorlen731XXTriggerRunt = 3,
+    Quorlen731XXTriggerGlitch = 4,
+    Quorlen731XXTriggerTV = 5,
+    Quorlen731XXTriggerImmediate = 6,
+    Quorlen731XXTriggerACLine = 7,
+    Quorlen731XXTriggerPattern = 8,
+    Quorlen731XXTriggerState = 9,
+};
+enum Quorlen731XXTriggerCouplingEnum : LONG {
+    Quorlen731XXTriggerCouplingAC = 0,
+    Quorlen731XXTriggerCouplingDC = 1,
+    Quorlen731XXTriggerCouplingHFReject = 2,
+    Quorlen731XXTriggerCouplingLFReject = 3,
+    Quorlen731XXTriggerCouplingNoiseReject = 4,
+    Quorlen731XXTriggerCouplingTV = 5,
+};
+enum Quorlen731XXTriggerModifierEnum : LONG {
+    Quorlen731XXTriggerModifierNone = 1,
+    Quorlen731XXTriggerModifierAuto = 2,
+    Quorlen731XXTriggerModifierAutoLevel = 3,
+};
+enum Quorlen731XXTriggerSlopeEnum : LONG {
+    Quorlen731XXTriggerSlopeNegative = 0,
+    Quorlen731XXTriggerSlopePositive = 1,
+    Quorlen731XXTriggerSlopeEither = 2,
+    Quorlen731XXTriggerSlopeAlternate = 3,
+};
+enum Quorlen731XXACLineSlopeEnum : LONG {
+    Quorlen731XXACLinePositive = 1,
+    Quorlen731XXACLineNegative = 2,
+    Quorlen731XXACLineEither = 3,
+};
+enum Quorlen731XXGlitchConditionEnum : LONG {
+    Quorlen731XXGlitchLessThan = 1,
+    Quorlen731XXGlitchGreaterThan = 2,
+};
+enum Quorlen731XXGlitchPolarityEnum : LONG {
+    Quorlen731XXGlitchPositive = 1,
+    Quorlen731XXGlitchNegative = 2,
+    Quorlen731XXGlitchEither = 3,
+};
+enum Quorlen731XXWidthConditionEnum : LONG {
+    Quorlen731XXWidthWithin = 1,
+    Quorlen731XXWidthOutside = 2,
+};
+enum Quorlen731XXWidthPolarityEnum : LONG {
+    Quorlen731XXWidthPositive = 1,
+    Quorlen731XXWidthNegative = 2,
+    Quorlen731XXWidthEither = 3,
+};
+enum Quorlen731XXRuntPolarityEnum : LONG {
+    Quorlen731XXRuntPolarityPositive = 1,
+    Quorlen731XXRuntPolarityNegative = 2,
+    Quorlen731XXRuntPolarityEither = 3,
+};
+enum Quorlen731XXTVTriggerEventEnum : LONG {
+    Quorlen731XXTVEventField1 = 1,
+    Quorlen731XXTVEventField2 = 2,
+    Quorlen731XXTVEventAnyField = 3,
+    Quorlen731XXTVEventAnyLine = 4,
+    Quorlen731XXTVEventLineNumber = 5,
+    Quorlen731XXTVEventLineNumberAlternate = 6,
+    Quorlen731XXTVEventLineNumberVertical = 7,
+    Quorlen731XXTVEventVertical = 8,
+};
+enum Quorlen731XXTVTriggerPolarityEnum : LONG {
+    Quorlen731XXTVTriggerPositive = 1,
+    Quorlen731XXTVTriggerNegative = 2,
+};
+enum Quorlen731XXTVSignalFormatEnum : LONG {
+    Quorlen731XXTVSignalFormatNTSC = 1,
+    Quorlen731XXTVSignalFormatPAL = 2,
+    Quorlen731XXTVSignalFormatSECAM = 3,
+    Quorlen731XXTVSignalFormatPALM = 4,
+    Quorlen731XXTVSignalFormatGeneric = 5,
+    Quorlen731XXTVSignalFormatP480 = 6,
+    Quorlen731XXTVSignalFormatP720 = 7,
+    Quorlen731XXTVSignalFormatP1080 = 8,
+    Quorlen731XXTVSignalFormatI1080 = 9,
+};
+enum Quorlen731XXPatternMatchingModeEnum : LONG {
+    Quorlen731XXPatternEnter = 0,
+    Quorlen731XXPatternExit = 1,
+};
+
+enum IviScopeTriggerTypeEnum : LONG {
+    IviScopeTriggerEdge = 1,
+    IviScopeTriggerWidth = 2,
+    IviScopeTriggerRunt = 3,
+    IviScopeTriggerGlitch = 4,
+    IviScopeTriggerTV = 5,
+    IviScopeTriggerImmediate = 6,
+    IviScopeTriggerACLine = 7,
+};
+enum IviScopeTriggerCouplingEnum : LONG {
+    IviScopeTriggerCouplingAC = 0,
+    IviScopeTriggerCouplingDC = 1,
+    IviScopeTriggerCouplingHFReject = 3,
+    IviScopeTriggerCouplingLFReject = 4,
+    IviScopeTriggerCouplingNoiseReject = 5,
+};
+// What IIviScopeTrigger.Coupling reads while the instrument is in TV
+// coupling, which has no class-compliant value: outside the class range.
+inline constexpr LONG IviScopeTriggerCouplingInstrumentTV = 1005;
+enum IviScopeTriggerModifierEnum : LONG {
+    IviScopeTriggerModifierNone = 1,
+    IviScopeTriggerModifierAuto = 2,
+    IviScopeTriggerModifierAutoLevel = 3,
+};
+enum IviScopeTriggerSlopeEnum : LONG {
+    IviScopeTriggerSlopeNegative = 0,
+    IviScopeTriggerSlopePositive = 1,
+};
+enum IviScopeACLineSlopeEnum : LONG {
+    IviScopeACLinePositive = 1,
+    IviScopeACLineNegative = 2,
+    IviScopeACLineEither = 3,
+};
+enum IviScopeGlitchConditionEnum : LONG {
+    IviScopeGlitchLessThan = 1,
+    IviScopeGlitchGreaterThan = 2,
+};
+enum IviScopeGlitchPolarityEnum : LONG {
+    IviScopeGlitchPositive = 1,
+    IviScopeGlitchNegative = 2,
+    IviScopeGlitchEither = 3,
+};
+enum IviScopeWidthConditionEnum : LONG {
+    IviScopeWidthWithin = 1,
+    IviScopeWidthOutside = 2,
+};
+enum IviScopeWidthPolarityEnum : LONG {
+    IviScopeWidthPositive = 1,
+    IviScopeWidthNegative = 2,
+    IviScopeWidthEither = 3,
+};
+enum IviScopeRuntPolarityEnum : LONG {
+    IviScopeRuntPositive = 1,
+    IviScopeRuntNegative = 2,
+    IviScopeRuntEither = 3,
+};
+enum IviScopeTVTriggerEventEnum : LONG {
+    IviScopeTVEventField1 = 1,
+    IviScopeTVEventField2 = 2,
+    IviScopeTVEventAnyField = 3,
+    IviScopeTVEventAnyLine = 4,
+    IviScopeTVEventLineNumber = 5,
+};
+enum IviScopeTVTriggerPolarityEnum : LONG {
+    IviScopeTVPositive = 1,
+    IviScopeTVNegative = 2,
+};
+enum IviScopeTVSignalFormatEnum : LONG {
+    IviScopeTVSignalFormatNTSC = 1,
+    IviScopeTVSignalFormatPAL = 2,
+    IviScopeTVSignalFormatSECAM = 3,
+};

@@ -65,4 +65,14 @@ std::string SCPIToVirtual(const SessionCore& core, std::string_view scpi, bool c
     return Translate(core, std::move(name));
 }
 
+bool IsInstrumentSourceName(std::string_view scpi) {
+    auto numbered = [&](std::string_view prefix) {
+        if (!StartsWith(scpi, prefix) || scpi.size() == prefix.size()) return false;
+        for (char c : scpi.substr(prefix.size()))
+            if (c < '0' || c > '9') return false;
+        return true;
+    };
+    return scpi == "EXT" || scpi == "LINE" || numbered("CHAN") || numbered("DIG");
+}
+
 }  // namespace qn

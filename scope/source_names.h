@@ -34,4 +34,8 @@ HRESULT VirtualToSCPI(CDriverNode& node, std::string_view name, SourceNameRules 
 // other reply is returned unchanged (after the translation).
 std::string SCPIToVirtual(const SessionCore& core, std::string_view scpi, bool class_compliant);
 
+// True for the instrument source names SCPIToVirtual converts: "EXT", "LINE",
+// "CHAN<n>" and "DIG<d>" with decimal digits.
+bool IsInstrumentSourceName(std::string_view scpi);
+
 }  // namespace qn
