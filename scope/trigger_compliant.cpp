@@ -67,28 +67,6 @@ HRESULT Quorlen731XX::IIviScopeTriggerEdge_Configure_Body(BSTR Source, double Le
         Source, Level, static_cast<Quorlen731XXTriggerSlopeEnum>(Slope));
 }
 
-// Condition and Polarity are the driver's condition and polarity.
-#define QN_RENAMED_FORWARD(Itf, Name, IviType, Target, target_name, DriverType) \
-    HRESULT Quorlen731XX::Itf##_get_##Name##_Body(IviType* val) {              \
-        return ForwardGet(static_cast<Target*>(this), &Target::get_##target_name, val); \
-    }                                                                          \
-    HRESULT Quorlen731XX::Itf##_put_##Name##_Body(IviType val) {               \
-        return ForwardPut(static_cast<Target*>(this), &Target::put_##target_name, val); \
-    }
-QN_RENAMED_FORWARD(IIviScopeTriggerGlitch, Condition, IviScopeGlitchConditionEnum,
-                   IQuorlen731XXTriggerGlitch, condition, Quorlen731XXGlitchConditionEnum)
-QN_RENAMED_FORWARD(IIviScopeTriggerGlitch, Polarity, IviScopeGlitchPolarityEnum,
-                   IQuorlen731XXTriggerGlitch, polarity, Quorlen731XXGlitchPolarityEnum)
-QN_RENAMED_FORWARD(IIviScopeTriggerWidth, Condition, IviScopeWidthConditionEnum,
-                   IQuorlen731XXTriggerWidth, condition, Quorlen731XXWidthConditionEnum)
-QN_RENAMED_FORWARD(IIviScopeTriggerWidth, Polarity, IviScopeWidthPolarityEnum,
-                   IQuorlen731XXTriggerWidth, polarity, Quorlen731XXWidthPolarityEnum)
-QN_RENAMED_FORWARD(IIviScopeTriggerRunt, Polarity, IviScopeRuntPolarityEnum,
-                   IQuorlen731XXTriggerRunt, polarity, Quorlen731XXRuntPolarityEnum)
-QN_RENAMED_FORWARD(IIviScopeTriggerTv, Polarity, IviScopeTVTriggerPolarityEnum,
-                   IQuorlen731XXTriggerTv, polarity, Quorlen731XXTVTriggerPolarityEnum)
-#undef QN_RENAMED_FORWARD
-
 HRESULT Quorlen731XX::IIviScopeTriggerGlitch_Configure_Body(BSTR Source, double Level,
                                                             double Width,
                                                             IviScopeGlitchPolarityEnum Polarity,

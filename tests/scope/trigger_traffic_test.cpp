@@ -332,7 +332,7 @@ TEST_F(TriggerTraffic, EveryRuntMemberFailsWithoutIo) {
         Runt()->get_ThresholdLow(&v),
         Runt()->put_ThresholdLow(1.0),
         Runt()->Configure(s.get(), 0.0, 1.0, Quorlen731XXRuntPolarityNegative),
-        ivi->put_Polarity(IviScopeRuntPositive),
+        ivi->put_polarity(IviScopeRuntPositive),
         ivi->Configure(s.get(), 0.0, 1.0, IviScopeRuntNegative),
     };
     for (HRESULT hr : results) EXPECT_EQ(hr, E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
