@@ -43,13 +43,13 @@ HRESULT CheckClockSource(Quorlen731XX& root, const std::string& name) {
     return VirtualToSCPI(root, name, {true, false}, &scpi);
 }
 
-HRESULT PutPattern(Quorlen731XX& root, LONG TriggerShadow::Pattern::*field, LONG val) {
+HRESULT PutPatternField(Quorlen731XX& root, LONG TriggerShadow::Pattern::*field, LONG val) {
     TriggerShadow& t = root.Core().trigger;
     StoreTriggerSetting(t.pattern.*field, val, t.pattern_pending);
     return WriteTriggerPattern(root);
 }
 
-HRESULT PutState(Quorlen731XX& root, LONG TriggerShadow::Pattern::*field, LONG val) {
+HRESULT PutStateField(Quorlen731XX& root, LONG TriggerShadow::Pattern::*field, LONG val) {
     TriggerShadow& t = root.Core().trigger;
     StoreTriggerSetting(t.state.*field, val, t.state_pending);
     return WriteTriggerState(root);
@@ -67,15 +67,15 @@ HRESULT PutState(Quorlen731XX& root, LONG TriggerShadow::Pattern::*field, LONG v
     HRESULT Quorlen731XX::Itf##_put_##Name##_Body(LONG val) {               \
         return Put(*this, &TriggerShadow::Pattern::field, val);             \
     }
-QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, AnalogMask, PutPattern, pattern, analog_mask)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, AnalogPattern, PutPattern, pattern, analog_pattern)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, DigitalMask, PutPattern, pattern, digital_mask)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, DigitalPattern, PutPattern, pattern,
+QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, AnalogMask, PutPatternField, pattern, analog_mask)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, AnalogPattern, PutPatternField, pattern, analog_pattern)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, DigitalMask, PutPatternField, pattern, digital_mask)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerPattern, DigitalPattern, PutPatternField, pattern,
                  digital_pattern)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerState, AnalogMask, PutState, state, analog_mask)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerState, AnalogPattern, PutState, state, analog_pattern)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerState, DigitalMask, PutState, state, digital_mask)
-QN_PATTERN_FIELD(IQuorlen731XXTriggerState, DigitalPattern, PutState, state, digital_pattern)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerState, AnalogMask, PutStateField, state, analog_mask)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerState, AnalogPattern, PutStateField, state, analog_pattern)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerState, DigitalMask, PutStateField, state, digital_mask)
+QN_PATTERN_FIELD(IQuorlen731XXTriggerState, DigitalPattern, PutStateField, state, digital_pattern)
 #undef QN_PATTERN_FIELD
 
 HRESULT Quorlen731XX::IQuorlen731XXTriggerPattern_get_condition_Body(
