@@ -13,7 +13,7 @@ std::vector<std::span<const CommandSpec>> AllTables() {
     return {CommonCommands(), SystemDataCommands(), ScopeCommands(),
             StatusCommands(), ChannelCommands(),    WaveformCommands(),
             MeasureCommands(), DigitalCommands(), SystemCommands(),
-            DisplayCommands()};
+            DisplayCommands(),  TriggerCommands()};
 }
 
 CommandTree BuildTree(const ModelInfo& model) {
@@ -120,7 +120,7 @@ void Instrument::StartAcquisition(bool continuous) {
     continuous_ = continuous;
     done_at_ = Clock::now() + AcquisitionTime(settings_);
     status_.SetOperationCondition(kOperationRunBit, true);
-    if (continuous) Capture();
+    if (continuous && TriggerFires(settings_, model_, inputs_)) Capture();
 }
 
 void Instrument::StopAcquisition() {
@@ -144,6 +144,8 @@ void Instrument::WaitForCompletion() {
 
 void Instrument::Tick() {
     if (!running_ || continuous_ || Clock::now() < done_at_) return;
+    // Without a trigger event (normal sweep) a single acquisition stays pending.
+    if (!TriggerFires(settings_, model_, inputs_)) return;
     Capture();
     StopAcquisition();
     if (opc_armed_) {

@@ -37,6 +37,7 @@ struct SystemState {
     std::array<int, 3> time{0, 0, 0};     // hours, minutes, seconds
     bool locked = false;                  // front panel locked (:SYST:LOCK)
 };
+std::span<const CommandSpec> TriggerCommands();
 
 class Instrument {
   public:

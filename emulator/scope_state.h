@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+#include "emulator/trigger_state.h"
+
 namespace qn::emu {
 
 inline constexpr int kMaxAnalogChannels = 4;
@@ -87,6 +89,7 @@ struct ScopeSettings {
     MarkerSettings markers;
     double external_probe = 1.0;
     std::string external_units = "VOLT";
+    TriggerSettings trigger;
 
     ScopeSettings() {
         channels[0].display = true;

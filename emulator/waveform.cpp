@@ -35,7 +35,7 @@ class Noise {
 };
 
 SourceRecord AnalogRecord(const ScopeSettings& s, const InputSignal& in, int channel, int length,
-                          std::uint32_t seed) {
+                          std::uint32_t seed, double shift) {
     const ChannelSettings& c = s.channels[static_cast<std::size_t>(channel - 1)];
     SourceRecord r;
     r.source = "CHAN" + std::to_string(channel);
@@ -48,8 +48,9 @@ SourceRecord AnalogRecord(const ScopeSettings& s, const InputSignal& in, int cha
     Noise noise(seed + static_cast<std::uint32_t>(channel));
     const double dt = s.time_range / length;
     for (int i = 0; i < length; ++i) {
-        const double phase = 2.0 * std::numbers::pi * in.frequency * (StartTime(s) + i * dt) -
-                             in.phase * std::numbers::pi / 180.0;
+        const double phase =
+            2.0 * std::numbers::pi * in.frequency * (StartTime(s) + i * dt + shift) -
+            in.phase * std::numbers::pi / 180.0;
         double v = in.square ? (std::sin(phase) >= 0 ? 1.0 : -1.0) : std::sin(phase);
         v = v * in.amplitude + noise.Next() * noise_level;
         if (c.invert) v = -v;
@@ -143,6 +144,41 @@ std::array<InputSignal, kMaxAnalogChannels> DefaultInputs() {
     return in;
 }
 
+std::optional<double> EdgeTriggerShift(const ScopeSettings& s, const ModelInfo& model,
+                                       std::span<const InputSignal> inputs) {
+    const TriggerSettings& t = s.trigger;
+    if (t.mode != "EDGE" || t.source.rfind("CHAN", 0) != 0) return 0.0;
+    const int channel = t.source[4] - '0';
+    if (channel < 1 || channel > model.analog_channels ||
+        static_cast<std::size_t>(channel) > inputs.size())
+        return 0.0;
+    const ChannelSettings& c = s.channels[static_cast<std::size_t>(channel - 1)];
+    const InputSignal& in = inputs[static_cast<std::size_t>(channel - 1)];
+    if (c.coupling == "GND" || in.frequency <= 0.0) return std::nullopt;
+    // The displayed signal is sign * A * w(theta); find the phase theta where it crosses the
+    // level in the wanted direction.
+    const double sign = c.invert ? -1.0 : 1.0;
+    const double rising = t.slope == "NEG" ? -1.0 : 1.0;  // EITH and ALT fire on rising first
+    const double pi = std::numbers::pi;
+    double theta = 0.0;
+    if (in.square) {
+        // The square wave steps at theta 0 (up) and pi (down) between -A and +A.
+        if (std::abs(t.level) >= in.amplitude) return std::nullopt;
+        theta = sign * rising > 0 ? 0.0 : pi;
+    } else {
+        const double u = sign * t.level / in.amplitude;
+        if (!(std::abs(u) <= 1.0)) return std::nullopt;
+        theta = sign * rising > 0 ? std::asin(u) : pi - std::asin(u);
+    }
+    // theta = 2 pi f (0 + shift) - lag
+    return (theta + in.phase * pi / 180.0) / (2.0 * pi * in.frequency);
+}
+
+bool TriggerFires(const ScopeSettings& s, const ModelInfo& model,
+                  std::span<const InputSignal> inputs) {
+    return s.trigger.sweep != "NORM" || EdgeTriggerShift(s, model, inputs).has_value();
+}
+
 AcquiredRecord SynthesizeRecord(const ScopeSettings& s, const ModelInfo& model,
                                 std::span<const InputSignal> inputs, std::uint32_t acquisition) {
     AcquiredRecord record;
@@ -151,10 +187,11 @@ AcquiredRecord SynthesizeRecord(const ScopeSettings& s, const ModelInfo& model,
     record.points = model.family->max_points;
     record.x_increment = s.time_range / record.points;
     record.x_origin = StartTime(s);
+    const double shift = EdgeTriggerShift(s, model, inputs).value_or(0.0);
     for (int ch = 1; ch <= model.analog_channels; ++ch) {
         if (s.channels[static_cast<std::size_t>(ch - 1)].display) {
             record.sources.push_back(AnalogRecord(s, inputs[static_cast<std::size_t>(ch - 1)], ch,
-                                                  record.points, acquisition));
+                                                  record.points, acquisition, shift));
         }
     }
     for (int pod = 1; pod <= model.pods; ++pod) {

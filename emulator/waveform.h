@@ -19,8 +19,20 @@
 
 namespace qn::emu {
 
+// The time (s) added to the signal time of every channel so that the configured edge trigger
+// fires at time 0 (the trigger point of the record): the configured level crossed with the
+// configured slope by the input of an analog trigger source. 0 for triggers the emulator does
+// not model; nullopt when the edge trigger never fires (level outside the signal, grounded
+// source).
+std::optional<double> EdgeTriggerShift(const ScopeSettings& settings, const ModelInfo& model,
+                                       std::span<const InputSignal> inputs);
+// Whether an acquisition triggers: the edge trigger fires, or the sweep triggers by itself.
+bool TriggerFires(const ScopeSettings& settings, const ModelInfo& model,
+                  std::span<const InputSignal> inputs);
+
 // `acquisition` numbers the acquisition and seeds its noise.
-// The signal of each analog input is `inputs[channel - 1]`.
+// The signal of each analog input is `inputs[channel - 1]`; the record is aligned to the
+// trigger (EdgeTriggerShift), free-running when the trigger never fires.
 AcquiredRecord SynthesizeRecord(const ScopeSettings& settings, const ModelInfo& model,
                                 std::span<const InputSignal> inputs, std::uint32_t acquisition);
 

@@ -16,5 +16,6 @@ int SystemCommand(std::span<char*> args);
 int ScreenshotCommand(std::span<char*> args);
 int SetupCommand(std::span<char*> args);
 int ScpiCommand(std::span<char*> args);
+int TriggerCommand(std::span<char*> args);
 
 }  // namespace qn::tools

@@ -36,6 +36,8 @@ constexpr Command kCommands[] = {
      "setup save FILE: keep the instrument's setup in FILE; setup load FILE: put it back"},
     {"scpi", qn::tools::ScpiCommand,
      "send one SCPI command through the driver's I/O object; a query prints its reply"},
+    {"trigger", qn::tools::TriggerCommand,
+     "set and print the trigger: --type --source --level --slope --coupling --holdoff --modifier"},
 };
 
 int Usage(FILE* to) {

@@ -2,6 +2,7 @@
 
 #include <cstdio>
 
+#include "Quorlen731XXErrors.h"
 #include "core/error_table.h"
 
 namespace qn::tools {
@@ -28,6 +29,20 @@ int ReportFailure(const char* what, HRESULT hr) {
         if (e.hr == hr) name = e.name;
     std::fprintf(stderr, "%s failed: error 0x%08X%s%s%s\n%s\n", what, static_cast<unsigned>(hr),
                  *name ? " (" : "", name, *name ? ")" : "", text.c_str());
+    return 1;
+}
+
+int ReportFailure(Quorlen731XX* driver, const char* what, HRESULT hr) {
+    ReportFailure(what, hr);
+    if (hr != E_IVI_INSTRUMENT_STATUS) return 1;
+    // The queue holds a handful of entries; stop at "no error" or a failure.
+    for (int i = 0; i < 10; ++i) {
+        LONG code = 0;
+        com::Bstr message;
+        if (FAILED(driver->ErrorQuery(&code, message.Out())) || code == 0) break;
+        std::fprintf(stderr, "instrument error %ld: %s\n", static_cast<long>(code),
+                     message.utf8().c_str());
+    }
     return 1;
 }
 

@@ -26,6 +26,10 @@ std::string LastErrorText();
 // Prints "error 0x...: (NAME) description" to stderr and returns 1.
 int ReportFailure(const char* what, HRESULT hr);
 
+// As ReportFailure; when the instrument reported errors (a failed status
+// check), also prints the instrument's error queue as the driver reads it.
+int ReportFailure(Quorlen731XX* driver, const char* what, HRESULT hr);
+
 // Creates the driver and initializes it from the session options. Without
 // --resource (and without --simulate) an emulator of --model (default
 // QDS4032A) is started on loopback and opened through its raw socket.

@@ -4,6 +4,7 @@
 #include <chrono>
 #include <cmath>
 #include <cstdio>
+#include <cstdlib>
 #include <optional>
 #include <string>
 #include <thread>
@@ -28,15 +29,59 @@ std::vector<OptionSpec> WaveformOptions() {
     o.push_back({"points", true, "minimum number of points of the record"});
     o.push_back({"csv", true, "write the waveform(s) to this CSV file"});
     o.push_back({"plot", true, "write an SVG plot to this file"});
+    o.push_back({"trigger-level", true, "acquire on an edge trigger at this level in V"});
+    o.push_back({"trigger-source", true, "acquire on an edge trigger on this source"});
     return o;
+}
+
+// The trigger level of --trigger-level, when given and a number.
+bool TriggerLevel(const CliArgs& args, std::optional<double>* level, std::string* error) {
+    const auto text = args.Value("trigger-level");
+    if (!text) return true;
+    char* end = nullptr;
+    const double v = std::strtod(text->c_str(), &end);
+    if (text->empty() || *end != '\0' || !std::isfinite(v)) {
+        *error = "--trigger-level " + *text + ": not a number";
+        return false;
+    }
+    *level = v;
+    return true;
 }
 
 bool ParseArgs(const char* command, std::span<char*> argv, CliArgs* args) {
     const std::vector<OptionSpec> specs = WaveformOptions();
     std::string error;
-    if (args->Parse(specs, argv, &error)) return true;
+    std::optional<double> level;
+    if (args->Parse(specs, argv, &error) && TriggerLevel(*args, &level, &error)) return true;
     std::fprintf(stderr, "qn731xx %s: %s\n%s", command, error.c_str(), OptionHelp(specs).c_str());
     return false;
+}
+
+bool WantsTrigger(const CliArgs& args) {
+    return args.Has("trigger-level") || args.Has("trigger-source");
+}
+
+// --trigger-level and --trigger-source: an edge trigger with a normal sweep,
+// so the acquisition waits for the level to be crossed.
+HRESULT ApplyTrigger(Quorlen731XX* driver, const CliArgs& args, const char** what) {
+    if (!WantsTrigger(args)) return S_OK;
+    auto* trigger = static_cast<IQuorlen731XXTrigger*>(driver);
+    *what = "trigger Type";
+    HRESULT hr = trigger->put_Type(Quorlen731XXTriggerEdge);
+    if (SUCCEEDED(hr) && args.Has("trigger-source")) {
+        *what = "--trigger-source";
+        com::Bstr source(*args.Value("trigger-source"));
+        hr = trigger->put_Source(source.get());
+    }
+    if (SUCCEEDED(hr) && args.Has("trigger-level")) {
+        *what = "--trigger-level";
+        hr = trigger->put_Level(std::strtod(args.Value("trigger-level")->c_str(), nullptr));
+    }
+    if (SUCCEEDED(hr)) {
+        *what = "trigger Modifier";
+        hr = trigger->put_Modifier(Quorlen731XXTriggerModifierNone);
+    }
+    return hr;
 }
 
 // Fetches the current record of analog channel `channel` (1-based).
@@ -194,9 +239,12 @@ int FetchCommand(std::span<char*> argv) {
         hr = driver->Close();
         return FAILED(hr) ? ReportFailure("Close", hr) : rc;
     }
-    if (session.emulator) {
-        // The embedded emulator has no record until something acquired one.
-        hr = ConfigureChannel(driver, channel, 8.0, 0.0);
+    const char* what = "";
+    if (FAILED(hr = ApplyTrigger(driver, args, &what))) return ReportFailure(what, hr);
+    if (session.emulator || WantsTrigger(args)) {
+        // The embedded emulator has no record until something acquired one;
+        // a trigger asks for a new acquisition.
+        if (session.emulator) hr = ConfigureChannel(driver, channel, 8.0, 0.0);
         if (SUCCEEDED(hr)) hr = AcquireOnce(driver);
         if (FAILED(hr)) return ReportFailure("Acquire", hr);
     }
@@ -236,6 +284,8 @@ int DemoCommand(std::span<char*> argv) {
                                          settings[ch - 1].second)))
             return ReportFailure("Configure channel", hr);
     std::printf("configured: 1 ms per record, channel 1 8 V / 0 V, channel 2 4 V / 0.5 V\n");
+    const char* what = "";
+    if (FAILED(hr = ApplyTrigger(driver, args, &what))) return ReportFailure(what, hr);
     if (FAILED(hr = AcquireOnce(driver))) return ReportFailure("Acquire", hr);
     std::vector<Trace> traces(2);
     for (long ch = 1; ch <= 2; ++ch)
