@@ -537,6 +537,37 @@ QN731XX_API ViStatus Qn731XX_StatusGetRegister(ViSession vi, ViInt32 statusRegis
 QN731XX_API ViStatus Qn731XX_StatusSetRegister(ViSession vi, ViInt32 statusRegister,
                                                ViInt32 subRegister, ViInt32 value);
 
+/* ------------------------------------------------------------------------ */
+/* Triggers                                                                  */
+/* ------------------------------------------------------------------------ */
+
+QN731XX_API ViStatus Qn731XX_ConfigureTrigger(ViSession vi, ViInt32 triggerType, ViReal64 holdoff);
+QN731XX_API ViStatus Qn731XX_ConfigureEdgeTriggerSource(ViSession vi, ViConstString source,
+                                                        ViReal64 level, ViInt32 slope);
+QN731XX_API ViStatus Qn731XX_ConfigureGlitchTriggerSource(ViSession vi, ViConstString source,
+                                                          ViReal64 level, ViReal64 width,
+                                                          ViInt32 polarity, ViInt32 condition);
+QN731XX_API ViStatus Qn731XX_ConfigureRuntTriggerSource(ViSession vi, ViConstString source,
+                                                        ViReal64 thresholdLow,
+                                                        ViReal64 thresholdHigh, ViInt32 polarity);
+QN731XX_API ViStatus Qn731XX_ConfigureTVTriggerSource(ViSession vi, ViConstString source,
+                                                      ViInt32 signalFormat, ViInt32 event,
+                                                      ViInt32 polarity);
+QN731XX_API ViStatus Qn731XX_ConfigureWidthTriggerSource(ViSession vi, ViConstString source,
+                                                         ViReal64 level, ViReal64 thresholdLow,
+                                                         ViReal64 thresholdHigh, ViInt32 polarity,
+                                                         ViInt32 condition);
+QN731XX_API ViStatus Qn731XX_TriggerPatternConfigure(ViSession vi, ViInt32 analogPattern,
+                                                     ViInt32 analogMask, ViInt32 digitalPattern,
+                                                     ViInt32 digitalMask, ViInt32 matchingMode);
+QN731XX_API ViStatus Qn731XX_TriggerRuntConfigure(ViSession vi, ViConstString source,
+                                                  ViReal64 thresholdLow, ViReal64 thresholdHigh,
+                                                  ViInt32 polarity);
+QN731XX_API ViStatus Qn731XX_TriggerStateConfigure(ViSession vi, ViConstString clockSource,
+                                                   ViReal64 clockLevel, ViInt32 clockSlope,
+                                                   ViInt32 analogPattern, ViInt32 analogMask,
+                                                   ViInt32 digitalPattern, ViInt32 digitalMask);
+
 #ifdef __cplusplus
 }
 #endif
