@@ -49,14 +49,15 @@ TEST_F(DriverTest, InterchangeCheckFailsInitializeAfterwards) {
 }
 
 TEST_F(DriverTest, WithoutSimulationAnUnreachableResourceIsUnknown) {
-    EXPECT_EQ(Init("TCPIP0::192.0.2.1::5025::SOCKET", ""), E_IVI_RESOURCE_UNKNOWN);
+    // Port 1 on loopback: nothing listens, the connection is refused at once.
+    EXPECT_EQ(Init("TCPIP0::127.0.0.1::1::SOCKET", ""), E_IVI_RESOURCE_UNKNOWN);
     EXPECT_FALSE(Initialized());
 }
 
 TEST_F(DriverTest, StoreSessionSuppliesFlagsSetupAndSettings) {
     WriteStore(R"(<?xml version="1.0"?>
 <IviConfigurationStore>
-  <HardwareAsset name="Bench" resourceDescriptor="TCPIP0::192.0.2.7::INSTR"/>
+  <HardwareAsset name="Bench" resourceDescriptor="TCPIP0::127.0.0.1::INSTR"/>
   <DriverSession name="S1" hardwareAsset="Bench" simulate="true" rangeCheck="false">
     <DriverSetup>Model=QMS3104A, Trace=false</DriverSetup>
     <VirtualName name="Ch" mapTo="Channel"><Range start="1" end="2" physicalStart="1"/></VirtualName>
@@ -71,7 +72,7 @@ TEST_F(DriverTest, StoreSessionSuppliesFlagsSetupAndSettings) {
     ASSERT_EQ(Init("MyScope", "Cache=false"), S_OK) << ErrorText();
     const DriverSession& s = driver_->Core().session;
     EXPECT_EQ(s.logical_name, "MyScope");
-    EXPECT_EQ(s.io_resource_descriptor, "TCPIP0::192.0.2.7::INSTR");
+    EXPECT_EQ(s.io_resource_descriptor, "TCPIP0::127.0.0.1::INSTR");
     EXPECT_TRUE(s.flags.simulate);
     EXPECT_FALSE(s.flags.range_check);
     EXPECT_FALSE(s.flags.cache);  // the option string is applied last

@@ -16,7 +16,7 @@ using namespace qn::ivi;
 
 const char* kStore = R"(<?xml version="1.0"?>
 <IviConfigurationStore version="1">
-  <HardwareAsset name="Bench" resourceDescriptor=" TCPIP0::192.0.2.7::INSTR "/>
+  <HardwareAsset name="Bench" resourceDescriptor=" TCPIP0::127.0.0.1::INSTR "/>
   <SoftwareModule name="Qn731XX" description="scope driver">
     <DataComponent name="Configurable Initial Settings" type="Structure">
       <DataComponent name=" Model " type="String" value="QDS4032A"/>
@@ -59,7 +59,7 @@ TEST(ConfigStore, SessionCarriesAssetFlagsSetupAndModule) {
     const DriverSession* s = store.FindSession("Scope1");
     ASSERT_NE(s, nullptr);
     EXPECT_TRUE(s->HasHardwareAsset());
-    EXPECT_EQ(s->resource_descriptor, "TCPIP0::192.0.2.7::INSTR");
+    EXPECT_EQ(s->resource_descriptor, "TCPIP0::127.0.0.1::INSTR");
     EXPECT_EQ(s->software_module, "Qn731XX");
     EXPECT_EQ(s->driver_setup, "Model=QDS4032A, Trace=false");
     EXPECT_FALSE(s->flags.cache);
@@ -94,7 +94,7 @@ TEST(ConfigStore, LogicalNamesResolveFirstAndNamesAreCaseSensitive) {
     // "Plain" is both a logical name and a session: the logical name wins.
     EXPECT_EQ(store.FindSession("Plain")->name, "Scope1");
     EXPECT_EQ(store.FindSession("myscope"), nullptr);
-    EXPECT_EQ(store.FindSession("TCPIP0::192.0.2.7::INSTR"), nullptr);
+    EXPECT_EQ(store.FindSession("TCPIP0::127.0.0.1::INSTR"), nullptr);
     EXPECT_EQ(store.FindSession(""), nullptr);
     EXPECT_NE(store.FindSoftwareModule("Qn731XX"), nullptr);
     EXPECT_EQ(store.FindSoftwareModule("Other"), nullptr);
