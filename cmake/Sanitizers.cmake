@@ -9,3 +9,10 @@ if(QN_TSAN)
   add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
   add_link_options(-fsanitize=thread)
 endif()
+# clang links its sanitizer runtime into executables only: a shared library's
+# references to it are resolved when a program loads the library, so such a
+# library cannot be linked with --no-undefined.
+set(QN_LINK_NO_UNDEFINED -Wl,--no-undefined)
+if((QN_SANITIZE OR QN_TSAN) AND CMAKE_CXX_COMPILER_ID MATCHES "Clang")
+  set(QN_LINK_NO_UNDEFINED "")
+endif()

@@ -2,7 +2,7 @@
 # Installs the Debian packages the build and the tests need, only when missing.
 set -euo pipefail
 packages=(
-  build-essential cmake ninja-build pkg-config clang ccache
+  build-essential cmake ninja-build pkg-config clang ccache dpkg-dev file
   libgtest-dev libgmock-dev libbenchmark-dev
   libpugixml-dev libtirpc-dev rpcsvc-proto
   python3 python3-pyvisa python3-pyvisa-py lxi-tools
