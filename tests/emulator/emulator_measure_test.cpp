@@ -3,23 +3,12 @@
 // their channels switching together, and the activity flags.
 #include <gtest/gtest.h>
 
-#include "emulator/emulator.h"
 #include "tests/emulator/scpi_client.h"
 
 namespace qn::emu {
 namespace {
 
-using test::ScpiClient;
-
-constexpr const char* kNoError = R"(+0,"No error")";
-
-struct Session {
-    explicit Session(const char* model) : emu(model), client(emu.Start()) {
-        client.Query("*CLS;*OPC?");
-    }
-    Emulator emu;
-    ScpiClient client;
-};
+using namespace test;
 
 TEST(EmulatorMeasure, CommandsEachModelAcceptsOrRefuses) {
     struct Case {

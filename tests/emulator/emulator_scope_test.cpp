@@ -4,34 +4,12 @@
 
 #include <cstdint>
 
-#include "emulator/emulator.h"
 #include "tests/emulator/scpi_client.h"
 
 namespace qn::emu {
 namespace {
 
-using test::ScpiClient;
-
-constexpr const char* kNoError = R"(+0,"No error")";
-
-struct Session {
-    explicit Session(const char* model) : emu(model), client(emu.Start()) {
-        client.Query("*CLS;*OPC?");
-    }
-    Emulator emu;
-    ScpiClient client;
-};
-
-// Raw bytes of a block reply: header checked, payload returned.
-std::string ReadBlock(ScpiClient& c, const std::string& query) {
-    c.Send(query);
-    const auto head = c.ReadBytes(2);
-    if (!head || (*head)[0] != '#') return "<bad header>";
-    const auto digits = c.ReadBytes(static_cast<std::size_t>((*head)[1] - '0'));
-    const auto payload = c.ReadBytes(std::stoul(*digits));
-    EXPECT_EQ(c.ReadBytes(1), "\n");
-    return payload.value_or("<short block>");
-}
+using namespace test;
 
 std::string Field(const std::string& csv, int index) {
     std::size_t begin = 0;

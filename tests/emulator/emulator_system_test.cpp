@@ -4,7 +4,6 @@
 
 #include <cstdint>
 
-#include "emulator/emulator.h"
 #include "emulator/models.h"
 #include "emulator/setup_block.h"
 #include "tests/emulator/scpi_client.h"
@@ -12,27 +11,7 @@
 namespace qn::emu {
 namespace {
 
-using test::ScpiClient;
-
-constexpr const char* kNoError = R"(+0,"No error")";
-
-struct Session {
-    explicit Session(const char* model) : emu(model), client(emu.Start()) {
-        client.Query("*CLS;*OPC?");
-    }
-    Emulator emu;
-    ScpiClient client;
-};
-
-std::string ReadBlock(ScpiClient& c, const std::string& query) {
-    c.Send(query);
-    const auto head = c.ReadBytes(2);
-    if (!head || (*head)[0] != '#') return "<bad header>";
-    const auto digits = c.ReadBytes(static_cast<std::size_t>((*head)[1] - '0'));
-    const auto payload = c.ReadBytes(std::stoul(*digits));
-    EXPECT_EQ(c.ReadBytes(1), "\n");
-    return payload.value_or("<short block>");
-}
+using namespace test;
 
 std::string Block(const std::string& payload) {
     const std::string length = std::to_string(payload.size());

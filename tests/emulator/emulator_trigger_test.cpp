@@ -2,23 +2,12 @@
 // sends them, refusals by range and by feature, and acquisitions that wait for their trigger.
 #include <gtest/gtest.h>
 
-#include "emulator/emulator.h"
 #include "tests/emulator/scpi_client.h"
 
 namespace qn::emu {
 namespace {
 
-using test::ScpiClient;
-
-constexpr const char* kNoError = R"(+0,"No error")";
-
-struct Session {
-    explicit Session(const char* model) : emu(model), client(emu.Start()) {
-        client.Query("*CLS;*OPC?");
-    }
-    Emulator emu;
-    ScpiClient client;
-};
+using namespace test;
 
 TEST(EmulatorTrigger, DriverMessagesSetTheirTypesState) {
     Session s("QMS4034A");

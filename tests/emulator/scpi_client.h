@@ -3,6 +3,7 @@
 #pragma once
 
 #include <arpa/inet.h>
+#include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <poll.h>
 #include <sys/socket.h>
@@ -13,6 +14,8 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+
+#include "emulator/emulator.h"
 
 namespace qn::emu::test {
 
@@ -98,5 +101,29 @@ class ScpiClient {
     std::string buffer_;
     bool closed_ = false;
 };
+
+inline constexpr const char* kNoError = R"(+0,"No error")";
+
+// An emulator of `model` and one client connected to it, with the status
+// cleared (the round trip also waits until the emulator serves the client).
+struct Session {
+    explicit Session(const char* model) : emu(model), client(emu.Start()) {
+        client.Query("*CLS;*OPC?");
+    }
+    Emulator emu;
+    ScpiClient client;
+};
+
+// The payload of the definite-length block that answers `query`, its header
+// and final line feed checked.
+inline std::string ReadBlock(ScpiClient& c, const std::string& query) {
+    c.Send(query);
+    const auto head = c.ReadBytes(2);
+    if (!head || (*head)[0] != '#') return "<bad header>";
+    const auto digits = c.ReadBytes(static_cast<std::size_t>((*head)[1] - '0'));
+    const auto payload = c.ReadBytes(std::stoul(*digits));
+    EXPECT_EQ(c.ReadBytes(1), "\n");
+    return payload.value_or("<short block>");
+}
 
 }  // namespace qn::emu::test
