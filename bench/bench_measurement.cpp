@@ -9,16 +9,12 @@
 //   the reply up to the line feed.
 // The emulator serves one client at a time, so each case opens its own
 // connection. The ratios of the medians are printed at the end.
-#include <arpa/inet.h>
 #include <benchmark/benchmark.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <cstdlib>
 #include <string>
 
+#include "bench/loopback.h"
 #include "bench/ratio_reporter.h"
 #include "core/root.h"
 #include "emulator/emulator.h"
@@ -35,52 +31,14 @@ qn::emu::Emulator& TheEmulator() {
     return emu;
 }
 
-class BareClient {
-  public:
-    explicit BareClient(std::uint16_t port) {
-        fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        a.sin_port = htons(port);
-        ok_ = fd_ >= 0 && ::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) == 0;
-        int one = 1;
-        if (ok_) ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-    }
-    ~BareClient() {
-        if (fd_ >= 0) ::close(fd_);
-    }
-    BareClient(const BareClient&) = delete;
-    BareClient& operator=(const BareClient&) = delete;
-
-    bool ok() const { return ok_; }
-    bool Send(const std::string& s) {
-        return ::send(fd_, s.data(), s.size(), MSG_NOSIGNAL) == static_cast<ssize_t>(s.size());
-    }
-    bool ReadLine(std::string* line) {
-        line->clear();
-        char buf[256];
-        for (;;) {
-            ssize_t k = ::recv(fd_, buf, sizeof buf, 0);
-            if (k <= 0) return false;
-            line->append(buf, static_cast<std::size_t>(k));
-            if (line->back() == '\n') return true;
-        }
-    }
-
-  private:
-    int fd_ = -1;
-    bool ok_ = false;
-};
-
 // Both loopback cases measure the record of one acquisition.
-bool Acquire(BareClient& c) {
+bool Acquire(qn::bench::LineClient& c) {
     std::string reply;
     return c.Send(":DIG;*OPC?\n") && c.ReadLine(&reply);
 }
 
 void BM_Measure_BareSocket(benchmark::State& state) {
-    BareClient c(TheEmulator().port());
+    qn::bench::LineClient c(TheEmulator().port());
     if (!c.ok() || !Acquire(c)) {
         state.SkipWithError("connect failed");
         return;
@@ -105,9 +63,7 @@ ComPtr<IQuorlen731XXMeasurement> Channel1(qn::Quorlen731XX* driver) {
 
 void BM_Measure_Driver(benchmark::State& state) {
     auto driver = qn::com::MakeComObject<qn::Quorlen731XX>();
-    const std::string resource =
-        "TCPIP0::127.0.0.1::" + std::to_string(TheEmulator().port()) + "::SOCKET";
-    qn::com::Bstr r(resource), o("QueryInstrStatus=false");
+    qn::com::Bstr r(qn::bench::SocketResource(TheEmulator().port())), o("QueryInstrStatus=false");
     if (FAILED(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get())) ||
         FAILED(qn::Io(*driver.get()).InstrWrite(":DIG"))) {
         state.SkipWithError("Initialize failed");

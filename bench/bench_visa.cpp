@@ -6,12 +6,7 @@
 //   IFormattedIO488Direct::ReadIEEEBlockInto, and through a bare socket
 //   reading into a reused buffer.
 // Compare the medians of the same size: the ratio is VISA time / bare time.
-#include <arpa/inet.h>
 #include <benchmark/benchmark.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <cstring>
 #include <map>
@@ -20,6 +15,7 @@
 #include <thread>
 #include <vector>
 
+#include "bench/loopback.h"
 #include "platform/visa/visa.h"
 
 namespace {
@@ -30,21 +26,11 @@ const char kIdn[] = "QUORLEN,731XX,SN000001,1.3.20\n";
 class Server {
   public:
     Server() {
-        fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        ::bind(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        ::listen(fd_, 8);
-        socklen_t len = sizeof a;
-        ::getsockname(fd_, reinterpret_cast<sockaddr*>(&a), &len);
-        port_ = ntohs(a.sin_port);
+        fd_ = qn::bench::ListenLoopback(&port_);
         std::thread([this] { AcceptLoop(); }).detach();
     }
-    unsigned short port() const { return port_; }
-    std::string Resource() const {
-        return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
-    }
+    std::uint16_t port() const { return port_; }
+    std::string Resource() const { return qn::bench::SocketResource(port_); }
 
   private:
     void AcceptLoop() {
@@ -68,14 +54,6 @@ class Server {
         }
         return r;
     }
-    static void SendAll(int c, const char* p, std::size_t n) {
-        while (n) {
-            ssize_t k = ::send(c, p, n, MSG_NOSIGNAL);
-            if (k <= 0) return;
-            p += k;
-            n -= std::size_t(k);
-        }
-    }
     void Serve(int c) {
         std::string in;
         char buf[4096];
@@ -92,16 +70,16 @@ class Server {
             std::string line = in.substr(0, nl);
             in.erase(0, nl + 1);
             if (line == "*IDN?") {
-                SendAll(c, kIdn, sizeof kIdn - 1);
+                qn::bench::SendAll(c, kIdn, sizeof kIdn - 1);
             } else if (line.rfind("BLK? ", 0) == 0) {
                 const std::string& r = BlockReply(std::stoul(line.substr(5)));
-                SendAll(c, r.data(), r.size());
+                qn::bench::SendAll(c, r.data(), r.size());
             }
         }
     }
 
     int fd_ = -1;
-    unsigned short port_ = 0;
+    std::uint16_t port_ = 0;
     std::mutex m_;
     std::map<std::size_t, std::string> blocks_;
 };
@@ -111,52 +89,24 @@ Server& TheServer() {
     return s;
 }
 
-// The bare client: blocking socket, a small receive buffer for replies and
-// headers, large data straight into the destination.
-class BareClient {
-  public:
-    BareClient() {
-        fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        a.sin_port = htons(TheServer().port());
-        ::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        int one = 1;
-        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+// The bare block read: "#9<len><data>\n" into dst (room for len bytes), the
+// header through a small buffer and the data straight into the destination;
+// returns len.
+std::size_t ReadBlock(int fd, char* dst) {
+    char head[4096];
+    std::size_t have = 0;
+    while (have < 11) have += std::size_t(::recv(fd, head + have, sizeof head - have, 0));
+    std::size_t len = std::stoul(std::string(head + 2, 9));
+    std::size_t extra = std::min(have - 11, len + 1);
+    std::memcpy(dst, head + 11, std::min(extra, len));
+    std::size_t got = extra;
+    while (got < len) got += std::size_t(::recv(fd, dst + got, len - got, 0));
+    if (got == len) {
+        char nl;
+        ::recv(fd, &nl, 1, 0);
     }
-    ~BareClient() { ::close(fd_); }
-    void Send(const std::string& s) { ::send(fd_, s.data(), s.size(), MSG_NOSIGNAL); }
-    std::string ReadLine() {
-        std::string line;
-        char c[256];
-        for (;;) {
-            ssize_t k = ::recv(fd_, c, sizeof c, 0);
-            if (k <= 0) return line;
-            line.append(c, std::size_t(k));
-            if (line.back() == '\n') return line;
-        }
-    }
-    // Reads "#9<len><data>\n" into dst (room for len bytes); returns len.
-    std::size_t ReadBlock(char* dst) {
-        char head[4096];
-        std::size_t have = 0;
-        while (have < 11) have += std::size_t(::recv(fd_, head + have, sizeof head - have, 0));
-        std::size_t len = std::stoul(std::string(head + 2, 9));
-        std::size_t extra = std::min(have - 11, len + 1);
-        std::memcpy(dst, head + 11, std::min(extra, len));
-        std::size_t got = extra;
-        while (got < len) got += std::size_t(::recv(fd_, dst + got, len - got, 0));
-        if (got == len) {
-            char nl;
-            ::recv(fd_, &nl, 1, 0);
-        }
-        return len;
-    }
-
-  private:
-    int fd_ = -1;
-};
+    return len;
+}
 
 ComPtr<IMessage> OpenSession() {
     ComPtr<IResourceManager> rm;
@@ -171,10 +121,11 @@ ComPtr<IMessage> OpenSession() {
 }
 
 void BM_Idn_BareSocket(benchmark::State& state) {
-    BareClient c;
+    qn::bench::LineClient c(TheServer().port());
+    std::string line;
     for (auto _ : state) {
         c.Send("*IDN?\n");
-        benchmark::DoNotOptimize(c.ReadLine());
+        benchmark::DoNotOptimize(c.ReadLine(&line));
     }
 }
 
@@ -190,12 +141,12 @@ void BM_Idn_IMessage(benchmark::State& state) {
 }
 
 void BM_Block_BareSocket(benchmark::State& state) {
-    BareClient c;
+    qn::bench::LineClient c(TheServer().port());
     const std::string query = "BLK? " + std::to_string(state.range(0)) + "\n";
     std::vector<char> dst(std::size_t(state.range(0)));
     for (auto _ : state) {
         c.Send(query);
-        benchmark::DoNotOptimize(c.ReadBlock(dst.data()));
+        benchmark::DoNotOptimize(ReadBlock(c.fd(), dst.data()));
     }
     state.SetBytesProcessed(state.iterations() * state.range(0));
 }

@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/loopback.h"
 #include "bench/ratio_reporter.h"
 #include "emulator/emulator.h"
 #include "platform/visa/visa.h"
@@ -40,7 +41,7 @@ std::string Resource(bool vxi11) {
         return "TCPIP0::127.0.0.1:" + std::to_string(TheEmulator().vxi11_port()) +
                "::inst0::INSTR";
     }
-    return "TCPIP0::127.0.0.1::" + std::to_string(TheEmulator().port()) + "::SOCKET";
+    return qn::bench::SocketResource(TheEmulator().port());
 }
 
 ComPtr<IMessage> Open(bool vxi11) {

@@ -13,12 +13,7 @@
 //   prepared record;
 // - BM_Fetch_Sessions: 1, 2 and 8 sessions in as many threads, each against
 //   an emulator of its own (items per second is the aggregate throughput).
-#include <arpa/inet.h>
 #include <benchmark/benchmark.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -217,7 +212,7 @@ void BM_Fetch_DriverLoop(benchmark::State& state) {
 // The same loop against the emulator serving the prepared record from memory.
 void BM_Fetch_DriverEmulator(benchmark::State& state) {
     const auto& emu = *PeersFor(std::size_t(state.range(0))).emulator;
-    FetchLoop(state, "TCPIP0::127.0.0.1::" + std::to_string(emu.port()) + "::SOCKET");
+    FetchLoop(state, qn::bench::SocketResource(emu.port()));
 }
 
 // The first FetchWaveform of a new session into a new array: receive buffer
@@ -268,7 +263,7 @@ void BM_Fetch_Sessions(benchmark::State& state) {
         }
     });
     const auto& emu = *emulators[std::size_t(state.thread_index())];
-    FetchLoop(state, "TCPIP0::127.0.0.1::" + std::to_string(emu.port()) + "::SOCKET");
+    FetchLoop(state, qn::bench::SocketResource(emu.port()));
 }
 
 BENCHMARK(BM_ConvertWords)->Arg(1 << 20)->Repetitions(kRepetitions)->ReportAggregatesOnly(true);

@@ -9,12 +9,7 @@
 // loop comes from memory. Commands (no '?') are not answered.
 #pragma once
 
-#include <arpa/inet.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
 #include <poll.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <atomic>
 #include <cstdint>
@@ -25,55 +20,9 @@
 #include <thread>
 #include <vector>
 
+#include "bench/loopback.h"
+
 namespace qn::bench {
-
-// A blocking loopback client socket; -1 when the connection failed.
-inline int ConnectLoopback(std::uint16_t port) {
-    const int fd = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_in a{};
-    a.sin_family = AF_INET;
-    a.sin_port = htons(port);
-    a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    int one = 1;
-    ::setsockopt(fd, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-    if (::connect(fd, reinterpret_cast<sockaddr*>(&a), sizeof a) != 0) {
-        ::close(fd);
-        return -1;
-    }
-    return fd;
-}
-
-inline bool SendAll(int fd, const char* p, std::size_t n) {
-    while (n > 0) {
-        const ssize_t r = ::send(fd, p, n, MSG_NOSIGNAL);
-        if (r <= 0) return false;
-        p += r;
-        n -= std::size_t(r);
-    }
-    return true;
-}
-
-inline bool RecvAll(int fd, void* buf, std::size_t n) {
-    auto* p = static_cast<char*>(buf);
-    while (n > 0) {
-        const ssize_t r = ::recv(fd, p, n, 0);
-        if (r <= 0) return false;
-        p += r;
-        n -= std::size_t(r);
-    }
-    return true;
-}
-
-// Reads one reply line (up to and including "\n") from fd.
-inline bool RecvLine(int fd, std::string* line) {
-    line->clear();
-    char c = 0;
-    while (RecvAll(fd, &c, 1)) {
-        line->push_back(c);
-        if (c == '\n') return true;
-    }
-    return false;
-}
 
 class BlockServer {
   public:
@@ -81,15 +30,7 @@ class BlockServer {
     // `teacher_port`: the instrument asked for replies not yet known (0: none).
     BlockServer(std::string block, std::uint16_t teacher_port)
         : block_(std::move(block)), teacher_port_(teacher_port) {
-        listener_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        ::bind(listener_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        ::listen(listener_, 16);
-        socklen_t len = sizeof a;
-        ::getsockname(listener_, reinterpret_cast<sockaddr*>(&a), &len);
-        port_ = ntohs(a.sin_port);
+        listener_ = ListenLoopback(&port_);
         acceptor_ = std::thread([this] { AcceptLoop(); });
     }
     ~BlockServer() {
@@ -105,7 +46,7 @@ class BlockServer {
 
     std::uint16_t port() const { return port_; }
     std::string Resource() const {
-        return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
+        return SocketResource(port_);
     }
 
   private:
