@@ -99,6 +99,23 @@ TEST(FixedFeatures, EveryEarlyModelAndTheDefaults) {
     }
 }
 
+// A newer model's session up to feature discovery: the identity, the counts
+// its instance lists are built from, and the identity again (left out with
+// `second_identity` false). Discovery's own queries are the caller's.
+ScriptedProvider* ScriptCounts(ComPtr<Quorlen731XX>* driver, const std::string& chan,
+                               const std::string& pods, const std::string& size,
+                               bool second_identity = true) {
+    ScriptedProvider* io = nullptr;
+    *driver = DriverOnScript(&io);
+    const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
+    io->Expect("*IDN?\n", idn)
+        .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", chan + "\n")
+        .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", pods + "\n")
+        .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", size + "\n");
+    if (second_identity) io->Expect("*IDN?\n", idn);
+    return io;
+}
+
 // A newer model's whole discovery, with each feature token alone in its
 // reply: it sets its own flag and no other; tokens match case-sensitively.
 TEST(Discovery, EachFeatureTokenAloneSetsItsOwnFlag) {
@@ -122,15 +139,9 @@ TEST(Discovery, EachFeatureTokenAloneSetsItsOwnFlag) {
     const auto val = [](const char* key) { return std::string(":SYST:DATA:VAL? \"") + key + "\"\n"; };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.flag);
-        ScriptedProvider* io = nullptr;
-        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
-        const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
-        io->Expect("*IDN?\n", idn)
-            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
-            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "3\n")
-            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "5\n")
-            .Expect("*IDN?\n", idn)
-            .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
+        ComPtr<Quorlen731XX> driver;
+        ScriptedProvider* io = ScriptCounts(&driver, "2", "3", "5");
+        io->Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
             .Expect(val("DISP:LAB"), "0\n")
             .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "1\n")
             .Expect(val("WAV:FEAT"), "DEC\n")
@@ -158,15 +169,9 @@ TEST(Discovery, EachFeatureTokenAloneSetsItsOwnFlag) {
 }
 
 TEST(Discovery, AFailingQueryEndsDiscoveryButNotInitialize) {
-    ScriptedProvider* io = nullptr;
-    ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
-    const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
-    io->Expect("*IDN?\n", idn)
-        .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
-        .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "0\n")
-        .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "8\n")
-        .Expect("*IDN?\n", idn)
-        .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
+    ComPtr<Quorlen731XX> driver;
+    ScriptedProvider* io = ScriptCounts(&driver, "2", "0", "8");
+    io->Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "1\n")
         .Expect(":SYST:DATA:VAL? \"DISP:LAB\"\n", "0\n")
         .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "1\n")
         .Expect(":SYST:DATA:VAL? \"WAV:FEAT\"\n", "DEC,SEGM\n")
@@ -194,19 +199,14 @@ TEST(Discovery, HostileChannelCountsAreBounded) {
         const char* size;
         bool fails;
     };
-    const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
     for (const Case& c : {Case{"2147483647", "0", "8", true}, Case{"4", "2147483647", "8", true},
                           Case{"4", "-2147483648", "-2147483648", false},
                           Case{"4", "-65536", "-65536", false}}) {
         SCOPED_TRACE(std::string(c.chan) + " " + c.pods + " " + c.size);
-        ScriptedProvider* io = nullptr;
-        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
-        io->Expect("*IDN?\n", idn)
-            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", std::string(c.chan) + "\n")
-            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", std::string(c.pods) + "\n")
-            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", std::string(c.size) + "\n");
+        ComPtr<Quorlen731XX> driver;
+        ScriptedProvider* io = ScriptCounts(&driver, c.chan, c.pods, c.size, !c.fails);
         if (!c.fails)  // a timeout ends feature discovery
-            io->Expect("*IDN?\n", idn).ExpectTimeout(":SYST:DATA:VER? \"DISP:LAB\"\n");
+            io->ExpectTimeout(":SYST:DATA:VER? \"DISP:LAB\"\n");
         com::Bstr r("scripted"), o("");
         EXPECT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()),
                   c.fails ? E_IVI_UNEXPECTED_RESPONSE : S_OK);
@@ -228,15 +228,9 @@ TEST(Discovery, HostileCountsEndDiscovery) {
     for (const Case& c : {Case{"65536", "65536", "4"}, Case{"-65536", "65536", "4"},
                           Case{"2", "8", "2147483647"}, Case{"2", "8", "-1"}}) {
         SCOPED_TRACE(std::string(c.pods) + " " + c.size + " " + c.chan);
-        ScriptedProvider* io = nullptr;
-        ComPtr<Quorlen731XX> driver = DriverOnScript(&io);
-        const char* idn = "QUORLEN TECHNOLOGIES,QDS4032A,1,2\n";
-        io->Expect("*IDN?\n", idn)
-            .Expect("SYST:DATA:VAL? \"COUN:CHAN\"\n", "2\n")
-            .Expect("SYST:DATA:VAL? \"COUN:POD\"\n", "2\n")
-            .Expect("SYST:DATA:VAL? \"POD:SIZE\"\n", "8\n")
-            .Expect("*IDN?\n", idn)
-            .Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "0\n")
+        ComPtr<Quorlen731XX> driver;
+        ScriptedProvider* io = ScriptCounts(&driver, "2", "2", "8");
+        io->Expect(":SYST:DATA:VER? \"DISP:LAB\"\n", "0\n")
             .Expect(":SYST:DATA:VER? \"WAV:FEAT\"\n", "0\n")
             .Expect(":SYST:DATA:VAL? \"COUN:POD\"\n", std::string(c.pods) + "\n")
             .Expect(":SYST:DATA:VAL? \"POD:SIZE\"\n", std::string(c.size) + "\n");

@@ -1,11 +1,9 @@
 // Feature discovery and instance lists against the emulator of every family.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-
 #include "Quorlen731XX.h"
 #include "core/root.h"
-#include "emulator/emulator.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
@@ -18,18 +16,11 @@ struct Expect {
     LONG instances, digital_instances;
 };
 
-class FeaturesOnEmulator : public ::testing::TestWithParam<Expect> {
-protected:
-    void SetUp() override { ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1); }
-};
+class FeaturesOnEmulator : public ::testing::TestWithParam<Expect>, protected EmulatedDriver {};
 
 TEST_P(FeaturesOnEmulator, DiscoveryAndCollectionsFollowTheModel) {
     const Expect& e = GetParam();
-    emu::Emulator emu(e.model);
-    std::uint16_t port = emu.Start();
-    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), o("");
-    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK);
+    ASSERT_EQ(Open(e.model), S_OK) << ErrorText();
     const FeatureRecord& f = driver->Core().features;
     EXPECT_EQ(f.analog_channel_count, e.analog);
     EXPECT_EQ(f.digital_channel_count, e.digital);

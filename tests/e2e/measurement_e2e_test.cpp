@@ -11,41 +11,34 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
-#include "emulator/emulator.h"
 #include "io/io_manager.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
 
-class MeasurementOnEmulator : public ::testing::TestWithParam<const char*> {
+class MeasurementOnEmulator : public ::testing::TestWithParam<const char*>,
+                              protected EmulatedDriver {
 protected:
     void SetUp() override {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        emu_ = std::make_unique<emu::Emulator>(GetParam());
-        const std::uint16_t port = emu_->Start();
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), o("");
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK);
+        ASSERT_EQ(Open(GetParam()), S_OK) << ErrorText();
         // Five periods of a 1 kHz, 2 Vpp sine on channel 1 and of a 1 kHz,
         // 4 Vpp square lagging it by 90 degrees on channel 2; channel 1's
         // range keeps its noise small against the sine.
-        ASSERT_EQ(Io(*driver_.get()).InstrWrite(":TIM:RANG 5E-3;:CHAN1:RANG 2.5;:CHAN2:DISP 1;"
+        ASSERT_EQ(Io(*driver.get()).InstrWrite(":TIM:RANG 5E-3;:CHAN1:RANG 2.5;:CHAN2:DISP 1;"
                                                 ":EMUL:INP1 SIN,1E3,2,0;:EMUL:INP2 SQU,1E3,4,90"),
                   S_OK);
     }
     ComPtr<IQuorlen731XXMeasurement> Meas(const std::string& name) {
         ComPtr<IQuorlen731XXMeasurement> m;
         com::Bstr n(name);
-        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver_.get())->get_Item(n.get(), m.Out()),
+        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
                   S_OK);
         return m;
     }
     HRESULT Measure(const std::string& name, Quorlen731XXMeasurementEnum f, double* v) {
         return Meas(name)->FetchWaveformMeasurement(f, v);
     }
-
-    std::unique_ptr<emu::Emulator> emu_;
-    ComPtr<Quorlen731XX> driver_;
 };
 
 TEST_P(MeasurementOnEmulator, SineAndSquareGiveTheirPhysicalValues) {
@@ -80,7 +73,7 @@ TEST_P(MeasurementOnEmulator, SineAndSquareGiveTheirPhysicalValues) {
         EXPECT_NEAR(v, c.expected, c.tolerance);
     }
     // The second falling edge of the sine, and the value a quarter period in.
-    auto* conf = static_cast<IQuorlen731XXConfigurableMeasurement*>(driver_.get());
+    auto* conf = static_cast<IQuorlen731XXConfigurableMeasurement*>(driver.get());
     ASSERT_EQ(conf->put_TimeAtEdgeOccurrence(2), S_OK);
     ASSERT_EQ(conf->put_TimeAtEdgeSlope(Quorlen731XXMeasurementSlopeNegative), S_OK);
     ASSERT_EQ(conf->put_ValueAtTimeTime(0.25e-3), S_OK);
@@ -92,7 +85,7 @@ TEST_P(MeasurementOnEmulator, SineAndSquareGiveTheirPhysicalValues) {
 }
 
 TEST_P(MeasurementOnEmulator, ImpossibleMeasurementsAndHiddenSourcesAreRefused) {
-    CDriverIOManager io(*driver_.get());
+    CDriverIOManager io(*driver.get());
     // A flat input has no edges; a source that is off cannot be measured.
     ASSERT_EQ(io.InstrWrite(":EMUL:INP1 SIN,1E3,0,0"), S_OK);
     double v = 0;
@@ -113,7 +106,7 @@ TEST_P(MeasurementOnEmulator, ImpossibleMeasurementsAndHiddenSourcesAreRefused) 
 }
 
 TEST_P(MeasurementOnEmulator, ReferenceLevelsAndDelayEdgesRoundTrip) {
-    auto* ref = static_cast<IIviScopeReferenceLevel*>(driver_.get());
+    auto* ref = static_cast<IIviScopeReferenceLevel*>(driver.get());
     ASSERT_EQ(ref->Configure(20.0, 45.5, 80.25), S_OK);
     double high = 0, mid = 0, low = 0;
     ASSERT_EQ(ref->get_High(&high), S_OK);
@@ -122,7 +115,7 @@ TEST_P(MeasurementOnEmulator, ReferenceLevelsAndDelayEdgesRoundTrip) {
     EXPECT_EQ(high, 80.25);
     EXPECT_EQ(mid, 45.5);
     EXPECT_EQ(low, 20.0);
-    auto* multi = static_cast<IQuorlen731XXMultiWaveformMeasurement*>(driver_.get());
+    auto* multi = static_cast<IQuorlen731XXMultiWaveformMeasurement*>(driver.get());
     com::Bstr ch2("UserChannel2");
     ASSERT_EQ(multi->ConfigureDelay(ch2.get(), Quorlen731XXMeasurementSlopePositive,
                                     Quorlen731XXMeasurementSlopeNegative, 1, 2),
@@ -144,12 +137,9 @@ TEST_P(MeasurementOnEmulator, ReferenceLevelsAndDelayEdgesRoundTrip) {
 INSTANTIATE_TEST_SUITE_P(Models, MeasurementOnEmulator, ::testing::Values("QMS4034A", "73122D"));
 
 TEST(DigitalOnEmulator, PodsCarryTheirPatternAndChannelsTheirOwnBit) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    emu::Emulator emu("QMS4034A");
-    const std::uint16_t port = emu.Start();
-    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), o("");
-    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK);
+    EmulatedDriver session;
+    ASSERT_EQ(session.Open("QMS4034A"), S_OK) << ErrorText();
+    const ComPtr<Quorlen731XX>& driver = session.driver;
     auto dig = [&](int d) {
         ComPtr<IQuorlen731XXDigitalChannel> c;
         com::Bstr n("UserDigitalChannel" + std::to_string(d));

@@ -8,25 +8,22 @@
 
 #include "Quorlen731XX.h"
 #include "core/root.h"
-#include "emulator/emulator.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
 
 TEST(TraceOnEmulator, EveryCallLeavesAMethodElement) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
     auto dir = std::filesystem::temp_directory_path() / ("qn-trace-" + std::to_string(::getpid()));
     std::filesystem::create_directories(dir);
     const std::string file = (dir / "session.xml").string();
 
-    emu::Emulator emu("QDS2014A");
-    std::uint16_t port = emu.Start();
     {
-        ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET");
-        com::Bstr o("QueryInstrStatus=true,DriverSetup=Trace=true,TraceName=" +
-                    (dir / "session").string() + ",TraceArray=true");
-        ASSERT_EQ(driver->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK);
+        EmulatedDriver session;
+        const std::string options = "QueryInstrStatus=true,DriverSetup=Trace=true,TraceName=" +
+                                    (dir / "session").string() + ",TraceArray=true";
+        ASSERT_EQ(session.Open("QDS2014A", options.c_str()), S_OK);
+        ComPtr<Quorlen731XX>& driver = session.driver;
         LONG code = 0;
         com::Bstr msg;
         ASSERT_EQ(driver->ErrorQuery(&code, msg.Out()), S_OK);

@@ -10,38 +10,24 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
-#include "emulator/emulator.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
 
-std::string ErrorText() {
-    com::ErrorRecord rec;
-    return com::TakeThreadError(&rec) ? rec.description : std::string();
-}
-
-class TriggerOnEmulator : public ::testing::Test {
+class TriggerOnEmulator : public ::testing::Test, protected EmulatedDriver {
 protected:
     void Start(const char* model, const char* options = "QueryInstrStatus=true") {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        emu_ = std::make_unique<emu::Emulator>(model);
-        const std::uint16_t port = emu_->Start();
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), o(options);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_TRUE, VARIANT_TRUE, o.get()), S_OK)
-            << ErrorText();
+        ASSERT_EQ(Open(model, options, true, true), S_OK) << ErrorText();
     }
     ComPtr<IIviScopeMeasurement> Measurement(int channel) {
         ComPtr<IIviScopeMeasurement> m;
         com::Bstr n("Channel" + std::to_string(channel));
-        EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver_.get())->get_Item(n.get(), m.Out()),
+        EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
                   S_OK);
         return m;
     }
-    IQuorlen731XXTrigger* Trig() { return driver_.get(); }
-
-    std::unique_ptr<emu::Emulator> emu_;
-    ComPtr<Quorlen731XX> driver_;
+    IQuorlen731XXTrigger* Trig() { return driver.get(); }
 };
 
 TEST_F(TriggerOnEmulator, EdgeTriggerPutsTheCrossingAtTheTriggerPoint) {
@@ -63,14 +49,14 @@ TEST_F(TriggerOnEmulator, EdgeTriggerPutsTheCrossingAtTheTriggerPoint) {
         SCOPED_TRACE(channel + " at " + std::to_string(c.level));
         ComPtr<IQuorlen731XXChannel> ch;
         com::Bstr name(channel);
-        ASSERT_EQ(static_cast<IQuorlen731XXChannels*>(driver_.get())->get_Item(name.get(), ch.Out()),
+        ASSERT_EQ(static_cast<IQuorlen731XXChannels*>(driver.get())->get_Item(name.get(), ch.Out()),
                   S_OK);
         ASSERT_EQ(ch->put_Enabled(VARIANT_TRUE), S_OK) << ErrorText();
-        ASSERT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver_.get())->put_StartTime(
+        ASSERT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver.get())->put_StartTime(
                       c.position - 5e-4),
                   S_OK)
             << ErrorText();
-        IQuorlen731XXTriggerEdge* edge = driver_.get();
+        IQuorlen731XXTriggerEdge* edge = driver.get();
         ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerEdge), S_OK) << ErrorText();
         ASSERT_EQ(edge->Configure(name.get(), c.level, c.slope), S_OK) << ErrorText();
         ASSERT_EQ(Trig()->put_Modifier(Quorlen731XXTriggerModifierNone), S_OK) << ErrorText();
@@ -106,12 +92,12 @@ TEST_F(TriggerOnEmulator, AnUnreachedLevelLeavesTheAcquisitionPending) {
     // No status checks: their event-status reads would take the completion
     // event that Status waits for.
     Start("QDS4032A", "");
-    IQuorlen731XXTriggerEdge* edge = driver_.get();
+    IQuorlen731XXTriggerEdge* edge = driver.get();
     com::Bstr ch1("UserChannel1");
     ASSERT_EQ(edge->Configure(ch1.get(), 5.0, Quorlen731XXTriggerSlopePositive), S_OK)
         << ErrorText();
     ASSERT_EQ(Trig()->put_Modifier(Quorlen731XXTriggerModifierNone), S_OK);
-    auto* acquisition = static_cast<IQuorlen731XXMeasurements*>(driver_.get());
+    auto* acquisition = static_cast<IQuorlen731XXMeasurements*>(driver.get());
     // The digitize command returns once the acquisition time has passed.
     ASSERT_EQ(acquisition->Initiate(), S_OK) << ErrorText();
     Quorlen731XXAcquisitionStatusEnum status = Quorlen731XXAcqStatusUnknown;
@@ -128,11 +114,11 @@ TEST_F(TriggerOnEmulator, AnUnreachedLevelLeavesTheAcquisitionPending) {
 TEST_F(TriggerOnEmulator, EveryTriggerTypeRoundTripsThroughTheInstrument) {
     Start("QMS4034A");
     com::Bstr ch2("UserChannel2");
-    IQuorlen731XXTriggerGlitch* glitch = driver_.get();
-    IQuorlen731XXTriggerWidth* width = driver_.get();
-    IQuorlen731XXTriggerTv* tv = driver_.get();
-    IQuorlen731XXTriggerState* state = driver_.get();
-    IQuorlen731XXTriggerPattern* pattern = driver_.get();
+    IQuorlen731XXTriggerGlitch* glitch = driver.get();
+    IQuorlen731XXTriggerWidth* width = driver.get();
+    IQuorlen731XXTriggerTv* tv = driver.get();
+    IQuorlen731XXTriggerState* state = driver.get();
+    IQuorlen731XXTriggerPattern* pattern = driver.get();
 
     ASSERT_EQ(Trig()->put_Source(ch2.get()), S_OK) << ErrorText();
     ASSERT_EQ(Trig()->put_Level(-0.125), S_OK) << ErrorText();
@@ -193,7 +179,7 @@ TEST_F(TriggerOnEmulator, EveryTriggerTypeRoundTripsThroughTheInstrument) {
     ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerPattern), S_OK) << ErrorText();
     com::Bstr dig("UserDigitalChannel3");
     ASSERT_EQ(state->put_ClockSource(dig.get()), S_OK) << ErrorText();
-    const auto sent = emu_->ReceivedMessages();
+    const auto sent = emu->ReceivedMessages();
     EXPECT_EQ(sent.end()[-2], ":TRIG:PATT 0,0,DIG3,POS;:TRIG:MODE PATT");  // then *ESR?
 }
 

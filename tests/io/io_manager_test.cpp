@@ -10,39 +10,16 @@
 #include "core/root.h"
 #include "io/io_manager.h"
 #include "services/trace_document.h"
+#include "tests/support/error_text.h"
 #include "tests/support/scripted_driver.h"
 
 namespace qn::test {
 namespace {
 
-// An early-family model: its channel counts and features need no queries,
-// so a session starts with just the two identity queries (instance lists,
-// then identification).
-constexpr const char* kIdn = "QUORLEN TECHNOLOGIES,73141D,SN0001,2.10\n";
-
-class IoManagerTest : public ::testing::Test {
+class IoManagerTest : public ScriptedSessionTest<> {
 protected:
-    void SetUp() override {
-        driver_ = DriverOnScript(&io_);
-        io_->Expect("*IDN?\n", kIdn).Expect("*IDN?\n", kIdn);
-    }
-    void TearDown() override {
-        if (!HasFailure()) {
-            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
-        }
-    }
-    void Open(const char* options = "") {
-        com::Bstr r("scripted"), o(options);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    }
+    void Open(const char* options = "") { ScriptedSessionTest::Open("73141D", options); }
     CDriverIOManager Io() { return qn::Io(*driver_.get()); }
-    static std::string ErrorText() {
-        com::ErrorRecord rec;
-        return com::TakeThreadError(&rec) ? rec.description : std::string();
-    }
-
-    ComPtr<Quorlen731XX> driver_;
-    ScriptedProvider* io_ = nullptr;
 };
 
 TEST_F(IoManagerTest, InitializeIdentifiesTheInstrument) {
@@ -58,7 +35,6 @@ TEST_F(IoManagerTest, InitializeIdentifiesTheInstrument) {
 }
 
 TEST_F(IoManagerTest, StatusCheckFailsOnErrorBitsOnly) {
-    io_->AnswerStatusWith("+0");
     Open("QueryInstrStatus=true");
     const std::pair<const char*, HRESULT> cases[] = {
         {"+4", E_IVI_INSTRUMENT_STATUS}, {"32", E_IVI_INSTRUMENT_STATUS},
@@ -113,7 +89,6 @@ TEST_F(IoManagerTest, NumericRepliesConvertByType) {
 }
 
 TEST_F(IoManagerTest, TimeoutIsReportedAndTheSessionTimeoutRestored) {
-    io_->AnswerStatusWith("+0");
     Open("QueryInstrStatus=true");
     io_->ExpectTimeout("*IDN?\n");
     std::string reply;
@@ -244,7 +219,6 @@ TEST_F(IoManagerTest, CommandStackQueriesDeliverTheReplyWhenTheStatusCheckFails)
 }
 
 TEST_F(IoManagerTest, ErrorQueryParsesTheReplyWithoutCheckingStatus) {
-    io_->AnswerStatusWith("+0");
     Open("QueryInstrStatus=true");
     const std::size_t before = io_->Written().size();
     io_->Expect("SYST:ERR?\n", "+0,\"No error\"\n")

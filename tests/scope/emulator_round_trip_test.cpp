@@ -9,9 +9,9 @@
 #include <cmath>
 #include <vector>
 
-#include "emulator/emulator.h"
 #include "tests/scope/property_rows.h"
 #include "tests/scope/scope_fixture.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
@@ -36,34 +36,24 @@ void RunTrips(const std::vector<RoundTrip>& trips) {
     }
 }
 
-class ScopeOnEmulator : public ::testing::TestWithParam<const char*> {
+class ScopeOnEmulator : public ::testing::TestWithParam<const char*>, protected EmulatedDriver {
 protected:
     void SetUp() override {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        emu_ = std::make_unique<emu::Emulator>(GetParam());
-        const std::uint16_t port = emu_->Start();
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET");
-        com::Bstr o("QueryInstrStatus=true");
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_TRUE, VARIANT_TRUE, o.get()), S_OK)
-            << ErrorText();
+        ASSERT_EQ(Open(GetParam(), "QueryInstrStatus=true", true, true), S_OK) << ErrorText();
     }
     void TearDown() override {
-        if (driver_) {
-            EXPECT_EQ(driver_->Close(), S_OK);
+        if (driver) {
+            EXPECT_EQ(driver->Close(), S_OK);
         }
     }
-    const FeatureRecord& Features() { return driver_->Core().features; }
+    const FeatureRecord& Features() { return driver->Core().features; }
     // The first entry of the instrument's error queue.
     LONG NextError() {
         LONG code = 0;
         com::Bstr text;
-        EXPECT_EQ(driver_->ErrorQuery(&code, text.Out()), S_OK);
+        EXPECT_EQ(driver->ErrorQuery(&code, text.Out()), S_OK);
         return code;
     }
-
-    std::unique_ptr<emu::Emulator> emu_;
-    ComPtr<Quorlen731XX> driver_;
 };
 
 TEST_P(ScopeOnEmulator, ChannelPropertiesRoundTrip) {
@@ -73,9 +63,9 @@ TEST_P(ScopeOnEmulator, ChannelPropertiesRoundTrip) {
     ASSERT_GE(f.analog_channel_count, 2);
     for (int n = 1; n <= f.analog_channel_count; ++n) {
         SCOPED_TRACE("channel " + std::to_string(n));
-        auto user = ChannelNamed<IQuorlen731XXChannels, U>(*driver_.get(),
+        auto user = ChannelNamed<IQuorlen731XXChannels, U>(*driver.get(),
                                                            ("UserChannel" + std::to_string(n)).c_str());
-        auto ivi = ChannelNamed<IIviScopeChannels, C>(*driver_.get(),
+        auto ivi = ChannelNamed<IIviScopeChannels, C>(*driver.get(),
                                                       ("Channel" + std::to_string(n)).c_str());
         U* u = user.get();
         C* c = ivi.get();
@@ -128,8 +118,8 @@ TEST_P(ScopeOnEmulator, ChannelPropertiesRoundTrip) {
 TEST_P(ScopeOnEmulator, AcquisitionPropertiesRoundTrip) {
     using A = IQuorlen731XXAcquisition;
     using C = IIviScopeAcquisition;
-    A* a = driver_.get();
-    C* c = driver_.get();
+    A* a = driver.get();
+    C* c = driver.get();
     RunTrips({
         Trip(Row("TimePerRecord", a, &A::get_TimePerRecord, &A::put_TimePerRecord, 0, 2.3456789012345678e-3)),
         Trip(Row("TimePerRecord", c, &C::get_TimePerRecord, &C::put_TimePerRecord, 0, 4e-3)),
@@ -160,10 +150,10 @@ TEST_P(ScopeOnEmulator, AcquisitionPropertiesRoundTrip) {
 }
 
 TEST_P(ScopeOnEmulator, RefusedValuesFailWithTheInstrumentsError) {
-    auto user = ChannelNamed<IQuorlen731XXChannels, IQuorlen731XXChannel>(*driver_.get(), "UserChannel2");
+    auto user = ChannelNamed<IQuorlen731XXChannels, IQuorlen731XXChannel>(*driver.get(), "UserChannel2");
     EXPECT_EQ(user->put_Range(1000.0), E_IVI_INSTRUMENT_STATUS);
     EXPECT_EQ(NextError(), -222);
-    EXPECT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver_.get())->put_NumberOfAverages(0),
+    EXPECT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver.get())->put_NumberOfAverages(0),
               E_IVI_INSTRUMENT_STATUS);
     EXPECT_EQ(NextError(), -222);
     // What the model lacks is refused by the driver before anything is sent.
@@ -175,11 +165,11 @@ TEST_P(ScopeOnEmulator, RefusedValuesFailWithTheInstrumentsError) {
     // With no source displayed there is nothing to take points from.
     for (int n = 1; n <= f.analog_channel_count; ++n) {
         auto ch = ChannelNamed<IIviScopeChannels, IIviScopeChannel>(
-            *driver_.get(), ("Channel" + std::to_string(n)).c_str());
+            *driver.get(), ("Channel" + std::to_string(n)).c_str());
         ASSERT_EQ(ch->put_Enabled(VARIANT_FALSE), S_OK);
     }
     LONG points = 0;
-    EXPECT_EQ(static_cast<IIviScopeAcquisition*>(driver_.get())->get_RecordLength(&points),
+    EXPECT_EQ(static_cast<IIviScopeAcquisition*>(driver.get())->get_RecordLength(&points),
               E_IVISCOPE_CHANNEL_NOT_ENABLED);
 }
 

@@ -10,6 +10,7 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
+#include "tests/support/error_text.h"
 #include "tests/support/scripted_driver.h"
 
 namespace qn::test {
@@ -24,27 +25,8 @@ ComPtr<Itf> ChannelNamed(Quorlen731XX& driver, const char* name) {
     return channel;
 }
 
-inline std::string ErrorText() {
-    com::ErrorRecord rec;
-    return com::TakeThreadError(&rec) ? rec.description : std::string();
-}
-
-class ScriptedScopeTest : public ::testing::Test {
+class ScriptedScopeTest : public ScriptedSessionTest<> {
 protected:
-    void SetUp() override { ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1); }
-    void TearDown() override {
-        if (io_ && !HasFailure()) {
-            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
-        }
-    }
-    // Opens a session on `model` (7312X or 7314X).
-    void Open(const std::string& model) {
-        driver_ = DriverOnScript(&io_);
-        const std::string idn = "QUORLEN TECHNOLOGIES," + model + ",SN0001,2.10\n";
-        io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
-        com::Bstr r("scripted"), o("");
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    }
     IQuorlen731XXAcquisition* Acq() { return driver_.get(); }
     IIviScopeAcquisition* IviAcq() { return driver_.get(); }
     ComPtr<IQuorlen731XXChannel> User(int n) {
@@ -55,15 +37,11 @@ protected:
         return ChannelNamed<IIviScopeChannels, IIviScopeChannel>(
             *driver_.get(), ("Channel" + std::to_string(n)).c_str());
     }
-    FeatureRecord& Features() { return driver_->Core().features; }
     // Scripts the current waveform source being displayed.
     void ExpectSourceDisplayed(const char* source = "CHAN1") {
         io_->Expect(":WAV:SOUR?\n", std::string(source) + "\n")
             .Expect(":STAT? " + std::string(source) + "\n", "1\n");
     }
-
-    ComPtr<Quorlen731XX> driver_;
-    ScriptedProvider* io_ = nullptr;
 };
 
 }  // namespace qn::test

@@ -8,7 +8,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "scope/waveform_transfer.h"
-#include "tests/support/scripted_driver.h"
+#include "tests/scope/scope_fixture.h"
 
 namespace qn::test {
 namespace {
@@ -47,31 +47,10 @@ protected:
     }
 };
 
-class StatusTraffic : public ::testing::Test {
+class StatusTraffic : public ScriptedSessionTest<StatusProvider> {
 protected:
-    void Open(const char* model, const char* options = "") {
-        driver_ = DriverOnScript(&io_);
-        const std::string idn = std::string("QUORLEN TECHNOLOGIES,") + model + ",SN1,1.0\n";
-        io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
-        if (std::string_view(options).find("QueryInstrStatus") != std::string_view::npos)
-            io_->AnswerStatusWith("+0");
-        com::Bstr r("scripted"), o(options);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    }
-    void TearDown() override {
-        if (!HasFailure() && io_) {
-            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
-        }
-    }
     IQuorlen731XXStatus* Status() { return driver_.get(); }
     IQuorlen731XXMeasurements* Measurements() { return driver_.get(); }
-    static std::string ErrorText() {
-        com::ErrorRecord rec;
-        return com::TakeThreadError(&rec) ? rec.description : std::string();
-    }
-
-    ComPtr<Quorlen731XX> driver_;
-    StatusProvider* io_ = nullptr;
 };
 
 // 73141D has channel protection, 73121D has not; neither has the digitize

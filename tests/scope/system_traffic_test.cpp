@@ -31,21 +31,9 @@ protected:
     }
 };
 
-class SystemTraffic : public ::testing::Test {
+class SystemTraffic : public ScriptedSessionTest<TimeoutProvider> {
 protected:
-    void SetUp() override { Open(""); }
-    void TearDown() override {
-        if (!HasFailure() && io_) {
-            EXPECT_TRUE(io_->Done()) << "scripted messages were not sent";
-        }
-    }
-    void Open(const char* options) {
-        driver_ = DriverOnScript(&io_);
-        const std::string idn = "QUORLEN TECHNOLOGIES,73141D,SN1,1.0\n";
-        io_->Expect("*IDN?\n", idn).Expect("*IDN?\n", idn);
-        com::Bstr r("scripted"), o(options);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    }
+    void SetUp() override { Open("73141D"); }
 public:
     IQuorlen731XXSystem* System() { return driver_.get(); }
     IQuorlen731XXCursors* Cursors() { return driver_.get(); }
@@ -66,9 +54,6 @@ protected:
         com::SafeArray owned(a);
         return std::string(owned.data<char>(), owned.size());
     }
-
-    ComPtr<Quorlen731XX> driver_;
-    TimeoutProvider* io_ = nullptr;
 };
 
 // One member call and the traffic it makes.

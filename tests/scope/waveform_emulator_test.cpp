@@ -10,9 +10,9 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
-#include "emulator/emulator.h"
 #include "io/io_manager.h"
 #include "scope/waveform_transfer.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
@@ -32,22 +32,16 @@ std::vector<double> Values(SAFEARRAY* a) {
     return std::vector<double>(owner.data<double>(), owner.data<double>() + owner.size());
 }
 
-class WaveformOnEmulator : public ::testing::Test {
+class WaveformOnEmulator : public ::testing::Test, protected EmulatedDriver {
 protected:
     void Start(const char* model, const char* options = "") {
-        ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-        emu_ = std::make_unique<emu::Emulator>(model);
-        const std::uint16_t port = emu_->Start();
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET"), o(options);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_TRUE, VARIANT_FALSE, o.get()), S_OK)
-            << ErrorText();
+        ASSERT_EQ(Open(model, options), S_OK) << ErrorText();
     }
-    CDriverIOManager Io() { return qn::Io(*driver_.get()); }
+    CDriverIOManager Io() { return qn::Io(*driver.get()); }
     ComPtr<IQuorlen731XXMeasurement> Measurement(const char* name) {
         ComPtr<IQuorlen731XXMeasurement> m;
         com::Bstr n(name);
-        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver_.get())->get_Item(n.get(), m.Out()),
+        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
                   S_OK);
         return m;
     }
@@ -64,18 +58,14 @@ protected:
     std::vector<std::string> Received() {
         std::string idn;
         EXPECT_EQ(Io().InstrQuery("*IDN?", &idn, 256), S_OK);
-        auto all = emu_->ReceivedMessages();
+        auto all = emu->ReceivedMessages();
         all.pop_back();
         return all;
-    }
-    static std::string ErrorText() {
-        com::ErrorRecord rec;
-        return com::TakeThreadError(&rec) ? rec.description : std::string();
     }
     // The session is as it was before the transfer: status check, termination
     // character and timeout.
     void ExpectRestored(LONG timeout) {
-        EXPECT_TRUE(driver_->Core().session.flags.query_instrument_status);
+        EXPECT_TRUE(driver->Core().session.flags.query_instrument_status);
         bool term = false;
         EXPECT_EQ(Io().GetTerminationCharacterEnabled(&term), S_OK);
         EXPECT_TRUE(term);
@@ -83,15 +73,12 @@ protected:
         EXPECT_EQ(Io().GetIOTimeout(&t), S_OK);
         EXPECT_EQ(t, timeout);
     }
-
-    std::unique_ptr<emu::Emulator> emu_;
-    ComPtr<Quorlen731XX> driver_;
 };
 
 TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
     Start("QDS4032A");
     ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:DIG"), S_OK);
-    emu_->ServeWaveformData(WordBlock({0, 8000, -32768, -8000}));
+    emu->ServeWaveformData(WordBlock({0, 8000, -32768, -8000}));
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel1", &v), S_IVISCOPE_INVALID_WFM_ELEMENT) << ErrorText();
     EXPECT_NE(ErrorText().find("At least one element in the retrieved waveform was invalid."),
@@ -101,12 +88,12 @@ TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
     EXPECT_EQ(v[1], 1.0);
     EXPECT_EQ(v[3], -1.0);
     VARIANT_BOOL invalid = VARIANT_FALSE;
-    auto* coll = static_cast<IIviScopeMeasurements*>(driver_.get());
+    auto* coll = static_cast<IIviScopeMeasurements*>(driver.get());
     EXPECT_EQ(coll->IsWaveformElementInvalid(v[2], &invalid), S_OK);
     EXPECT_EQ(invalid, VARIANT_TRUE);
     EXPECT_EQ(coll->IsWaveformElementInvalid(v[1], &invalid), S_OK);
     EXPECT_EQ(invalid, VARIANT_FALSE);
-    const auto sent = emu_->ReceivedMessages();
+    const auto sent = emu->ReceivedMessages();
     const std::vector<std::string> tail(sent.end() - 6, sent.end());
     EXPECT_EQ(tail, (std::vector<std::string>{":STAT? CHAN1", ":WAV:SOUR CHAN1",
                                               ":WAV:FORM WORD;UNS 0;BYT MSBF", ":WAV:PRE?",
@@ -117,7 +104,7 @@ TEST_F(WaveformOnEmulator, ReadDigitizesAndBothMeasurementKindsAgree) {
     Start("QDS4032A");
     ComPtr<IIviScopeMeasurement> cc;
     com::Bstr n("Channel1");
-    ASSERT_EQ(static_cast<IIviScopeMeasurements*>(driver_.get())->get_Item(n.get(), cc.Out()), S_OK);
+    ASSERT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(n.get(), cc.Out()), S_OK);
     SAFEARRAY* a = nullptr;
     double x0 = 0, dx = 0;
     ASSERT_EQ(cc->ReadWaveform(5000, &a, &x0, &dx), S_OK) << ErrorText();
@@ -127,7 +114,7 @@ TEST_F(WaveformOnEmulator, ReadDigitizesAndBothMeasurementKindsAgree) {
     std::vector<double> fetched;
     ASSERT_EQ(Fetch("UserChannel1", &fetched), S_OK);
     EXPECT_EQ(fetched, read);  // same record: no new acquisition in between
-    const auto sent = emu_->ReceivedMessages();
+    const auto sent = emu->ReceivedMessages();
     EXPECT_NE(std::find(sent.begin(), sent.end(), ":DIG"), sent.end());
     EXPECT_NE(std::find(sent.begin(), sent.end(), ":WAV:YREF?"), sent.end());
 }
@@ -137,7 +124,7 @@ TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:ACQ:TYPE PEAK;:DIG"), S_OK);
     std::vector<std::int16_t> raw(2001);
     for (std::size_t i = 0; i < raw.size(); ++i) raw[i] = static_cast<std::int16_t>(i);
-    emu_->ServeWaveformData(WordBlock(raw));
+    emu->ServeWaveformData(WordBlock(raw));
     SAFEARRAY *lo = nullptr, *hi = nullptr;
     double x0 = 0, dx = 0;
     auto m = Measurement("Channel1");
@@ -163,17 +150,17 @@ TEST_F(WaveformOnEmulator, HiddenSourceIsRefusedAndDigitalChannelsReadTheirBit) 
     ASSERT_EQ(Io().InstrWrite(":CHAN2:DISP 0;:POD2:DISP 1;:DIG"), S_OK);
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel2", &v), E_IVISCOPE_CHANNEL_NOT_ENABLED);
-    emu_->ServeWaveformData(std::string("#13\x04\x00\xFB", 6));
+    emu->ServeWaveformData(std::string("#13\x04\x00\xFB", 6));
     ASSERT_EQ(Fetch("UserDigitalChannel10", &v), S_OK) << ErrorText();
     EXPECT_EQ(v, (std::vector<double>{1, 0, 0}));
-    const auto sent = emu_->ReceivedMessages();
+    const auto sent = emu->ReceivedMessages();
     EXPECT_NE(std::find(sent.begin(), sent.end(), ":WAV:SOUR POD2"), sent.end());
     EXPECT_NE(std::find(sent.begin(), sent.end(), ":WAV:FORM BYTE;UNS 1"), sent.end());
 }
 
 TEST_F(WaveformOnEmulator, InitiateWithDigitizeCompletesThroughStatus) {
     Start("QDS4032A");
-    auto* coll = static_cast<IQuorlen731XXMeasurements*>(driver_.get());
+    auto* coll = static_cast<IQuorlen731XXMeasurements*>(driver.get());
     ASSERT_EQ(Io().InstrWrite("*ESE 36"), S_OK);
     ASSERT_EQ(coll->Initiate(), S_OK) << ErrorText();
     Quorlen731XXAcquisitionStatusEnum s = Quorlen731XXAcqInProgress;
@@ -182,7 +169,7 @@ TEST_F(WaveformOnEmulator, InitiateWithDigitizeCompletesThroughStatus) {
         if (s != Quorlen731XXAcqComplete) std::this_thread::sleep_for(std::chrono::milliseconds(10));
     }
     EXPECT_EQ(s, Quorlen731XXAcqComplete);
-    EXPECT_FALSE(driver_->Core().acquisition_control.pending);
+    EXPECT_FALSE(driver->Core().acquisition_control.pending);
     LONG ese = 0;
     EXPECT_EQ(Io().InstrQuery("*ESE?", &ese), S_OK);
     EXPECT_EQ(ese, 36);
@@ -192,10 +179,10 @@ TEST_F(WaveformOnEmulator, InitiateWithDigitizeCompletesThroughStatus) {
 
 TEST_F(WaveformOnEmulator, InitiateWithoutDigitizeStartsASingleAcquisition) {
     Start("73141D");
-    auto* coll = static_cast<IQuorlen731XXMeasurements*>(driver_.get());
+    auto* coll = static_cast<IQuorlen731XXMeasurements*>(driver.get());
     ASSERT_EQ(coll->Initiate(), S_OK) << ErrorText();
     EXPECT_EQ(Received().back(), ":SING");
-    EXPECT_FALSE(driver_->Core().acquisition_control.pending);
+    EXPECT_FALSE(driver->Core().acquisition_control.pending);
     Quorlen731XXAcquisitionStatusEnum s = Quorlen731XXAcqStatusUnknown;
     EXPECT_EQ(coll->Status(&s), S_OK);
     EXPECT_NE(s, Quorlen731XXAcqStatusUnknown);
@@ -281,12 +268,12 @@ TEST_F(WaveformOnEmulator, OutputArrayIsReusedFilledInPlaceOrReplaced) {
     EXPECT_EQ(v.size(), 1000u);
 
     // The block's memory stays with the session until Close.
-    const ReceiveBuffer& buffer = driver_->Core().io->Receive();
+    const ReceiveBuffer& buffer = driver->Core().io->Receive();
     const BYTE* kept = buffer.data();
     EXPECT_GE(buffer.capacity(), 2000u);
     EXPECT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
     EXPECT_EQ(buffer.data(), kept);
-    EXPECT_EQ(driver_->Close(), S_OK);
+    EXPECT_EQ(driver->Close(), S_OK);
     EXPECT_EQ(buffer.capacity(), 0u);
 }
 
@@ -311,13 +298,13 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
-        emu_->ServeWaveformData(c.block);
+        emu->ServeWaveformData(c.block);
         std::vector<double> v;
         const auto start = std::chrono::steady_clock::now();
         EXPECT_EQ(Fetch("Channel1", &v), c.expected) << ErrorText();
         EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
         ExpectRestored(300);
-        emu_->ClearWaveformData();
+        emu->ClearWaveformData();
         ASSERT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
         EXPECT_EQ(v.size(), 1000u);
     }
@@ -326,7 +313,7 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
     auto m = Measurement("Channel1");
     for (LONG max_time : {200, 4000}) {
         SCOPED_TRACE(max_time);
-        if (max_time == 200) emu_->ServeWaveformData("#42000" + payload);
+        if (max_time == 200) emu->ServeWaveformData("#42000" + payload);
         SAFEARRAY* a = nullptr;
         double x0 = 0, dx = 0;
         EXPECT_EQ(m->ReadWaveform(Quorlen731XXTimeOutEnum(max_time), &a, &x0, &dx),
@@ -335,15 +322,15 @@ TEST_F(WaveformOnEmulator, BadBlocksFailCleanlyAndTheSessionRecovers) {
             EXPECT_EQ(Values(a).size(), 1000u);
         }
         ExpectRestored(300);
-        emu_->ClearWaveformData();
+        emu->ClearWaveformData();
     }
     // A block longer than it declares: the declared part is the record and
     // the rest of the message is discarded.
-    emu_->ServeWaveformData(WordBlock({1, 2}) + "extra bytes");
+    emu->ServeWaveformData(WordBlock({1, 2}) + "extra bytes");
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
     EXPECT_EQ(v.size(), 2u);
-    emu_->ClearWaveformData();
+    emu->ClearWaveformData();
     ASSERT_EQ(Fetch("Channel1", &v), S_OK) << ErrorText();
     EXPECT_EQ(v.size(), 1000u);
 }
@@ -353,15 +340,15 @@ TEST_F(WaveformOnEmulator, MissingReplyAndDroppedLinkDuringTheDataRead) {
     ASSERT_EQ(Io().InstrWrite(":DIG;:WAV:SOUR CHAN1"), S_OK);
     ASSERT_EQ(Io().SetIOTimeout(300), S_OK);
     RawWaveform data;
-    emu_->SuppressReplies(1);
-    EXPECT_EQ(ReadWaveformData(*driver_.get(), 2, &data), E_QUORLEN731XX_IO_TIMEOUT);
+    emu->SuppressReplies(1);
+    EXPECT_EQ(ReadWaveformData(*driver.get(), 2, &data), E_QUORLEN731XX_IO_TIMEOUT);
     ExpectRestored(300);
-    ASSERT_EQ(ReadWaveformData(*driver_.get(), 2, &data), S_OK) << ErrorText();
+    ASSERT_EQ(ReadWaveformData(*driver.get(), 2, &data), S_OK) << ErrorText();
     EXPECT_EQ(data.count, 1000u);
 
-    emu_->DropConnectionOnNextQuery();
-    EXPECT_TRUE(FAILED(ReadWaveformData(*driver_.get(), 2, &data)));
-    EXPECT_TRUE(driver_->Core().session.flags.query_instrument_status);
+    emu->DropConnectionOnNextQuery();
+    EXPECT_TRUE(FAILED(ReadWaveformData(*driver.get(), 2, &data)));
+    EXPECT_TRUE(driver->Core().session.flags.query_instrument_status);
 }
 
 }  // namespace
