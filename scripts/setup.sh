@@ -4,7 +4,7 @@ set -euo pipefail
 packages=(
   build-essential cmake ninja-build pkg-config clang ccache dpkg-dev file
   libgtest-dev libgmock-dev libbenchmark-dev
-  libpugixml-dev libtirpc-dev rpcsvc-proto
+  libpugixml-dev libtirpc-dev rpcsvc-proto libcli11-dev nlohmann-json3-dev
   python3 python3-pyvisa python3-pyvisa-py lxi-tools
   python3-numpy python3-pytest python3-matplotlib python3-venv python3-pip python3-setuptools
 )

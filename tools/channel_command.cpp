@@ -1,7 +1,6 @@
 // qn731xx channel N [--range V ...]: writes the given settings of analog
 // channel N and prints the channel's settings as the instrument reports them.
 #include <cstdio>
-#include <cstdlib>
 #include <string>
 
 #include "tools/commands.h"
@@ -56,56 +55,26 @@ constexpr Setting<Ch> kChannelSettings[] = {
      Read<Ch, Quorlen731XXChannelProtectionEnum, &Ch::get_Protection>, nullptr},
 };
 
-int Usage(const SettingTable<Ch>& table, const std::string& error) {
-    std::fprintf(stderr, "qn731xx channel: %s\nusage: qn731xx channel N [options]\n%s",
-                 error.c_str(), table.Help().c_str());
-    return 2;
-}
-
-// The channel number from the one positional word, 1 when there is none.
-bool ChannelNumber(const CliArgs& args, long* n) {
-    if (args.Positionals().size() > 1) return false;
-    *n = 1;
-    if (args.Positionals().empty()) return true;
-    const std::string& word = args.Positionals().front();
-    char* end = nullptr;
-    *n = std::strtol(word.c_str(), &end, 10);
-    return !word.empty() && *end == '\0' && *n >= 1 && *n <= 64;
+HRESULT FindChannel(Quorlen731XX* driver, long n, ComPtr<Ch>* channel, std::string* what) {
+    *what = "channel " + std::to_string(n);
+    com::Bstr item("UserChannel" + std::to_string(n));
+    return static_cast<IQuorlen731XXChannels*>(driver)->get_Item(item.get(), channel->Out());
 }
 
 }  // namespace
 
 int ChannelCommand(std::span<char*> argv) {
+    SessionOptions options;
+    auto app = CommandApp("channel", "Set and print the settings of analog channel N.", &options);
+    long n = 1;
+    app->add_option("N", n, "analog channel number")->check(CLI::Range(1, 64))->capture_default_str();
     SettingTable<Ch> table(kChannelSettings);
-    if (WantsHelp(argv)) {
-        std::printf("usage: qn731xx channel N [options]\n%s", table.Help().c_str());
-        return 0;
-    }
-    const std::vector<OptionSpec> options = table.Options();
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(options, argv, &error)) return Usage(table, error);
-    long n = 0;
-    if (!ChannelNumber(args, &n)) return Usage(table, "expected one channel number from 1");
-    if (!table.ParseRequests(args, &error)) return Usage(table, error);
-
-    ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    const std::string name = "UserChannel" + std::to_string(n);
-    ComPtr<Ch> channel;
-    com::Bstr item(name);
-    hr = static_cast<IQuorlen731XXChannels*>(session.driver.get())->get_Item(item.get(),
-                                                                            channel.Out());
-    if (FAILED(hr)) return ReportFailure(("channel " + std::to_string(n)).c_str(), hr);
-    std::string failed;
-    hr = table.Apply(channel.get(), &failed);
-    if (FAILED(hr)) return ReportFailure(failed.c_str(), hr);
-    PrintReadings("Channel " + std::to_string(n), table.ReadAll(channel.get()), args.Has("json"),
-                  "channel", n);
-    hr = session.driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
-    return 0;
+    table.AddOptions(*app);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    auto target = [n](Quorlen731XX* d, ComPtr<Ch>* ch, std::string* what) {
+        return FindChannel(d, n, ch, what);
+    };
+    return RunSettings(table, options, target, "Channel " + std::to_string(n), "channel", n);
 }
 
 }  // namespace qn::tools

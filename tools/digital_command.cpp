@@ -2,7 +2,6 @@
 // writes the given settings of digital channel D (from 0) and prints the
 // channel's settings as the instrument reports them.
 #include <cstdio>
-#include <cstdlib>
 #include <string>
 
 #include "tools/commands.h"
@@ -24,50 +23,25 @@ constexpr Setting<Dig> kDigitalSettings[] = {
      Read<Dig, double, &Dig::get_Threshold>, Write<Dig, double, &Dig::put_Threshold>},
 };
 
-int Usage(const SettingTable<Dig>& table, const std::string& error) {
-    std::fprintf(stderr, "qn731xx digital: %s\nusage: qn731xx digital --channel D [options]\n%s",
-                 error.c_str(), table.Help().c_str());
-    return 2;
-}
-
 }  // namespace
 
 int DigitalCommand(std::span<char*> argv) {
+    SessionOptions options;
+    auto app = CommandApp("digital", "Set and print the settings of digital channel D.", &options);
+    long d = 0;
+    app->add_option("--channel", d, "digital channel number from 0")
+        ->check(CLI::Range(0, 1023))
+        ->capture_default_str();
     SettingTable<Dig> table(kDigitalSettings);
-    if (WantsHelp(argv)) {
-        std::printf("usage: qn731xx digital --channel D [options]\n  --channel D  digital "
-                    "channel number from 0\n%s",
-                    table.Help().c_str());
-        return 0;
-    }
-    std::vector<OptionSpec> options = table.Options();
-    options.push_back({"channel", true, "digital channel number from 0"});
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(options, argv, &error)) return Usage(table, error);
-    const std::string text = args.Value("channel").value_or("0");
-    char* end = nullptr;
-    const long d = std::strtol(text.c_str(), &end, 10);
-    if (*end != '\0' || d < 0 || d > 1023 || !args.Positionals().empty())
-        return Usage(table, "--channel takes a digital channel number from 0");
-    if (!table.ParseRequests(args, &error)) return Usage(table, error);
-
-    ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    ComPtr<Dig> channel;
-    com::Bstr item("UserDigitalChannel" + std::to_string(d));
-    hr = static_cast<IQuorlen731XXDigitalChannels*>(session.driver.get())
-             ->get_Item(item.get(), channel.Out());
-    if (FAILED(hr)) return ReportFailure(("digital channel " + std::to_string(d)).c_str(), hr);
-    std::string failed;
-    hr = table.Apply(channel.get(), &failed);
-    if (FAILED(hr)) return ReportFailure(failed.c_str(), hr);
-    PrintReadings("Digital channel " + std::to_string(d), table.ReadAll(channel.get()),
-                  args.Has("json"), "channel", d);
-    hr = session.driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
-    return 0;
+    table.AddOptions(*app);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    auto target = [d](Quorlen731XX* driver, ComPtr<Dig>* ch, std::string* what) {
+        *what = "digital channel " + std::to_string(d);
+        com::Bstr item("UserDigitalChannel" + std::to_string(d));
+        return static_cast<IQuorlen731XXDigitalChannels*>(driver)->get_Item(item.get(), ch->Out());
+    };
+    return RunSettings(table, options, target, "Digital channel " + std::to_string(d), "channel",
+                       d);
 }
 
 }  // namespace qn::tools

@@ -9,7 +9,7 @@
 #include "core/inherent.h"
 #include "core/session_core.h"
 #include "tools/commands.h"
-#include "tools/json.h"
+#include "tools/json_output.h"
 #include "tools/session_util.h"
 
 namespace qn::tools {
@@ -171,77 +171,53 @@ void PrintText(const SessionCore& core, const Info& info) {
     PrintTable("DriverSetup options", s.driver_setup_options);
 }
 
-void PrintJson(const SessionCore& core, const Info& info) {
+void PrintJsonInfo(const SessionCore& core, const Info& info) {
     const DriverSession& s = core.session;
-    JsonWriter j;
-    j.BeginObject();
-    j.Field("model", info.model);
-    j.Field("manufacturer", info.manufacturer);
-    j.Field("firmware_revision", info.firmware);
-    j.Field("io_resource_descriptor", s.io_resource_descriptor);
-    j.Field("logical_name", s.logical_name);
-    j.Field("driver_setup", s.driver_setup);
-    for (const FlagRow& f : kFlags) j.Field(f.json, s.flags.*f.flag);
-    j.Key("features");
-    j.BeginObject();
+    Json j = {{"model", info.model},
+              {"manufacturer", info.manufacturer},
+              {"firmware_revision", info.firmware},
+              {"io_resource_descriptor", s.io_resource_descriptor},
+              {"logical_name", s.logical_name},
+              {"driver_setup", s.driver_setup}};
+    for (const FlagRow& f : kFlags) j[f.json] = s.flags.*f.flag;
+    Json& features = j["features"] = Json::object();
     for (const FeatureRow& r : kFeatures) {
-        if (r.flag) j.Field(r.json, core.features.*r.flag);
-        else if (r.count) j.Field(r.json, static_cast<long>(core.features.*r.count));
-        else j.Field(r.json, core.features.*r.real);
+        if (r.flag) features[r.json] = core.features.*r.flag;
+        else if (r.count) features[r.json] = core.features.*r.count;
+        else features[r.json] = core.features.*r.real;
     }
-    j.EndObject();
-    j.Key("driver");
-    j.BeginObject();
-    j.Field("description", info.description);
-    j.Field("identifier", info.identifier);
-    j.Field("revision", info.revision);
-    j.Field("vendor", info.vendor);
-    j.Field("group_capabilities", info.group_capabilities);
-    j.EndObject();
-    j.Key("supported_models");
-    j.StringList(info.supported_models);
-    j.Key("collections");
-    j.BeginObject();
-    for (const auto& [name, items] : info.collections) {
-        j.Key(name);
-        j.StringList(items);
-    }
-    j.EndObject();
-    j.Key("error_query");
-    j.BeginObject();
-    j.Field("code", static_cast<long>(info.error_code));
-    j.Field("message", info.error_message);
-    j.EndObject();
-    j.Key("init_options");
-    j.StringMap(s.init_options);
-    j.Key("driver_setup_options");
-    j.StringMap(s.driver_setup_options);
-    j.EndObject();
-    std::printf("%s\n", j.str().c_str());
+    j["driver"] = {{"description", info.description},
+                   {"identifier", info.identifier},
+                   {"revision", info.revision},
+                   {"vendor", info.vendor},
+                   {"group_capabilities", info.group_capabilities}};
+    j["supported_models"] = info.supported_models;
+    Json& collections = j["collections"] = Json::object();
+    for (const auto& [name, items] : info.collections) collections[name] = items;
+    j["error_query"] = {{"code", info.error_code}, {"message", info.error_message}};
+    j["init_options"] = s.init_options;
+    j["driver_setup_options"] = s.driver_setup_options;
+    PrintJson(j);
 }
 
 }  // namespace
 
 int InfoCommand(std::span<char*> argv) {
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(kSessionOptions, argv, &error)) {
-        std::fprintf(stderr, "qn731xx info: %s\n%s", error.c_str(),
-                     OptionHelp(kSessionOptions).c_str());
-        return 2;
-    }
+    SessionOptions options;
+    auto app = CommandApp(
+        "info", "Open a session and print its flags, the instrument identity and the option tables.",
+        &options);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     Quorlen731XX* driver = session.driver.get();
     Info info = Gather(driver);
-    if (args.Has("json"))
-        PrintJson(driver->Core(), info);
+    if (options.json)
+        PrintJsonInfo(driver->Core(), info);
     else
         PrintText(driver->Core(), info);
-    hr = driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
-    return 0;
+    return CloseSession(session);
 }
 
 }  // namespace qn::tools

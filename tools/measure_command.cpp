@@ -9,7 +9,7 @@
 #include "Quorlen731XX.h"
 #include "Quorlen731XXErrors.h"
 #include "tools/commands.h"
-#include "tools/json.h"
+#include "tools/json_output.h"
 #include "tools/measure_util.h"
 #include "tools/session_util.h"
 
@@ -74,22 +74,6 @@ const FunctionRow* FindFunction(const std::string& text) {
     return nullptr;
 }
 
-std::vector<OptionSpec> Options() {
-    std::vector<OptionSpec> o(std::begin(kSessionOptions), std::end(kSessionOptions));
-    o.push_back({"channel", true, "analog channel number (default 1)"});
-    o.push_back({"function", true, "measurement: its number or name, e.g. Frequency, DutyCycleNeg"});
-    o.push_back({"all", false, "every measurement of the channel"});
-    return o;
-}
-
-int Usage(const std::string& error) {
-    std::fprintf(stderr,
-                 "qn731xx measure: %s\nusage: qn731xx measure --channel N (--function F | --all) "
-                 "[--json]\n%s",
-                 error.c_str(), OptionHelp(Options()).c_str());
-    return 2;
-}
-
 struct Result {
     const FunctionRow* row;
     std::string label;  // the driver's name of the function
@@ -109,26 +93,18 @@ Result Measure(IQuorlen731XXMeasurement* m, const FunctionRow& f) {
 
 void Print(const std::vector<Result>& results, long channel, bool json) {
     if (json) {
-        JsonWriter w;
-        w.BeginObject();
-        w.Field("channel", channel);
-        w.Key("measurements");
-        w.BeginArray();
+        Json list = Json::array();
         for (const Result& r : results) {
-            w.BeginObject();
-            w.Field("function", r.row->name);
-            w.Field("name", r.label);
+            Json m = {{"function", r.row->name}, {"name", r.label}};
             if (SUCCEEDED(r.hr)) {
-                w.Field("value", r.value);
-                w.Field("unit", r.row->unit);
+                m["value"] = r.value;
+                m["unit"] = r.row->unit;
             } else {
-                w.Field("error", r.failure);
+                m["error"] = r.failure;
             }
-            w.EndObject();
+            list.push_back(std::move(m));
         }
-        w.EndArray();
-        w.EndObject();
-        std::printf("%s\n", w.str().c_str());
+        PrintJson({{"channel", channel}, {"measurements", std::move(list)}});
         return;
     }
     for (const Result& r : results) {
@@ -142,35 +118,48 @@ void Print(const std::vector<Result>& results, long channel, bool json) {
 }  // namespace
 
 int MeasureCommand(std::span<char*> argv) {
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(Options(), argv, &error)) return Usage(error);
-    char* end = nullptr;
-    const std::string channel_text = args.Value("channel").value_or("1");
-    const long channel = std::strtol(channel_text.c_str(), &end, 10);
-    if (*end != '\0' || channel < 1 || channel > 64) return Usage("--channel takes a number from 1");
+    SessionOptions options;
+    auto app = CommandApp("measure", "One measurement of an analog channel, or all of them.",
+                          &options);
+    long channel = 1;
+    std::string function;
+    app->add_option("--channel", channel, "analog channel number")
+        ->check(CLI::Range(1, 64))
+        ->capture_default_str();
+    auto* one_opt = app->add_option("--function", function,
+                                    "measurement: its number or name, e.g. Frequency, DutyCycleNeg");
+    bool all = false;
+    auto* all_opt = app->add_flag("--all", all, "every measurement of the channel");
+    one_opt->excludes(all_opt);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
     const FunctionRow* one = nullptr;
-    if (auto f = args.Value("function")) {
-        one = FindFunction(*f);
-        if (!one) return Usage("unknown measurement function " + *f);
+    if (one_opt->count()) {
+        one = FindFunction(function);
+        if (!one) {
+            std::fprintf(stderr, "qn731xx measure: unknown measurement function %s\n",
+                         function.c_str());
+            return 2;
+        }
+    } else if (!all) {
+        std::fprintf(stderr, "qn731xx measure: give --function F or --all\n");
+        return 2;
     }
-    if (!one == !args.Has("all")) return Usage("give --function F or --all");
 
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     ComPtr<IQuorlen731XXMeasurement> m;
     hr = ShowChannel(session, channel, &m);
-    if (FAILED(hr)) return ReportFailure(("channel " + std::to_string(channel)).c_str(), hr);
+    if (FAILED(hr))
+        return ReportFailure(session.driver.get(), "channel " + std::to_string(channel), hr);
     std::vector<Result> results;
     if (one) {
         results.push_back(Measure(m.get(), *one));
     } else {
         for (const FunctionRow& f : kFunctions) results.push_back(Measure(m.get(), f));
     }
-    Print(results, channel, args.Has("json"));
-    hr = session.driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
+    Print(results, channel, options.json);
+    if (const int rc = CloseSession(session)) return rc;
     // A single measurement that could not be made fails the command; --all
     // shows which ones could not be made.
     return one && FAILED(results.front().hr) ? 1 : 0;

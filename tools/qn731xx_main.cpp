@@ -18,17 +18,17 @@ constexpr Command kCommands[] = {
     {"info", qn::tools::InfoCommand,
      "open a session and print its flags, the instrument identity and the option tables"},
     {"fetch", qn::tools::FetchCommand,
-     "fetch one channel's waveform: --channel N [--points P] [--csv FILE] [--plot FILE.svg]"},
+     "fetch one channel's waveform and summarise it, optionally to CSV and SVG"},
     {"demo", qn::tools::DemoCommand,
      "identify, reset, configure two channels, acquire, fetch, summarise, write CSV and SVG"},
     {"channel", qn::tools::ChannelCommand,
-     "set and print the settings of analog channel N (qn731xx channel N --help)"},
+     "set and print the settings of analog channel N"},
     {"timebase", qn::tools::TimebaseCommand,
      "set and print the horizontal record and acquisition mode"},
     {"measure", qn::tools::MeasureCommand,
-     "one measurement of a channel, or all with --all: --channel N (--function F | --all)"},
+     "one measurement of an analog channel, or all of them"},
     {"digital", qn::tools::DigitalCommand,
-     "set and print the settings of digital channel D (qn731xx digital --channel D --help)"},
+     "set and print the settings of digital channel D"},
     {"system", qn::tools::SystemCommand,
      "set and print the instrument's date and time, its serial number and the I/O timeout"},
     {"screenshot", qn::tools::ScreenshotCommand, "write the instrument's screen to FILE.bmp"},
@@ -37,7 +37,7 @@ constexpr Command kCommands[] = {
     {"scpi", qn::tools::ScpiCommand,
      "send one SCPI command through the driver's I/O object; a query prints its reply"},
     {"trigger", qn::tools::TriggerCommand,
-     "set and print the trigger: --type --source --level --slope --coupling --holdoff --modifier"},
+     "set and print the trigger"},
 };
 
 int Usage(FILE* to) {
@@ -45,7 +45,8 @@ int Usage(FILE* to) {
     for (const Command& c : kCommands)
         std::fprintf(to, "  %-10.*s %.*s\n", int(c.name.size()), c.name.data(), int(c.help.size()),
                      c.help.data());
-    std::fprintf(to, "\nsession options: --resource R --model M --options S --simulate --id-query --reset --json\nwithout --resource, an emulator of model M runs on loopback and the driver talks to it\n");
+    std::fprintf(to, "\n'qn731xx COMMAND --help' shows the options of COMMAND. Without --resource,\n"
+                     "an emulator of --model runs on loopback and the driver talks to it.\n");
     return to == stdout ? 0 : 2;
 }
 

@@ -7,32 +7,23 @@
 
 namespace qn::tools {
 
-const OptionSpec kSessionOptions[7] = {
-    {"resource", true, "VISA resource or logical name (default: the embedded emulator)"},
-    {"model", true, "model of the embedded emulator (default QDS4032A)"},
-    {"options", true, "option string, e.g. \"Simulate=true,DriverSetup=Model=QDS4032A\""},
-    {"simulate", false, "simulate the instrument"},
-    {"id-query", false, "check the instrument model"},
-    {"reset", false, "reset the instrument after opening"},
-    {"json", false, "print one JSON object"},
-};
-
 std::string LastErrorText() {
     com::ErrorRecord rec;
     return com::TakeThreadError(&rec) ? rec.description : std::string();
 }
 
-int ReportFailure(const char* what, HRESULT hr) {
+int ReportFailure(const std::string& what, HRESULT hr) {
     std::string text = LastErrorText();
     const char* name = "";
     for (const ErrorEntry& e : ErrorTable())
         if (e.hr == hr) name = e.name;
-    std::fprintf(stderr, "%s failed: error 0x%08X%s%s%s\n%s\n", what, static_cast<unsigned>(hr),
-                 *name ? " (" : "", name, *name ? ")" : "", text.c_str());
+    std::fprintf(stderr, "%s failed: error 0x%08X%s%s%s\n%s\n", what.c_str(),
+                 static_cast<unsigned>(hr), *name ? " (" : "", name, *name ? ")" : "",
+                 text.c_str());
     return 1;
 }
 
-int ReportFailure(Quorlen731XX* driver, const char* what, HRESULT hr) {
+int ReportFailure(Quorlen731XX* driver, const std::string& what, HRESULT hr) {
     ReportFailure(what, hr);
     if (hr != E_IVI_INSTRUMENT_STATUS) return 1;
     // The queue holds a handful of entries; stop at "no error" or a failure.
@@ -46,18 +37,19 @@ int ReportFailure(Quorlen731XX* driver, const char* what, HRESULT hr) {
     return 1;
 }
 
-HRESULT OpenSession(const CliArgs& args, ToolSession* session) {
+HRESULT OpenSession(const SessionOptions& o, ToolSession* session) {
     session->driver = com::MakeComObject<Quorlen731XX>();
-    std::string resource = args.Value("resource").value_or("");
-    std::string options = args.Value("options").value_or("");
-    // An explicit Simulate in the user's options still wins, since a later
-    // pair replaces an earlier one.
-    if (args.Has("simulate")) {
-        options = options.empty() ? "Simulate=true" : "Simulate=true," + options;
-    } else if (resource.empty()) {
+    std::string resource = o.resource;
+    // Pairs given later replace earlier ones, so the user's own options win
+    // over the ones put in front of them here.
+    std::string options = o.options;
+    if (o.simulate) options = options.empty() ? "Simulate=true" : "Simulate=true," + options;
+    if (!o.no_status_check)
+        options = options.empty() ? "QueryInstrStatus=true"
+                                  : "QueryInstrStatus=true," + options;
+    if (!o.simulate && resource.empty()) {
         try {
-            session->emulator =
-                std::make_unique<emu::Emulator>(args.Value("model").value_or("QDS4032A"));
+            session->emulator = std::make_unique<emu::Emulator>(o.model);
             std::uint16_t port = session->emulator->Start();
             resource = "TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET";
         } catch (const std::exception& e) {
@@ -65,10 +57,14 @@ HRESULT OpenSession(const CliArgs& args, ToolSession* session) {
             return E_FAIL;
         }
     }
-    com::Bstr r(resource), o(options);
-    return session->driver->Initialize(r.get(),
-                                       args.Has("id-query") ? VARIANT_TRUE : VARIANT_FALSE,
-                                       args.Has("reset") ? VARIANT_TRUE : VARIANT_FALSE, o.get());
+    com::Bstr r(resource), opts(options);
+    return session->driver->Initialize(r.get(), o.id_query ? VARIANT_TRUE : VARIANT_FALSE,
+                                       o.reset ? VARIANT_TRUE : VARIANT_FALSE, opts.get());
+}
+
+int CloseSession(ToolSession& session) {
+    HRESULT hr = session.driver->Close();
+    return FAILED(hr) ? ReportFailure("Close", hr) : 0;
 }
 
 }  // namespace qn::tools

@@ -7,12 +7,9 @@
 
 #include "core/root.h"
 #include "emulator/emulator.h"
-#include "tools/cli_args.h"
+#include "tools/command_line.h"
 
 namespace qn::tools {
-
-// The options every session-opening command accepts.
-extern const OptionSpec kSessionOptions[7];
 
 // A driver session, and the embedded emulator it talks to when the command
 // was given no resource.
@@ -23,16 +20,22 @@ struct ToolSession {
 
 // The thread's error description after a failed call, or "" when none.
 std::string LastErrorText();
-// Prints "error 0x...: (NAME) description" to stderr and returns 1.
-int ReportFailure(const char* what, HRESULT hr);
+// Prints "WHAT failed: error 0x... (NAME)" and the description to stderr
+// and returns 1.
+int ReportFailure(const std::string& what, HRESULT hr);
 
 // As ReportFailure; when the instrument reported errors (a failed status
 // check), also prints the instrument's error queue as the driver reads it.
-int ReportFailure(Quorlen731XX* driver, const char* what, HRESULT hr);
+int ReportFailure(Quorlen731XX* driver, const std::string& what, HRESULT hr);
 
-// Creates the driver and initializes it from the session options. Without
-// --resource (and without --simulate) an emulator of --model (default
-// QDS4032A) is started on loopback and opened through its raw socket.
-HRESULT OpenSession(const CliArgs& args, ToolSession* session);
+// Creates the driver and initializes it from the session options, with the
+// status check on unless --no-status-check (an explicit QueryInstrStatus
+// in --options still wins). Without --resource (and
+// without --simulate) an emulator of --model is started on loopback and
+// opened through its raw socket.
+HRESULT OpenSession(const SessionOptions& options, ToolSession* session);
+
+// Closes the session: 0, or 1 after reporting the failure.
+int CloseSession(ToolSession& session);
 
 }  // namespace qn::tools

@@ -5,8 +5,7 @@
 #include <cstdlib>
 #include <strings.h>
 
-#include "tools/json.h"
-#include "tools/session_util.h"
+#include "tools/json_output.h"
 
 namespace qn::tools {
 
@@ -54,9 +53,20 @@ bool Fail(std::string* error, std::string text) {
     return false;
 }
 
-}  // namespace
+// The value placeholder of an option in the help.
+const char* KindName(SettingKind kind) {
+    switch (kind) {
+        case SettingKind::kReal: return "REAL";
+        case SettingKind::kInteger: return "INT";
+        case SettingKind::kSwitch: return "on|off";
+        case SettingKind::kChoice: return "CHOICE";
+        case SettingKind::kText:
+        case SettingKind::kQuotedText: return "TEXT";
+    }
+    return "TEXT";
+}
 
-std::string TakeErrorDescription() { return LastErrorText(); }
+}  // namespace
 
 bool ParseSetting(const SettingInfo& s, const std::string& text, SettingValue* out,
                   std::string* error) {
@@ -115,25 +125,18 @@ std::string FormatSetting(const SettingInfo& s, const SettingValue& v) {
     return std::to_string(n);
 }
 
-std::vector<OptionSpec> SettingOptions(std::span<const SettingInfo> rows) {
-    std::vector<OptionSpec> out(std::begin(kSessionOptions), std::end(kSessionOptions));
-    for (const SettingInfo& r : rows)
-        if (r.writable) out.push_back({r.option, true, r.help});
-    return out;
-}
-
-bool WantsHelp(std::span<char*> argv) {
-    for (const char* a : argv)
-        if (std::string_view(a) == "--help" || std::string_view(a) == "-h") return true;
-    return false;
-}
-
-std::string SettingHelp(std::span<const SettingInfo> rows) {
-    std::string out = OptionHelp(SettingOptions(rows));
-    for (const SettingInfo& r : rows)
-        if (r.kind == SettingKind::kChoice && r.writable)
-            out += "  --" + std::string(r.option) + ": " + ChoiceNames(r.choices) + "\n";
-    return out;
+void AddSettingOptions(CLI::App& app, std::span<const SettingInfo> rows,
+                       std::vector<std::string>* texts, std::vector<CLI::Option*>* given) {
+    texts->assign(rows.size(), std::string());
+    given->assign(rows.size(), nullptr);
+    for (std::size_t i = 0; i < rows.size(); ++i) {
+        const SettingInfo& r = rows[i];
+        if (!r.writable) continue;
+        std::string help(r.help);
+        if (r.kind == SettingKind::kChoice) help += ": " + ChoiceNames(r.choices);
+        (*given)[i] = app.add_option("--" + std::string(r.option), (*texts)[i], help)
+                          ->type_name(KindName(r.kind));
+    }
 }
 
 void PrintReadings(const std::string& title, const std::vector<SettingReading>& readings,
@@ -147,25 +150,24 @@ void PrintReadings(const std::string& title, const std::vector<SettingReading>& 
         }
         return;
     }
-    JsonWriter j;
-    j.BeginObject();
-    if (!id_key.empty()) j.Field(id_key, id);
+    Json j = Json::object();
+    if (!id_key.empty()) j[std::string(id_key)] = id;
     for (const SettingReading& r : readings) {
-        j.Key(r.info->option);
+        Json& field = j[std::string(r.info->option)];
         if (!r.ok) {
-            j.String("n/a");
+            field = "n/a";
         } else if (const auto* d = std::get_if<double>(&r.value)) {
-            j.Number(*d);
+            field = *d;
         } else if (const auto* b = std::get_if<bool>(&r.value)) {
-            j.Bool(*b);
-        } else if (r.info->kind == SettingKind::kChoice || std::holds_alternative<std::string>(r.value)) {
-            j.String(FormatSetting(*r.info, r.value));
+            field = *b;
+        } else if (r.info->kind == SettingKind::kChoice ||
+                   std::holds_alternative<std::string>(r.value)) {
+            field = FormatSetting(*r.info, r.value);
         } else {
-            j.Integer(std::get<LONG>(r.value));
+            field = std::get<LONG>(r.value);
         }
     }
-    j.EndObject();
-    std::printf("%s\n", j.str().c_str());
+    PrintJson(j);
 }
 
 }  // namespace qn::tools

@@ -1,9 +1,10 @@
 // The settings a qn731xx command reads and writes by name: one row per
 // option, tying the option to a property of a driver interface. A command
-// is its table plus RunSettings (setting_table.cpp does the parsing,
-// printing and error reporting shared by every table).
+// is its table plus RunSettings (setting_table.cpp does the parsing and
+// printing shared by every table).
 #pragma once
 
+#include <cstdio>
 #include <optional>
 #include <span>
 #include <string>
@@ -13,7 +14,8 @@
 
 #include "platform/com/bstr.h"
 #include "platform/com/types.h"
-#include "tools/cli_args.h"
+#include "tools/command_line.h"
+#include "tools/session_util.h"
 
 namespace qn::tools {
 
@@ -94,12 +96,11 @@ bool ParseSetting(const SettingInfo& s, const std::string& text, SettingValue* o
 // The value as printed ("on"/"off", the choice name, "%.15g").
 std::string FormatSetting(const SettingInfo& s, const SettingValue& v);
 
-// The options of a settings command: the session options, then one per
-// writable row (read-only rows are only printed).
-std::vector<OptionSpec> SettingOptions(std::span<const SettingInfo> rows);
-// True when the command line asks for help ("--help" or "-h").
-bool WantsHelp(std::span<char*> argv);
-std::string SettingHelp(std::span<const SettingInfo> rows);
+// Adds one option per writable row (read-only rows are only printed); the
+// text given to row i lands in (*texts)[i], and (*given)[i] tells whether
+// the option was given at all.
+void AddSettingOptions(CLI::App& app, std::span<const SettingInfo> rows,
+                       std::vector<std::string>* texts, std::vector<CLI::Option*>* given);
 
 // One read of a row: its value, or why it could not be read.
 struct SettingReading {
@@ -126,18 +127,17 @@ public:
     explicit SettingTable(std::span<const Setting<Itf>> rows) : rows_(rows) {
         for (const Setting<Itf>& r : rows_) infos_.push_back(InfoOf(r));
     }
-    std::vector<OptionSpec> Options() const { return SettingOptions(infos_); }
-    std::string Help() const { return SettingHelp(infos_); }
+    // Adds the options of the writable rows to `app`.
+    void AddOptions(CLI::App& app) { AddSettingOptions(app, infos_, &texts_, &given_); }
 
     // Parses the value of every option given; false with a message on the
     // first that does not fit.
-    bool ParseRequests(const CliArgs& args, std::string* error) {
+    bool ParseRequests(std::string* error) {
         requests_.assign(rows_.size(), std::nullopt);
         for (std::size_t i = 0; i < rows_.size(); ++i) {
-            auto text = args.Value(rows_[i].option);
-            if (!text || !rows_[i].put) continue;
+            if (!given_[i] || given_[i]->count() == 0) continue;
             SettingValue v;
-            if (!ParseSetting(infos_[i], *text, &v, error)) return false;
+            if (!ParseSetting(infos_[i], texts_[i], &v, error)) return false;
             requests_[i] = std::move(v);
         }
         return true;
@@ -165,25 +165,51 @@ public:
             SettingReading r{&infos_[i], false, SettingValue{}, {}};
             HRESULT hr = rows_[i].get(itf, &r.value);
             r.ok = SUCCEEDED(hr);
-            if (!r.ok) r.failure = LastErrorDescription();
+            if (!r.ok) r.failure = LastErrorText();
             out.push_back(std::move(r));
         }
         return out;
     }
 
 private:
-    static std::string LastErrorDescription();
-
     std::span<const Setting<Itf>> rows_;
     std::vector<SettingInfo> infos_;
+    std::vector<std::string> texts_;
+    std::vector<CLI::Option*> given_;
     std::vector<std::optional<SettingValue>> requests_;
 };
 
-std::string TakeErrorDescription();
+// A settings command after its command line was parsed: opens the session,
+// finds the interface with target(driver, &itf, &what), writes the given
+// values (the instrument's errors are printed when it refuses one), prints
+// every row under `title` (or as JSON with `id_key`: `id` first) and closes.
+template <class Itf, class Target>
+int RunSettings(SettingTable<Itf>& table, const SessionOptions& options, Target target,
+                const std::string& title, std::string_view id_key, long id) {
+    std::string error;
+    if (!table.ParseRequests(&error)) {
+        std::fprintf(stderr, "%s\n", error.c_str());
+        return 2;
+    }
+    ToolSession session;
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
+    ComPtr<Itf> itf;
+    std::string what;
+    hr = target(session.driver.get(), &itf, &what);
+    if (FAILED(hr)) return ReportFailure(what, hr);
+    std::string failed;
+    hr = table.Apply(itf.get(), &failed);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), failed, hr);
+    PrintReadings(title, table.ReadAll(itf.get()), options.json, id_key, id);
+    return CloseSession(session);
+}
 
+// The target of the settings that live on the driver object itself.
 template <class Itf>
-std::string SettingTable<Itf>::LastErrorDescription() {
-    return TakeErrorDescription();
+HRESULT DriverItself(Quorlen731XX* driver, ComPtr<Itf>* itf, std::string*) {
+    *itf = ComPtr<Itf>(static_cast<Itf*>(driver));
+    return S_OK;
 }
 
 }  // namespace qn::tools

@@ -4,12 +4,14 @@
 #include <cstdio>
 #include <fstream>
 #include <iterator>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "Quorlen731XXErrors.h"
 #include "platform/com/safearray.h"
 #include "tools/commands.h"
+#include "tools/json_output.h"
 #include "tools/session_util.h"
 #include "tools/setting_table.h"
 
@@ -36,27 +38,6 @@ constexpr std::string_view kSetupMagic = "qn731xx-setup 1\n";
 // Largest setup file read back (bytes).
 constexpr std::uintmax_t kMaxSetupFile = 16 * 1024 * 1024;
 
-int UsageError(const char* command, const std::string& error, const char* usage) {
-    std::fprintf(stderr, "qn731xx %s: %s\nusage: %s\n%s", command, error.c_str(), usage,
-                 OptionHelp(kSessionOptions).c_str());
-    return 2;
-}
-
-// Parses the session options and exactly `words` positionals.
-bool ParseWords(std::span<char*> argv, std::size_t words, CliArgs* args, std::string* error) {
-    if (!args->Parse(kSessionOptions, argv, error)) return false;
-    if (args->Positionals().size() != words) {
-        *error = "expected " + std::to_string(words) + " argument(s)";
-        return false;
-    }
-    return true;
-}
-
-int CloseSession(ToolSession& session) {
-    HRESULT hr = session.driver->Close();
-    return FAILED(hr) ? ReportFailure("Close", hr) : 0;
-}
-
 bool WriteFile(const std::string& path, std::string_view head, const com::SafeArray& bytes) {
     std::ofstream out(path, std::ios::binary | std::ios::trunc);
     out.write(head.data(), std::streamsize(head.size()));
@@ -64,21 +45,23 @@ bool WriteFile(const std::string& path, std::string_view head, const com::SafeAr
     return bool(out.flush());
 }
 
-int SaveBytes(HRESULT (Sys::*get)(SAFEARRAY**), const char* what, const CliArgs& args,
-              std::string_view head) {
+int SaveBytes(HRESULT (Sys::*get)(SAFEARRAY**), const char* what, const SessionOptions& options,
+              const std::string& path, std::string_view head) {
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     SAFEARRAY* raw = nullptr;
     hr = (static_cast<Sys*>(session.driver.get())->*get)(&raw);
     com::SafeArray bytes(raw);
-    if (FAILED(hr)) return ReportFailure(what, hr);
-    const std::string& path = args.Positionals().back();
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), what, hr);
     if (!WriteFile(path, head, bytes)) {
         std::fprintf(stderr, "qn731xx: cannot write %s\n", path.c_str());
         return 1;
     }
-    std::printf("%s: %u bytes\n", path.c_str(), unsigned(bytes.size()));
+    if (options.json)
+        PrintJson({{"file", path}, {"bytes", bytes.size()}});
+    else
+        std::printf("%s: %u bytes\n", path.c_str(), unsigned(bytes.size()));
     return CloseSession(session);
 }
 
@@ -104,15 +87,15 @@ bool ReadSetupFile(const std::string& path, std::string* block, std::string* err
     return true;
 }
 
-int LoadSetup(const CliArgs& args) {
+int LoadSetup(const SessionOptions& options, const std::string& path) {
     std::string block, error;
-    if (!ReadSetupFile(args.Positionals().back(), &block, &error)) {
+    if (!ReadSetupFile(path, &block, &error)) {
         std::fprintf(stderr, "qn731xx setup load: %s\n", error.c_str());
         return 1;
     }
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     com::SafeArray data = com::SafeArray::Vector(VT_UI1, ULONG(block.size()));
     if (!data) return ReportFailure("PutState", E_OUTOFMEMORY);
     std::copy(block.begin(), block.end(), data.data<char>());
@@ -129,7 +112,10 @@ int LoadSetup(const CliArgs& args) {
                      long(code), message.utf8().c_str());
         return 1;
     }
-    std::printf("setup loaded from %s\n", args.Positionals().back().c_str());
+    if (options.json)
+        PrintJson({{"file", path}, {"loaded", true}});
+    else
+        std::printf("setup loaded from %s\n", path.c_str());
     return CloseSession(session);
 }
 
@@ -151,74 +137,77 @@ bool IsQuery(std::string_view command) {
 }  // namespace
 
 int SystemCommand(std::span<char*> argv) {
+    SessionOptions options;
+    auto app = CommandApp(
+        "system", "Set and print the instrument's date and time, serial number and I/O timeout.",
+        &options);
     SettingTable<Sys> table(kSystemSettings);
-    if (WantsHelp(argv)) {
-        std::printf("usage: qn731xx system [options]\n%s", table.Help().c_str());
-        return 0;
-    }
-    const std::vector<OptionSpec> options = table.Options();
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(options, argv, &error) || !args.Positionals().empty() ||
-        !table.ParseRequests(args, &error)) {
-        if (error.empty()) error = "unexpected word " + args.Positionals().front();
-        std::fprintf(stderr, "qn731xx system: %s\nusage: qn731xx system [options]\n%s",
-                     error.c_str(), table.Help().c_str());
-        return 2;
-    }
-    ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    Sys* system = session.driver.get();
-    std::string failed;
-    hr = table.Apply(system, &failed);
-    if (FAILED(hr)) return ReportFailure(failed.c_str(), hr);
-    PrintReadings("System", table.ReadAll(system), args.Has("json"), "", 0);
-    return CloseSession(session);
+    table.AddOptions(*app);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    return RunSettings(table, options, DriverItself<Sys>, "System", "", 0);
 }
 
 int ScreenshotCommand(std::span<char*> argv) {
-    constexpr const char* kUsage = "qn731xx screenshot FILE.bmp [session options]";
-    CliArgs args;
-    std::string error;
-    if (!ParseWords(argv, 1, &args, &error)) return UsageError("screenshot", error, kUsage);
-    return SaveBytes(&Sys::GetScreenBitmap, "GetScreenBitmap", args, {});
+    SessionOptions options;
+    auto app = CommandApp("screenshot", "Write the instrument's screen to a bitmap file.", &options);
+    std::string path;
+    app->add_option("FILE", path, "bitmap file to write, e.g. screen.bmp")->required();
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    return SaveBytes(&Sys::GetScreenBitmap, "GetScreenBitmap", options, path, {});
 }
 
 int SetupCommand(std::span<char*> argv) {
-    constexpr const char* kUsage = "qn731xx setup save|load FILE [session options]";
-    CliArgs args;
-    std::string error;
-    if (!ParseWords(argv, 2, &args, &error)) return UsageError("setup", error, kUsage);
-    const std::string& verb = args.Positionals().front();
-    if (verb == "save") return SaveBytes(&Sys::GetState, "GetState", args, kSetupMagic);
-    if (verb == "load") return LoadSetup(args);
-    return UsageError("setup", "unknown action " + verb, kUsage);
+    SessionOptions options;
+    auto app = CommandApp(
+        "setup", "save: keep the instrument's setup in FILE; load: put it back from FILE.",
+        &options);
+    std::string action, path;
+    app->add_option("ACTION", action, "save or load")
+        ->required()
+        ->check(CLI::IsMember({"save", "load"}));
+    app->add_option("FILE", path, "setup file")->required();
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    if (action == "save") return SaveBytes(&Sys::GetState, "GetState", options, path, kSetupMagic);
+    return LoadSetup(options, path);
 }
 
 int ScpiCommand(std::span<char*> argv) {
-    constexpr const char* kUsage = "qn731xx scpi \"COMMAND\" [session options]";
-    CliArgs args;
-    std::string error;
-    if (!ParseWords(argv, 1, &args, &error)) return UsageError("scpi", error, kUsage);
-    const std::string& command = args.Positionals().front();
+    SessionOptions options;
+    auto app = CommandApp(
+        "scpi", "Send one SCPI command through the driver's I/O object; a query prints its reply.",
+        &options);
+    std::string command;
+    app->add_option("COMMAND", command, "one line of SCPI, e.g. \":CHAN1:RANG?\"")->required();
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
     // argv strings end at their first NUL, so only a line feed can reach here.
-    if (command.empty() || command.find_first_of(std::string_view("\n\0", 2)) != std::string::npos)
-        return UsageError("scpi", "the command must be one line of text", kUsage);
+    if (command.empty() || command.find('\n') != std::string::npos) {
+        std::fprintf(stderr, "qn731xx scpi: the command must be one line of text\n");
+        return 2;
+    }
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     ComPtr<IFormattedIO488> io;
     hr = static_cast<Sys*>(session.driver.get())->get_IO(io.Out());
     if (FAILED(hr)) return ReportFailure("IO", hr);
     com::Bstr text(command + "\n");
     hr = io->WriteString(text.get(), VARIANT_TRUE);
     if (FAILED(hr)) return ReportFailure("WriteString", hr);
+    std::optional<std::string> reply;
     if (IsQuery(command)) {
-        com::Bstr reply;
-        hr = io->ReadString(reply.Out());
+        com::Bstr r;
+        hr = io->ReadString(r.Out());
         if (FAILED(hr)) return ReportFailure("ReadString", hr);
-        std::fputs(reply.utf8().c_str(), stdout);
+        reply = r.utf8();
+    }
+    if (options.json) {
+        Json j = {{"command", command}, {"reply", nullptr}};
+        // The reply's own line feed is not part of its text.
+        if (reply && !reply->empty() && reply->back() == '\n') reply->pop_back();
+        if (reply) j["reply"] = *reply;
+        PrintJson(j);
+    } else if (reply) {
+        std::fputs(reply->c_str(), stdout);
     }
     return CloseSession(session);
 }

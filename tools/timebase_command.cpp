@@ -53,32 +53,13 @@ constexpr Setting<Acq> kTimebaseSettings[] = {
 }  // namespace
 
 int TimebaseCommand(std::span<char*> argv) {
+    SessionOptions options;
+    auto app = CommandApp("timebase", "Set and print the horizontal record and acquisition mode.",
+                          &options);
     SettingTable<Acq> table(kTimebaseSettings);
-    if (WantsHelp(argv)) {
-        std::printf("usage: qn731xx timebase [options]\n%s", table.Help().c_str());
-        return 0;
-    }
-    const std::vector<OptionSpec> options = table.Options();
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(options, argv, &error) || !args.Positionals().empty() ||
-        !table.ParseRequests(args, &error)) {
-        if (error.empty()) error = "unexpected word " + args.Positionals().front();
-        std::fprintf(stderr, "qn731xx timebase: %s\nusage: qn731xx timebase [options]\n%s",
-                     error.c_str(), table.Help().c_str());
-        return 2;
-    }
-    ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    Acq* acquisition = session.driver.get();
-    std::string failed;
-    hr = table.Apply(acquisition, &failed);
-    if (FAILED(hr)) return ReportFailure(failed.c_str(), hr);
-    PrintReadings("Timebase", table.ReadAll(acquisition), args.Has("json"), "", 0);
-    hr = session.driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
-    return 0;
+    table.AddOptions(*app);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    return RunSettings(table, options, DriverItself<Acq>, "Timebase", "", 0);
 }
 
 }  // namespace qn::tools

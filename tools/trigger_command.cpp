@@ -72,40 +72,15 @@ constexpr Setting<Root> kTriggerSettings[] = {
      ReadVia<Trig, VARIANT_BOOL, &Trig::get_Continuous>, nullptr},
 };
 
-int Usage(const SettingTable<Root>& table, const std::string& error) {
-    std::fprintf(stderr, "qn731xx trigger: %s\nusage: qn731xx trigger [options]\n%s",
-                 error.c_str(), table.Help().c_str());
-    return 2;
-}
-
 }  // namespace
 
 int TriggerCommand(std::span<char*> argv) {
+    SessionOptions options;
+    auto app = CommandApp("trigger", "Set and print the trigger.", &options);
     SettingTable<Root> table(kTriggerSettings);
-    if (WantsHelp(argv)) {
-        std::printf("usage: qn731xx trigger [options]\n%s", table.Help().c_str());
-        return 0;
-    }
-    const std::vector<OptionSpec> options = table.Options();
-    CliArgs args;
-    std::string error;
-    if (!args.Parse(options, argv, &error)) return Usage(table, error);
-    if (!args.Positionals().empty())
-        return Usage(table, "unexpected word " + args.Positionals().front());
-    if (!table.ParseRequests(args, &error)) return Usage(table, error);
-    ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
-    // A setting the instrument refuses fails its write with the instrument's error.
-    hr = session.driver->put_QueryInstrumentStatus(VARIANT_TRUE);
-    if (FAILED(hr)) return ReportFailure("QueryInstrumentStatus", hr);
-    std::string failed;
-    hr = table.Apply(session.driver.get(), &failed);
-    if (FAILED(hr)) return ReportFailure(session.driver.get(), failed.c_str(), hr);
-    PrintReadings("Trigger", table.ReadAll(session.driver.get()), args.Has("json"), "", 0);
-    hr = session.driver->Close();
-    if (FAILED(hr)) return ReportFailure("Close", hr);
-    return 0;
+    table.AddOptions(*app);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
+    return RunSettings(table, options, DriverItself<Root>, "Trigger", "", 0);
 }
 
 }  // namespace qn::tools

@@ -2,6 +2,8 @@
 // interfaces, with a summary, a CSV table and an SVG plot.
 #include <algorithm>
 #include <chrono>
+#include <climits>
+#include <cstdint>
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
@@ -13,7 +15,9 @@
 #include "Quorlen731XX.h"
 #include "Quorlen731XXErrors.h"
 #include "tools/commands.h"
+#include "tools/json_output.h"
 #include "tools/measure_util.h"
+#include "tools/progress.h"
 #include "tools/session_util.h"
 #include "tools/waveform_files.h"
 
@@ -21,61 +25,64 @@ namespace qn::tools {
 
 namespace {
 
-// The session options plus the waveform options.
-std::vector<OptionSpec> WaveformOptions() {
-    std::vector<OptionSpec> o(std::begin(kSessionOptions), std::end(kSessionOptions));
-    o.push_back({"channel", true, "analog channel number (fetch; default 1)"});
-    o.push_back({"digital", true, "digital channel number from 0 (fetch: its states)"});
-    o.push_back({"points", true, "minimum number of points of the record"});
-    o.push_back({"csv", true, "write the waveform(s) to this CSV file"});
-    o.push_back({"plot", true, "write an SVG plot to this file"});
-    o.push_back({"trigger-level", true, "acquire on an edge trigger at this level in V"});
-    o.push_back({"trigger-source", true, "acquire on an edge trigger on this source"});
-    return o;
+// The waveform options of fetch and demo.
+struct WaveformOptions {
+    long channel = 1;
+    long digital = 0;
+    long points = 0;
+    std::string csv, plot;
+    double trigger_level = 0.0;
+    std::string trigger_source;
+    CLI::Option* digital_given = nullptr;
+    CLI::Option* points_given = nullptr;
+    CLI::Option* level_given = nullptr;
+    CLI::Option* source_given = nullptr;
+};
+
+void AddWaveformOptions(CLI::App& app, WaveformOptions* w) {
+    app.add_option("--channel", w->channel, "analog channel number (fetch)")
+        ->check(CLI::Range(1, 64))
+        ->capture_default_str();
+    w->digital_given = app.add_option("--digital", w->digital,
+                                      "digital channel number from 0 (fetch: its states)")
+                           ->check(CLI::Range(0, 1023));
+    w->points_given = app.add_option("--points", w->points, "minimum number of points of the record")
+                          ->check(CLI::Range(1, INT32_MAX));
+    app.add_option("--csv", w->csv, "write the waveform(s) to this CSV file");
+    app.add_option("--plot", w->plot, "write an SVG plot to this file");
+    w->level_given = app.add_option("--trigger-level", w->trigger_level,
+                                    "acquire on an edge trigger at this level in V")
+                         ->check(CLI::Validator(
+                             [](std::string& text) {
+                                 char* end = nullptr;
+                                 const double v = std::strtod(text.c_str(), &end);
+                                 const bool ok = !text.empty() && *end == '\0' && std::isfinite(v);
+                                 return ok ? std::string() : text + " is not a finite number";
+                             },
+                             ""));
+    w->source_given = app.add_option("--trigger-source", w->trigger_source,
+                                     "acquire on an edge trigger on this source");
 }
 
-// The trigger level of --trigger-level, when given and a number.
-bool TriggerLevel(const CliArgs& args, std::optional<double>* level, std::string* error) {
-    const auto text = args.Value("trigger-level");
-    if (!text) return true;
-    char* end = nullptr;
-    const double v = std::strtod(text->c_str(), &end);
-    if (text->empty() || *end != '\0' || !std::isfinite(v)) {
-        *error = "--trigger-level " + *text + ": not a number";
-        return false;
-    }
-    *level = v;
-    return true;
-}
-
-bool ParseArgs(const char* command, std::span<char*> argv, CliArgs* args) {
-    const std::vector<OptionSpec> specs = WaveformOptions();
-    std::string error;
-    std::optional<double> level;
-    if (args->Parse(specs, argv, &error) && TriggerLevel(*args, &level, &error)) return true;
-    std::fprintf(stderr, "qn731xx %s: %s\n%s", command, error.c_str(), OptionHelp(specs).c_str());
-    return false;
-}
-
-bool WantsTrigger(const CliArgs& args) {
-    return args.Has("trigger-level") || args.Has("trigger-source");
+bool WantsTrigger(const WaveformOptions& w) {
+    return w.level_given->count() || w.source_given->count();
 }
 
 // --trigger-level and --trigger-source: an edge trigger with a normal sweep,
 // so the acquisition waits for the level to be crossed.
-HRESULT ApplyTrigger(Quorlen731XX* driver, const CliArgs& args, const char** what) {
-    if (!WantsTrigger(args)) return S_OK;
+HRESULT ApplyTrigger(Quorlen731XX* driver, const WaveformOptions& w, const char** what) {
+    if (!WantsTrigger(w)) return S_OK;
     auto* trigger = static_cast<IQuorlen731XXTrigger*>(driver);
     *what = "trigger Type";
     HRESULT hr = trigger->put_Type(Quorlen731XXTriggerEdge);
-    if (SUCCEEDED(hr) && args.Has("trigger-source")) {
+    if (SUCCEEDED(hr) && w.source_given->count()) {
         *what = "--trigger-source";
-        com::Bstr source(*args.Value("trigger-source"));
+        com::Bstr source(w.trigger_source);
         hr = trigger->put_Source(source.get());
     }
-    if (SUCCEEDED(hr) && args.Has("trigger-level")) {
+    if (SUCCEEDED(hr) && w.level_given->count()) {
         *what = "--trigger-level";
-        hr = trigger->put_Level(std::strtod(args.Value("trigger-level")->c_str(), nullptr));
+        hr = trigger->put_Level(w.trigger_level);
     }
     if (SUCCEEDED(hr)) {
         *what = "trigger Modifier";
@@ -84,7 +91,8 @@ HRESULT ApplyTrigger(Quorlen731XX* driver, const CliArgs& args, const char** wha
     return hr;
 }
 
-// Fetches the current record of analog channel `channel` (1-based).
+// Fetches the current record of analog channel `channel` (1-based); the
+// points stay in the driver's array.
 HRESULT FetchChannel(Quorlen731XX* driver, long channel, Trace* trace) {
     trace->name = "Channel" + std::to_string(channel);
     ComPtr<IQuorlen731XXMeasurement> m;
@@ -92,10 +100,13 @@ HRESULT FetchChannel(Quorlen731XX* driver, long channel, Trace* trace) {
     HRESULT hr = static_cast<IQuorlen731XXMeasurements*>(driver)->get_Item(name.get(), m.Out());
     if (FAILED(hr)) return hr;
     SAFEARRAY* raw = nullptr;
-    hr = m->FetchWaveform(&raw, &trace->initial_x, &trace->x_increment);
-    com::SafeArray data(raw);
+    {
+        Progress progress("fetching " + trace->name);
+        hr = m->FetchWaveform(&raw, &trace->initial_x, &trace->x_increment);
+    }
+    trace->array = com::SafeArray(raw);
     if (FAILED(hr)) return hr;
-    trace->y.assign(data.data<double>(), data.data<double>() + data.size());
+    trace->y = {trace->array.data<double>(), trace->array.size()};
     return hr;  // S_IVISCOPE_INVALID_WFM_ELEMENT: delivered, some points NaN
 }
 
@@ -108,20 +119,28 @@ HRESULT FetchDigital(Quorlen731XX* driver, long d, Trace* trace) {
         static_cast<IQuorlen731XXDigitalChannels*>(driver)->get_Item(name.get(), ch.Out());
     if (FAILED(hr)) return hr;
     SAFEARRAY* raw = nullptr;
-    hr = ch->FetchDigitalWaveform(&raw, &trace->initial_x, &trace->x_increment);
+    {
+        Progress progress("fetching " + trace->name);
+        hr = ch->FetchDigitalWaveform(&raw, &trace->initial_x, &trace->x_increment);
+    }
     com::SafeArray bytes(raw);
     if (FAILED(hr)) return hr;
-    trace->y.clear();
-    for (std::size_t i = 0; i < bytes.size(); ++i)
-        trace->y.push_back((bytes.data<std::uint8_t>()[i] >> (d % 8)) & 1);
+    const std::uint8_t* b = bytes.data<std::uint8_t>();
+    trace->states.resize(bytes.size());
+    for (std::size_t i = 0; i < trace->states.size(); ++i) trace->states[i] = (b[i] >> (d % 8)) & 1;
+    trace->y = trace->states;
     return hr;
 }
 
-// Frequency, peak-to-peak and RMS of analog channel `channel`; a value the
-// instrument could not measure is shown with its reason.
-void PrintMeasurements(Quorlen731XX* driver, long channel) {
+// Frequency, peak-to-peak and RMS of analog channel `channel`: a value, or
+// the reason the instrument could not measure it.
+Json Measurements(Quorlen731XX* driver, long channel) {
+    Json out = {{"channel", channel}};
     ComPtr<IQuorlen731XXMeasurement> m;
-    if (FAILED(MeasurementNamed(driver, "UserChannel" + std::to_string(channel), &m))) return;
+    if (FAILED(MeasurementNamed(driver, "UserChannel" + std::to_string(channel), &m))) {
+        out["error"] = LastErrorText();
+        return out;
+    }
     struct Row {
         Quorlen731XXMeasurementEnum function;
         const char* label;
@@ -130,18 +149,33 @@ void PrintMeasurements(Quorlen731XX* driver, long channel) {
     constexpr Row kRows[] = {{Quorlen731XXMeasurementFrequency, "frequency", "Hz"},
                              {Quorlen731XXMeasurementVoltagePeakToPeak, "peak-to-peak", "V"},
                              {Quorlen731XXMeasurementVoltageRMS, "RMS", "V"}};
-    std::printf("Channel%-3ld", channel);
     for (const Row& r : kRows) {
         double v = 0;
         if (SUCCEEDED(m->FetchWaveformMeasurement(r.function, &v)))
-            std::printf("  %s %.6g %s", r.label, v, r.unit);
+            out[r.label] = {{"value", v}, {"unit", r.unit}};
         else
-            std::printf("  %s: %s", r.label, LastErrorText().c_str());
+            out[r.label] = {{"error", LastErrorText()}};
+    }
+    return out;
+}
+
+void PrintMeasurements(const Json& m) {
+    std::printf("Channel%-3ld", m["channel"].get<long>());
+    for (const auto& [label, v] : m.items()) {
+        if (label == "channel") continue;
+        if (v.is_string())
+            std::printf("  %s", v.get<std::string>().c_str());
+        else if (v.contains("value"))
+            std::printf("  %s %.6g %s", label.c_str(), v["value"].get<double>(),
+                        v["unit"].get<std::string>().c_str());
+        else
+            std::printf("  %s: %s", label.c_str(), v["error"].get<std::string>().c_str());
     }
     std::printf("\n");
 }
 
-void PrintSummary(const Trace& t) {
+// Points, time span and the range and mean of the points with data.
+Json Summary(const Trace& t) {
     double lo = INFINITY, hi = -INFINITY, sum = 0;
     std::size_t valid = 0;
     for (double v : t.y) {
@@ -149,31 +183,45 @@ void PrintSummary(const Trace& t) {
         lo = std::min(lo, v), hi = std::max(hi, v), sum += v, ++valid;
     }
     const double span = t.y.empty() ? 0.0 : t.x_increment * double(t.y.size() - 1);
+    Json j = {{"name", t.name},       {"points", t.y.size()}, {"initial_x", t.initial_x},
+              {"x_increment", t.x_increment}, {"span", span},
+              {"points_without_data", t.y.size() - valid}};
+    // Without a point with data there is no range: null in JSON.
+    j["min"] = valid ? Json(lo) : Json(nullptr);
+    j["max"] = valid ? Json(hi) : Json(nullptr);
+    j["mean"] = valid ? Json(sum / double(valid)) : Json(nullptr);
+    return j;
+}
+
+void PrintSummary(const Json& s) {
+    auto number = [&](const char* key) { return s[key].is_null() ? NAN : s[key].get<double>(); };
     std::printf("%-10s %8zu points  t0 %.6g s  span %.6g s  min %.6g V  max %.6g V  mean %.6g V",
-                t.name.c_str(), t.y.size(), t.initial_x, span, valid ? lo : NAN,
-                valid ? hi : NAN, valid ? sum / double(valid) : NAN);
-    if (valid < t.y.size()) std::printf("  (%zu points without data)", t.y.size() - valid);
+                s["name"].get<std::string>().c_str(), s["points"].get<std::size_t>(),
+                number("initial_x"), number("span"), number("min"), number("max"),
+                number("mean"));
+    if (const auto missing = s["points_without_data"].get<std::size_t>())
+        std::printf("  (%zu points without data)", missing);
     std::printf("\n");
 }
 
-int WriteFiles(std::optional<std::string> csv, std::optional<std::string> svg,
-               const std::vector<Trace>& traces) {
-    if (csv) {
-        if (!WriteCsv(*csv, traces)) return std::fprintf(stderr, "cannot write %s\n", csv->c_str()), 1;
-        std::printf("wrote %s\n", csv->c_str());
+// Writes the files asked for; their names go to `written`.
+int WriteFiles(const std::string& csv, const std::string& svg, const std::vector<Trace>& traces,
+               Json* written) {
+    if (!csv.empty()) {
+        if (!WriteCsv(csv, traces)) return std::fprintf(stderr, "cannot write %s\n", csv.c_str()), 1;
+        written->push_back(csv);
     }
-    if (svg) {
-        if (!WriteSvg(*svg, traces)) return std::fprintf(stderr, "cannot write %s\n", svg->c_str()), 1;
-        std::printf("wrote %s\n", svg->c_str());
+    if (!svg.empty()) {
+        if (!WriteSvg(svg, traces)) return std::fprintf(stderr, "cannot write %s\n", svg.c_str()), 1;
+        written->push_back(svg);
     }
     return 0;
 }
 
-HRESULT SetPoints(Quorlen731XX* driver, const CliArgs& args) {
-    auto points = args.Value("points");
-    if (!points) return S_OK;
+HRESULT SetPoints(Quorlen731XX* driver, const WaveformOptions& w) {
+    if (!w.points_given->count()) return S_OK;
     return static_cast<IQuorlen731XXAcquisition*>(driver)->put_NumberOfPointsMin(
-        static_cast<LONG>(std::stol(*points)));
+        static_cast<LONG>(w.points));
 }
 
 // One channel's settings, through the instrument-specific channel.
@@ -187,22 +235,19 @@ HRESULT ConfigureChannel(Quorlen731XX* driver, long channel, double range, doubl
     return hr;
 }
 
-// Starts one acquisition and polls its status with a progress indicator.
+// Starts one acquisition and polls its status until it completes (about
+// 10 s at most), showing progress while it waits for the trigger.
 HRESULT AcquireOnce(Quorlen731XX* driver) {
     auto* acq = static_cast<IQuorlen731XXMeasurements*>(driver);
     HRESULT hr = acq->Initiate();
     if (FAILED(hr)) return hr;
-    std::printf("acquiring ");
+    Progress progress("waiting for the trigger");
     Quorlen731XXAcquisitionStatusEnum status = Quorlen731XXAcqInProgress;
     for (int i = 0; i < 500; ++i) {
         hr = acq->Status(&status);
         if (FAILED(hr) || status == Quorlen731XXAcqComplete) break;
-        std::printf(".");
-        std::fflush(stdout);
         std::this_thread::sleep_for(std::chrono::milliseconds(20));
     }
-    std::printf(FAILED(hr) ? " failed\n" : status == Quorlen731XXAcqComplete ? " done\n"
-                                                                              : " gave up\n");
     if (SUCCEEDED(hr) && status != Quorlen731XXAcqComplete) {
         acq->Abort();
         return E_IVISCOPE_MAX_TIME_EXCEEDED;
@@ -210,93 +255,116 @@ HRESULT AcquireOnce(Quorlen731XX* driver) {
     return hr;
 }
 
+// Prints the summaries and the files written, as text or as one object.
+void PrintTraces(const Json& report, bool json) {
+    if (json) return PrintJson(report);
+    for (const Json& t : report["traces"]) PrintSummary(t);
+    if (report.contains("measurements"))
+        for (const Json& m : report["measurements"]) PrintMeasurements(m);
+    for (const Json& f : report["files"]) std::printf("wrote %s\n", f.get<std::string>().c_str());
+}
+
 }  // namespace
 
 int FetchCommand(std::span<char*> argv) {
-    CliArgs args;
-    if (!ParseArgs("fetch", argv, &args)) return 2;
-    const long channel = std::stol(args.Value("channel").value_or("1"));
+    SessionOptions options;
+    WaveformOptions w;
+    auto app = CommandApp("fetch", "Fetch one channel's waveform and summarise it.", &options);
+    AddWaveformOptions(*app, &w);
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     Quorlen731XX* driver = session.driver.get();
-    if (auto digital = args.Value("digital")) {
-        std::vector<Trace> traces(1);
-        const long d = std::stol(*digital);
+    std::vector<Trace> traces(1);
+    if (w.digital_given->count()) {
         if (session.emulator) {
             // The embedded emulator starts with its pods off and no record.
             ComPtr<IQuorlen731XXDigitalChannel> ch;
-            com::Bstr name("UserDigitalChannel" + std::to_string(d));
+            com::Bstr name("UserDigitalChannel" + std::to_string(w.digital));
             hr = static_cast<IQuorlen731XXDigitalChannels*>(driver)->get_Item(name.get(), ch.Out());
             if (SUCCEEDED(hr)) hr = ch->put_Enabled(VARIANT_TRUE);
             if (SUCCEEDED(hr)) hr = AcquireOnce(driver);
-            if (FAILED(hr)) return ReportFailure("Acquire", hr);
+            if (FAILED(hr)) return ReportFailure(driver, "Acquire", hr);
         }
-        hr = FetchDigital(driver, d, &traces[0]);
-        if (FAILED(hr)) return ReportFailure("FetchDigitalWaveform", hr);
-        PrintSummary(traces[0]);
-        const int rc = WriteFiles(args.Value("csv"), args.Value("plot"), traces);
-        hr = driver->Close();
-        return FAILED(hr) ? ReportFailure("Close", hr) : rc;
+        hr = FetchDigital(driver, w.digital, &traces[0]);
+        if (FAILED(hr)) return ReportFailure(driver, "FetchDigitalWaveform", hr);
+    } else {
+        const char* what = "";
+        if (FAILED(hr = ApplyTrigger(driver, w, &what))) return ReportFailure(driver, what, hr);
+        if (session.emulator || WantsTrigger(w)) {
+            // The embedded emulator has no record until something acquired
+            // one; a trigger asks for a new acquisition.
+            if (session.emulator) hr = ConfigureChannel(driver, w.channel, 8.0, 0.0);
+            if (SUCCEEDED(hr)) hr = AcquireOnce(driver);
+            if (FAILED(hr)) return ReportFailure(driver, "Acquire", hr);
+        }
+        if (FAILED(hr = SetPoints(driver, w))) return ReportFailure(driver, "NumberOfPointsMin", hr);
+        hr = FetchChannel(driver, w.channel, &traces[0]);
+        if (FAILED(hr)) return ReportFailure(driver, "FetchWaveform", hr);
     }
-    const char* what = "";
-    if (FAILED(hr = ApplyTrigger(driver, args, &what))) return ReportFailure(what, hr);
-    if (session.emulator || WantsTrigger(args)) {
-        // The embedded emulator has no record until something acquired one;
-        // a trigger asks for a new acquisition.
-        if (session.emulator) hr = ConfigureChannel(driver, channel, 8.0, 0.0);
-        if (SUCCEEDED(hr)) hr = AcquireOnce(driver);
-        if (FAILED(hr)) return ReportFailure("Acquire", hr);
-    }
-    if (FAILED(hr = SetPoints(driver, args))) return ReportFailure("NumberOfPointsMin", hr);
-    std::vector<Trace> traces(1);
-    hr = FetchChannel(driver, channel, &traces[0]);
-    if (FAILED(hr)) return ReportFailure("FetchWaveform", hr);
-    PrintSummary(traces[0]);
-    const int rc = WriteFiles(args.Value("csv"), args.Value("plot"), traces);
-    hr = driver->Close();
-    return FAILED(hr) ? ReportFailure("Close", hr) : rc;
+    Json report = {{"traces", {Summary(traces[0])}}, {"files", Json::array()}};
+    const int rc = WriteFiles(w.csv, w.plot, traces, &report["files"]);
+    PrintTraces(report, options.json);
+    if (const int close_rc = CloseSession(session)) return close_rc;
+    return rc;
 }
 
 // A complete test-program flow: identify, reset, configure, acquire, fetch,
 // summarise, save, close.
 int DemoCommand(std::span<char*> argv) {
-    CliArgs args;
-    if (!ParseArgs("demo", argv, &args)) return 2;
+    SessionOptions options;
+    WaveformOptions w;
+    w.csv = "qn731xx-demo.csv";
+    w.plot = "qn731xx-demo.svg";
+    auto app = CommandApp(
+        "demo", "Identify, reset, configure two channels, acquire, fetch, summarise, write CSV and SVG.",
+        &options);
+    AddWaveformOptions(*app, &w);
+    app->get_option("--csv")->capture_default_str();
+    app->get_option("--plot")->capture_default_str();
+    if (auto rc = ParseCommandLine(*app, argv)) return *rc;
     ToolSession session;
-    HRESULT hr = OpenSession(args, &session);
-    if (FAILED(hr)) return ReportFailure("Initialize", hr);
+    HRESULT hr = OpenSession(options, &session);
+    if (FAILED(hr)) return ReportFailure(session.driver.get(), "Initialize", hr);
     Quorlen731XX* driver = session.driver.get();
     com::Bstr maker, model, firmware;
     driver->get_InstrumentManufacturer(maker.Out());
     driver->get_InstrumentModel(model.Out());
     driver->get_InstrumentFirmwareRevision(firmware.Out());
-    std::printf("instrument: %s %s, firmware %s%s\n", maker.utf8().c_str(), model.utf8().c_str(),
-                firmware.utf8().c_str(), session.emulator ? " (embedded emulator)" : "");
-    if (FAILED(hr = driver->Reset())) return ReportFailure("Reset", hr);
-    std::printf("reset\n");
+    Json report = {{"instrument",
+                    {{"manufacturer", maker.utf8()},
+                     {"model", model.utf8()},
+                     {"firmware_revision", firmware.utf8()},
+                     {"embedded_emulator", session.emulator != nullptr}}}};
+    if (!options.json)
+        std::printf("instrument: %s %s, firmware %s%s\n", maker.utf8().c_str(),
+                    model.utf8().c_str(), firmware.utf8().c_str(),
+                    session.emulator ? " (embedded emulator)" : "");
+    if (FAILED(hr = driver->Reset())) return ReportFailure(driver, "Reset", hr);
     auto* acq = static_cast<IQuorlen731XXAcquisition*>(driver);
-    if (FAILED(hr = acq->put_TimePerRecord(1e-3))) return ReportFailure("TimePerRecord", hr);
-    if (FAILED(hr = SetPoints(driver, args))) return ReportFailure("NumberOfPointsMin", hr);
+    if (FAILED(hr = acq->put_TimePerRecord(1e-3))) return ReportFailure(driver, "TimePerRecord", hr);
+    if (FAILED(hr = SetPoints(driver, w))) return ReportFailure(driver, "NumberOfPointsMin", hr);
     const std::pair<double, double> settings[] = {{8.0, 0.0}, {4.0, 0.5}};  // range, offset (V)
     for (long ch = 1; ch <= 2; ++ch)
         if (FAILED(hr = ConfigureChannel(driver, ch, settings[ch - 1].first,
                                          settings[ch - 1].second)))
-            return ReportFailure("Configure channel", hr);
-    std::printf("configured: 1 ms per record, channel 1 8 V / 0 V, channel 2 4 V / 0.5 V\n");
+            return ReportFailure(driver, "Configure channel", hr);
+    if (!options.json)
+        std::printf("reset; configured: 1 ms per record, channel 1 8 V / 0 V, channel 2 4 V / 0.5 V\n");
     const char* what = "";
-    if (FAILED(hr = ApplyTrigger(driver, args, &what))) return ReportFailure(what, hr);
-    if (FAILED(hr = AcquireOnce(driver))) return ReportFailure("Acquire", hr);
+    if (FAILED(hr = ApplyTrigger(driver, w, &what))) return ReportFailure(driver, what, hr);
+    if (FAILED(hr = AcquireOnce(driver))) return ReportFailure(driver, "Acquire", hr);
     std::vector<Trace> traces(2);
     for (long ch = 1; ch <= 2; ++ch)
         if (FAILED(hr = FetchChannel(driver, ch, &traces[std::size_t(ch - 1)])))
-            return ReportFailure("FetchWaveform", hr);
-    for (const Trace& t : traces) PrintSummary(t);
-    for (long ch = 1; ch <= 2; ++ch) PrintMeasurements(driver, ch);
-    const int rc = WriteFiles(args.Value("csv").value_or("qn731xx-demo.csv"),
-                              args.Value("plot").value_or("qn731xx-demo.svg"), traces);
-    if (FAILED(hr = driver->Close())) return ReportFailure("Close", hr);
-    std::printf("closed\n");
+            return ReportFailure(driver, "FetchWaveform", hr);
+    report["traces"] = {Summary(traces[0]), Summary(traces[1])};
+    report["measurements"] = {Measurements(driver, 1), Measurements(driver, 2)};
+    report["files"] = Json::array();
+    const int rc = WriteFiles(w.csv, w.plot, traces, &report["files"]);
+    PrintTraces(report, options.json);
+    if (const int close_rc = CloseSession(session)) return close_rc;
     return rc;
 }
 

@@ -2,16 +2,23 @@
 // and an SVG plot with time and voltage axes.
 #pragma once
 
+#include <span>
 #include <string>
 #include <vector>
 
+#include "platform/com/safearray.h"
+
 namespace qn::tools {
 
+// A fetched waveform. Analog points stay in the driver's output array;
+// digital states, converted from the pod's bytes, live in `states`.
 struct Trace {
     std::string name;
     double initial_x = 0.0;    // s
     double x_increment = 0.0;  // s
-    std::vector<double> y;     // V; NaN where the instrument had no data
+    com::SafeArray array;
+    std::vector<double> states;
+    std::span<const double> y;  // V or 0/1; NaN where the instrument had no data
 };
 
 // False (with errno set by the stream) when the file cannot be written.

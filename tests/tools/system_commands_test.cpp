@@ -12,15 +12,11 @@
 #include <vector>
 
 #include "emulator/emulator.h"
+#include "tests/tools/run_command.h"
 #include "tools/commands.h"
 
 namespace qn::tools {
 namespace {
-
-struct Result {
-    int rc;
-    std::string out, err;
-};
 
 class SystemCommands : public ::testing::Test {
 protected:
@@ -31,14 +27,7 @@ protected:
     Result Run(int (*command)(std::span<char*>), std::vector<std::string> words) {
         words.push_back("--resource");
         words.push_back(resource_);
-        std::vector<char*> argv;
-        for (std::string& w : words) argv.push_back(w.data());
-        ::testing::internal::CaptureStdout();
-        ::testing::internal::CaptureStderr();
-        const int rc = command(argv);
-        std::string out = ::testing::internal::GetCapturedStdout();
-        std::string err = ::testing::internal::GetCapturedStderr();
-        return {rc, out, err};
+        return Invoke(command, std::move(words));
     }
     static std::string Path(const char* name) { return ::testing::TempDir() + name; }
     static std::string Slurp(const std::string& path) {
@@ -109,8 +98,10 @@ TEST_F(SystemCommands, BadArgumentsAreUsageErrors) {
 TEST_F(SystemCommands, SystemPrintsClockSerialAndTimeout) {
     Result r = Run(SystemCommand, {"--date", "+2026,+12,+6", "--timeout", "50", "--json"});
     ASSERT_EQ(r.rc, 0) << r.err;
-    for (const char* field : {"\"date\":\"+2026,+12,+6\"", "\"timeout\":100", "\"serial\":"})
-        EXPECT_NE(r.out.find(field), std::string::npos) << field << " in " << r.out;
+    const Json j = OutputObject(r);
+    EXPECT_EQ(j.value("date", ""), "+2026,+12,+6") << r.out;
+    EXPECT_EQ(j.value("timeout", 0), 100) << r.out;
+    EXPECT_TRUE(j.contains("serial")) << r.out;
 }
 
 }  // namespace

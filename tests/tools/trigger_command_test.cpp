@@ -6,38 +6,20 @@
 #include <string>
 #include <vector>
 
+#include "tests/tools/run_command.h"
 #include "tools/commands.h"
 
 namespace qn::tools {
 namespace {
-
-struct Result {
-    int rc;
-    std::string out;
-    std::string err;
-};
-
-Result Invoke(int (*command)(std::span<char*>), std::vector<std::string> words) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    std::vector<char*> argv;
-    for (std::string& w : words) argv.push_back(w.data());
-    ::testing::internal::CaptureStdout();
-    ::testing::internal::CaptureStderr();
-    const int rc = command(argv);
-    std::string out = ::testing::internal::GetCapturedStdout();
-    std::string err = ::testing::internal::GetCapturedStderr();
-    return {rc, out, err};
-}
 
 TEST(TriggerCommand, SetsAndPrintsTheTrigger) {
     Result r = Invoke(TriggerCommand, {"--type", "edge", "--source", "UserChannel2", "--level",
                                        "0.5", "--slope", "negative", "--holdoff", "0.25",
                                        "--coupling", "hfreject", "--modifier", "none", "--json"});
     ASSERT_EQ(r.rc, 0) << r.out << r.err;
-    for (const char* field : {"\"type\":\"edge\"", "\"source\":\"UserChannel2\"", "\"level\":0.5",
-                              "\"slope\":\"negative\"", "\"holdoff\":0.25",
-                              "\"coupling\":\"hfreject\"", "\"modifier\":\"none\""})
-        EXPECT_NE(r.out.find(field), std::string::npos) << field << " in " << r.out;
+    EXPECT_EQ(OutputObject(r), Json::parse(R"({"type": "edge", "source": "UserChannel2",
+        "level": 0.5, "slope": "negative", "coupling": "hfreject", "holdoff": 0.25,
+        "modifier": "none", "continuous": false})")) << r.out;
 
     r = Invoke(TriggerCommand, {"--type", "glitch", "--source", "VAL_EXTERNAL"});
     ASSERT_EQ(r.rc, 0) << r.err;
@@ -53,7 +35,7 @@ TEST(TriggerCommand, RefusedValuesPrintTheirErrorAndFail) {
         {{"--type", "runt"}, 2, "--type runt"},
         {{"--level", "1V"}, 2, "--level 1V"},
         {{"--slope", "up"}, 2, "--slope up"},
-        {{"extra"}, 2, "unexpected word extra"},
+        {{"extra"}, 2, "not expected: extra"},
         {{"--modifier", "autolevel"}, 1, "put_Modifier"},
         {{"--coupling", "tv"}, 1, "Settings Conflict"},
         {{"--source", "UserChannel9"}, 1, "UserChannel9"},
@@ -70,9 +52,11 @@ TEST(TriggerCommand, FetchAcquiresOnTheGivenTrigger) {
     Result r = Invoke(FetchCommand, {"--trigger-level", "1", "--trigger-source", "UserChannel1"});
     ASSERT_EQ(r.rc, 0) << r.out << r.err;
     EXPECT_NE(r.out.find("Channel1"), std::string::npos) << r.out;
-    r = Invoke(FetchCommand, {"--trigger-level", "high"});
-    EXPECT_EQ(r.rc, 2);
-    EXPECT_NE(r.err.find("--trigger-level high"), std::string::npos) << r.err;
+    for (const char* level : {"high", "nan", "inf", "1e999"}) {
+        r = Invoke(FetchCommand, {"--trigger-level", level});
+        EXPECT_EQ(r.rc, 2) << level;
+        EXPECT_NE(r.err.find("--trigger-level"), std::string::npos) << r.err;
+    }
     r = Invoke(FetchCommand, {"--trigger-source", "UserChannel7"});
     EXPECT_EQ(r.rc, 1);
     EXPECT_NE(r.err.find("UserChannel7"), std::string::npos) << r.err;
