@@ -87,7 +87,10 @@ HRESULT Quorlen731XX::ResetBody() {
         hr = QueryInteger(kResetCommand, kResetTimeoutMs, &reply);
         if (FAILED(hr)) return hr;
     }
+    // The instrument's probes are back at their defaults: the remembered
+    // attenuations (automatic sensing among them) no longer hold.
     ResetChildren();
+    Core().external_probe_attenuation = 1.0;
     Cache().InvalidateAll();
     return hr;
 }

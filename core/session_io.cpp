@@ -9,7 +9,7 @@ namespace qn {
 
 // Applies the trace options of DriverSetup and opens the trace file.
 // Tracing never fails Initialize: a file that cannot be written leaves the
-// session untraced.
+// session untraced, with tracing switched off so that TraceEnabled tells.
 HRESULT Quorlen731XX::StartTracing() {
     const TraceSettings& t = Core().session.trace;
     CTraceOwner& tracer = Core().tracer;
@@ -22,7 +22,8 @@ HRESULT Quorlen731XX::StartTracing() {
     if (t.enabled_given || tracer.GetEnabled()) {
         if (FAILED(tracer.SetEnabled(t.enabled))) return S_OK;
     }
-    if (tracer.GetEnabled() && !tracer.IsRecording()) tracer.StartSessionTracing();
+    if (tracer.GetEnabled() && !tracer.IsRecording() && FAILED(tracer.StartSessionTracing()))
+        tracer.SetEnabled(false);
     return S_OK;
 }
 

@@ -66,7 +66,12 @@ HRESULT Quorlen731XX::IQuorlen731XXSystem_put_TraceEnabled_Body(VARIANT_BOOL val
     HRESULT hr = tracer.SetEnabled(true);
     if (FAILED(hr)) return hr;
     hr = tracer.StartSessionTracing();
-    return FAILED(hr) ? hr : S_OK;
+    if (FAILED(hr)) {
+        // A file that cannot be written leaves tracing off, as it reads.
+        tracer.SetEnabled(false);
+        return hr;
+    }
+    return S_OK;
 }
 
 HRESULT Quorlen731XX::IQuorlen731XXSystem_get_AsyncEventsEnabled_Body(VARIANT_BOOL*) {

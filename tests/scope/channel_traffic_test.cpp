@@ -79,6 +79,14 @@ TEST_F(ChannelTraffic, AutomaticProbeSensingSendsNothing) {
     // The sensed value is not remembered as an attenuation.
     io_->Expect(":CHAN1:PROB?\n", "100\n");
     EXPECT_EQ(User(1)->get_ProbeSense(&attenuation), S_OK);
+
+    // Reset puts the instrument's probe back at its default: automatic
+    // sensing is no longer remembered, the instrument is asked.
+    EXPECT_EQ(Ivi(1)->put_ProbeAttenuation(-1.0), S_OK);
+    io_->Expect("*RST;*OPC?\n", "1\n").Expect(":CHAN1:PROB?\n", "1\n");
+    EXPECT_EQ(driver_->Reset(), S_OK);
+    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
+    EXPECT_EQ(attenuation, 1.0);
 }
 
 TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {

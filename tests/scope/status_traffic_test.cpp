@@ -3,6 +3,7 @@
 // against the strict scripted provider.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <deque>
 
 #include "Quorlen731XXErrors.h"
@@ -252,6 +253,20 @@ TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEven
     IviScopeAcquisitionStatusEnum cs = IviScopeAcqStatusUnknown;
     EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver_.get())->Status(&cs), S_OK);
     EXPECT_EQ(cs, IviScopeAcqComplete);
+}
+
+TEST_F(StatusTraffic, DigitizeIsSentWithoutAStatusCheck) {
+    Open(kProtected, "QueryInstrStatus=true");
+    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n")
+        .Expect("*ESE?\n", "36\n").Expect("*ESE 1\n").Expect(":DIG;*OPC\n");
+    EXPECT_EQ(Measurements()->Initiate(), S_OK);
+    // The commands before it are checked; a status query after it would
+    // read and clear the operation-complete event that ends the acquisition.
+    const std::vector<std::string>& sent = io_->Written();
+    const auto ese = std::find(sent.begin(), sent.end(), "*ESE 1\n");
+    ASSERT_NE(ese, sent.end());
+    EXPECT_EQ(*std::next(ese), "*ESR?\n");
+    EXPECT_EQ(sent.back(), ":DIG;*OPC\n");
 }
 
 TEST_F(StatusTraffic, AbortEndsAPendingAcquisition) {

@@ -272,6 +272,12 @@ TEST_F(SystemTraffic, AutomaticExternalProbeSensingIsRememberedWithoutIo) {
     EXPECT_EQ(External()->put_ProbeAttenuation(-1.5), S_OK);
     EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
     EXPECT_EQ(v, -1.5);
+    // Reset forgets automatic sensing, as it does for the channels.
+    EXPECT_EQ(External()->put_ProbeAttenuation(-1.0), S_OK);
+    io_->Expect("*RST;*OPC?\n", "1\n").Expect(":EXT:PROB?\n", "1\n");
+    EXPECT_EQ(driver_->Reset(), S_OK);
+    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
+    EXPECT_EQ(v, 1.0);
 }
 
 TEST_F(SystemTraffic, ExternalUnitsTokens) {
@@ -439,6 +445,23 @@ TEST(SystemTracing, SwitchingTracingOffKeepsWhatWasRecorded) {
     const std::string xml((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
     EXPECT_NE(xml.find("DisableLocalControls"), std::string::npos);
     std::remove(path.c_str());
+}
+
+TEST(SystemTracing, AnUnwritableTraceFileLeavesTracingOffAndSaysSo) {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=QDS4032A,Trace=true,"
+                       "TraceName=/nonexistent/qn-dir/trace");
+    // The session starts: a test program runs without its trace.
+    ASSERT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    IQuorlen731XXSystem* s = driver.get();
+    VARIANT_BOOL on = VARIANT_TRUE;
+    EXPECT_EQ(s->get_TraceEnabled(&on), S_OK);
+    EXPECT_EQ(on, VARIANT_FALSE);
+    EXPECT_TRUE(FAILED(s->put_TraceEnabled(VARIANT_TRUE)));
+    EXPECT_EQ(s->get_TraceEnabled(&on), S_OK);
+    EXPECT_EQ(on, VARIANT_FALSE);
+    EXPECT_EQ(driver->Close(), S_OK);
 }
 
 }  // namespace

@@ -32,6 +32,7 @@ TEST(TraceValue, EveryVariantTypeByValue) {
         {Make(VT_I4, 0xFFFFFFFD), "-3"},
         {Make(VT_INT, 42), "42"},
         {Make(VT_UI4, 4000000000u), "4000000000"},
+        {Make(VT_UINT, 4000000001u), "4000000001"},
         {Make(VT_I8, 0xFFFFFFFFFFFFFFFFull), "-1"},
         {Make(VT_UI8, 0xFFFFFFFFFFFFFFFFull), "18446744073709551615"},
         {com::Variant::Double(0.1), "0.1"},
