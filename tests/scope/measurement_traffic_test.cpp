@@ -64,8 +64,8 @@ TEST_F(MeasurementTraffic, EachFormPutsItsParametersIntoTheQuery) {
         {Quorlen731XXMeasurementTimeOfEdge, ":MEAS:TEDG? -2, CHAN2\n", "-4E-6\n", -4e-6, S_OK},
         {Quorlen731XXMeasurementTimeAtValue,
          ":MEAS:TVAL? -0.123456789012345, 3, CHAN2\n", "1\n", 1.0, S_OK},
-        {Quorlen731XXMeasurementValueAtTime, ":MEAS:VTIM? -1.5e-06,CHAN2\n", "-0.25\n", -0.25,
-         S_OK},
+        {Quorlen731XXMeasurementValueAtTime, ":MEAS:VTIM? -1.23456789012346e-06,CHAN2\n",
+         "-0.25\n", -0.25, S_OK},
     };
     ComPtr<IQuorlen731XXMeasurement> m = Meas("UserChannel2");
     auto run = [&](const Case& c) {
@@ -82,7 +82,7 @@ TEST_F(MeasurementTraffic, EachFormPutsItsParametersIntoTheQuery) {
     EXPECT_EQ(Conf()->put_TimeAtEdgeSlope(Quorlen731XXMeasurementSlopeNegative), S_OK);
     EXPECT_EQ(Conf()->put_TimeAtValueOccurrence(3), S_OK);
     EXPECT_EQ(Conf()->put_TimeAtValueValue(-0.123456789012345), S_OK);
-    EXPECT_EQ(Conf()->put_ValueAtTimeTime(-1.5e-6), S_OK);
+    EXPECT_EQ(Conf()->put_ValueAtTimeTime(-1.2345678901234567e-6), S_OK);
     for (const Case& c : configured) run(c);
 }
 

@@ -377,6 +377,26 @@ TEST_F(TriggerSettings, GlitchReadsStoreTheInstrumentsSettings) {
     EXPECT_EQ(Glitch()->put_condition(Quorlen731XXGlitchGreaterThan), S_OK);
 }
 
+// Every edge slope goes out as its own token and is read back from it.
+TEST_F(TriggerSettings, EdgeSlopesTravelAsTheirTokens) {
+    Open("73142A");
+    Expect({":TRIG:SLOP POS", ":TRIG:MODE EDGE"});
+    ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerEdge), S_OK);
+    const std::pair<Quorlen731XXTriggerSlopeEnum, std::string> slopes[] = {
+        {Quorlen731XXTriggerSlopeNegative, "NEG"},
+        {Quorlen731XXTriggerSlopePositive, "POS"},
+        {Quorlen731XXTriggerSlopeEither, "EITH"},
+        {Quorlen731XXTriggerSlopeAlternate, "ALT"}};
+    for (const auto& [slope, token] : slopes) {
+        SCOPED_TRACE(token);
+        Expect({(":TRIG:SLOP " + token).c_str(), (":TRIG:EDGE:SLOP?|" + token).c_str()});
+        EXPECT_EQ(Edge()->put_Slope(slope), S_OK);
+        Quorlen731XXTriggerSlopeEnum read{};
+        EXPECT_EQ(Edge()->get_Slope(&read), S_OK);
+        EXPECT_EQ(read, slope);
+    }
+}
+
 TEST_F(TriggerSettings, SimulatedSessionsKeepTheirValuesWithoutIo) {
     Open("73142A");
     ASSERT_EQ(driver_->put_Simulate(VARIANT_TRUE), S_OK);
