@@ -20,27 +20,33 @@
 
 namespace qn::visa::test {
 
+// A listening loopback socket on a free port (stored in *port).
+inline int ListenLoopback(std::uint16_t* port, int backlog = 4) {
+    const int fd = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    sockaddr_in a{};
+    a.sin_family = AF_INET;
+    a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    ::bind(fd, reinterpret_cast<sockaddr*>(&a), sizeof a);
+    ::listen(fd, backlog);
+    socklen_t len = sizeof a;
+    ::getsockname(fd, reinterpret_cast<sockaddr*>(&a), &len);
+    *port = ntohs(a.sin_port);
+    return fd;
+}
+
+inline std::string SocketResource(std::uint16_t port) {
+    return "TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET";
+}
+
 class LoopbackPeer {
   public:
-    LoopbackPeer() {
-        listen_fd_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        ::bind(listen_fd_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        ::listen(listen_fd_, 4);
-        socklen_t len = sizeof a;
-        ::getsockname(listen_fd_, reinterpret_cast<sockaddr*>(&a), &len);
-        port_ = ntohs(a.sin_port);
-    }
+    LoopbackPeer() { listen_fd_ = ListenLoopback(&port_); }
     ~LoopbackPeer() {
         if (thread_.joinable()) thread_.join();
         ::close(listen_fd_);
     }
 
-    std::string Resource() const {
-        return "TCPIP0::127.0.0.1::" + std::to_string(port_) + "::SOCKET";
-    }
+    std::string Resource() const { return SocketResource(port_); }
 
     LoopbackPeer& Expect(std::string bytes) { return Add({Step::kExpect, std::move(bytes), 0, 0}); }
     // Sends data in pieces of chunk bytes (0: at once), pausing gap_ms between.
@@ -145,7 +151,7 @@ class LoopbackPeer {
     }
 
     int listen_fd_ = -1;
-    unsigned short port_ = 0;
+    std::uint16_t port_ = 0;
     std::vector<Step> steps_;
     std::vector<std::promise<void>> signals_;
     std::thread thread_;

@@ -253,14 +253,12 @@ TEST(SocketSessionTest, OpenFailuresAreCleanAndExplained) {
 // A listener whose accept queue is full never completes a handshake: the
 // open must give up by its open timeout.
 TEST(SocketSessionTest, ConnectionThatNeverCompletesTimesOut) {
-    int lfd = ::socket(AF_INET, SOCK_STREAM, 0);
+    std::uint16_t port = 0;
+    const int lfd = ListenLoopback(&port, 0);
     sockaddr_in a{};
     a.sin_family = AF_INET;
     a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    ::bind(lfd, reinterpret_cast<sockaddr*>(&a), sizeof a);
-    ::listen(lfd, 0);
-    socklen_t len = sizeof a;
-    ::getsockname(lfd, reinterpret_cast<sockaddr*>(&a), &len);
+    a.sin_port = htons(port);
     std::vector<int> fillers;
     for (int i = 0; i < 4; ++i) {
         int f = ::socket(AF_INET, SOCK_STREAM | SOCK_NONBLOCK, 0);
@@ -268,9 +266,7 @@ TEST(SocketSessionTest, ConnectionThatNeverCompletesTimesOut) {
         fillers.push_back(f);
     }
     ComPtr<IVisaSession> session;
-    const std::string resource =
-        "TCPIP0::127.0.0.1::" + std::to_string(ntohs(a.sin_port)) + "::SOCKET";
-    EXPECT_EQ(OpenResource(resource, 300, &session), E_VISA_RESOURCE_NOT_FOUND);
+    EXPECT_EQ(OpenResource(SocketResource(port), 300, &session), E_VISA_RESOURCE_NOT_FOUND);
     EXPECT_NE(ThreadErrorText().find("timed out"), std::string::npos);
     for (int f : fillers) ::close(f);
     ::close(lfd);

@@ -14,6 +14,7 @@
 #include "platform/visa/onc_rpc.h"
 #include "platform/visa/visa.h"
 #include "platform/visa/vxi11_protocol.h"
+#include "tests/platform/visa/loopback_peer.h"
 #include "tests/platform/visa/visa_test_util.h"
 
 namespace qn::visa::test {
@@ -104,15 +105,7 @@ class RpcPeer {
     using Script = std::function<std::string(const rpc::CallHeader&, std::string_view)>;
 
     explicit RpcPeer(Script script) : script_(std::move(script)) {
-        listen_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        ::bind(listen_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        ::listen(listen_, 4);
-        socklen_t len = sizeof a;
-        ::getsockname(listen_, reinterpret_cast<sockaddr*>(&a), &len);
-        port_ = ntohs(a.sin_port);
+        listen_ = ListenLoopback(&port_);
         [[maybe_unused]] int rc = ::pipe(wake_);
         thread_ = std::thread([this] { Run(); });
     }
