@@ -1,5 +1,6 @@
 // The emulator's servers: listeners, one thread per connection, the shared instrument and the
-// fault injection. The VXI-11 and portmapper protocols are in emulator_vxi11.cpp.
+// fault injection. The VXI-11 and portmapper protocols are in emulator_vxi11.cpp, HiSLIP in
+// emulator_hislip.cpp.
 #include "emulator/emulator.h"
 
 #include <arpa/inet.h>
@@ -100,6 +101,10 @@ std::uint16_t Emulator::Start(std::uint16_t port) {
             listeners_.push_back({Server::kVxi11Abort, Listen(0, SOCK_STREAM)});
             abort_port_ = BoundPort(listeners_.back().fd);
         }
+        if (hislip_sessions_) {
+            listeners_.push_back({Server::kHislip, Listen(0, SOCK_STREAM)});
+            hislip_port_ = BoundPort(listeners_.back().fd);
+        }
         if (portmapper_) {
             listeners_.push_back({Server::kPortmapper, Listen(*portmapper_, SOCK_STREAM)});
             portmapper_port_ = BoundPort(listeners_.back().fd);
@@ -169,6 +174,7 @@ void Emulator::Spawn(Server server, int client) {
                                 case Server::kVxi11Core: ServeVxi11(client, false); break;
                                 case Server::kVxi11Abort: ServeVxi11(client, true); break;
                                 case Server::kPortmapper: ServePortmapper(client); break;
+                                case Server::kHislip: ServeHislip(client); break;
                             }
                             ::close(client);
                             *done = true;

@@ -2,6 +2,7 @@
 //
 //   qn::emu::Emulator emu("QDS2014A");
 //   emu.EnableVxi11();                        // optional, before Start
+//   emu.EnableHislip();                       // optional: TCPIP0::127.0.0.1::hislip0,<emu.hislip_port()>::INSTR
 //   std::uint16_t port = emu.Start();        // raw socket on 127.0.0.1, ephemeral port
 //   ... connect to TCPIP0::127.0.0.1::<port>::SOCKET, messages end with "\n" ...
 //   ... or TCPIP0::127.0.0.1:<emu.vxi11_port()>::inst0::INSTR ...
@@ -32,6 +33,8 @@ namespace qn::emu {
 
 class Instrument;
 class MessageFramer;
+struct HislipSession;
+struct HislipSessions;
 
 class Emulator {
   public:
@@ -49,6 +52,8 @@ class Emulator {
     // the VXI-11 core channel is; it needs EnableVxi11.
     void EnableVxi11();
     void EnablePortmapper(std::uint16_t port);
+    // HiSLIP: both channels of a session on one ephemeral port (hislip_port()).
+    void EnableHislip();
     // Connections quiet for this long are closed (0: never, the default).
     void SetIdleTimeout(std::chrono::milliseconds idle);
 
@@ -62,6 +67,7 @@ class Emulator {
     std::uint16_t vxi11_port() const { return vxi11_port_; }
     std::uint16_t abort_port() const { return abort_port_; }
     std::uint16_t portmapper_port() const { return portmapper_port_; }
+    std::uint16_t hislip_port() const { return hislip_port_; }
     const std::string& model() const { return model_; }
 
     // Appends every received message to `path`, one per line (opened in append mode).
@@ -112,7 +118,7 @@ class Emulator {
         std::shared_ptr<const std::string> waveform_data;
         std::uint8_t forced_events = 0;
     };
-    enum class Server { kRaw, kVxi11Core, kVxi11Abort, kPortmapper };
+    enum class Server { kRaw, kVxi11Core, kVxi11Abort, kPortmapper, kHislip };
     struct Listener {
         Server server;
         int fd;
@@ -130,6 +136,9 @@ class Emulator {
     void ServeVxi11(int client, bool abort_channel);
     void ServePortmapper(int client);
     void AnswerPortmapperDatagram(int fd);
+    void ServeHislip(int client);
+    void ServeHislipSync(int client, HislipSession& session);
+    void ServeHislipAsync(int client, HislipSession& session);
     bool HandleMessage(const std::string& message);  // false: close the link
     std::string ProduceReply();                      // instrument_mutex_ held
     void LogLocked(const std::string& message);      // mutex_ held
@@ -138,7 +147,8 @@ class Emulator {
     std::unique_ptr<Instrument> instrument_;
     std::mutex instrument_mutex_;  // one message group at a time
     std::uint16_t port_ = 0;
-    std::uint16_t vxi11_port_ = 0, abort_port_ = 0, portmapper_port_ = 0;
+    std::uint16_t vxi11_port_ = 0, abort_port_ = 0, portmapper_port_ = 0, hislip_port_ = 0;
+    std::shared_ptr<HislipSessions> hislip_sessions_;  // set by EnableHislip
     bool vxi11_ = false;
     std::optional<std::uint16_t> portmapper_;
     std::chrono::milliseconds idle_{0};

@@ -1,10 +1,11 @@
-// qn731xx-emulator --model MODEL [--port N] [--vxi11 [--portmapper [PORT]]] [--idle-timeout MS]
-//                  [--log FILE]
+// qn731xx-emulator --model MODEL [--port N] [--vxi11 [--portmapper [PORT]]] [--hislip]
+//                  [--idle-timeout MS] [--log FILE]
 //
 // Serves the emulated instrument on 127.0.0.1 until SIGINT or SIGTERM. The first line on
 // standard output is "listening on 127.0.0.1:PORT" (the raw socket), so that a script can start
 // it with port 0 and read the port actually bound; then one line per other server:
-// "vxi11 listening on 127.0.0.1:PORT" and "portmapper listening on 127.0.0.1:PORT".
+// "vxi11 listening on 127.0.0.1:PORT", "portmapper listening on 127.0.0.1:PORT" and
+// "hislip listening on 127.0.0.1:PORT".
 #include <chrono>
 #include <csignal>
 #include <cstdio>
@@ -22,6 +23,7 @@ struct Arguments {
     long port = 0;
     std::string log;
     bool vxi11 = false;
+    bool hislip = false;
     long portmapper = -1;  // -1: none
     long idle_ms = 0;
 };
@@ -30,7 +32,7 @@ int Usage(const char* message) {
     std::fprintf(
         stderr,
         "qn731xx-emulator: %s\nusage: qn731xx-emulator --model MODEL [--port N] [--vxi11 "
-        "[--portmapper [PORT]]] [--idle-timeout MS] [--log FILE]\n",
+        "[--portmapper [PORT]]] [--hislip] [--idle-timeout MS] [--log FILE]\n",
         message);
     return 2;
 }
@@ -53,6 +55,10 @@ int main(int argc, char** argv) {
         const std::string_view flag = argv[i];
         if (flag == "--vxi11") {
             args.vxi11 = true;
+            continue;
+        }
+        if (flag == "--hislip") {
+            args.hislip = true;
             continue;
         }
         if (flag == "--portmapper") {
@@ -91,6 +97,7 @@ int main(int argc, char** argv) {
         qn::emu::Emulator emulator(args.model);
         if (!args.log.empty()) emulator.SetLogFile(args.log);
         if (args.vxi11) emulator.EnableVxi11();
+        if (args.hislip) emulator.EnableHislip();
         if (args.portmapper >= 0)
             emulator.EnablePortmapper(static_cast<std::uint16_t>(args.portmapper));
         emulator.SetIdleTimeout(std::chrono::milliseconds(args.idle_ms));
@@ -102,6 +109,9 @@ int main(int argc, char** argv) {
         if (args.portmapper >= 0)
             std::printf("portmapper listening on 127.0.0.1:%u\n",
                         static_cast<unsigned>(emulator.portmapper_port()));
+        if (args.hislip)
+            std::printf("hislip listening on 127.0.0.1:%u\n",
+                        static_cast<unsigned>(emulator.hislip_port()));
         std::fflush(stdout);
         int signal = 0;
         sigwait(&stop_signals, &signal);
