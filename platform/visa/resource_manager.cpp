@@ -41,6 +41,7 @@ struct TransportKind {
 constexpr TransportKind kTransports[] = {
     {kInterfaceTcpip, "SOCKET", Any, OpenSocketTransport},
     {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport},
+    {kInterfaceTcpip, "INSTR", IsHislip, OpenHislipTransport},
 };
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {

@@ -5,7 +5,8 @@
 //
 //   TCPIP[n]::host::port::SOCKET
 //   TCPIP[n]::host[:port][::device][::INSTR]   device defaults to "inst0"; port:
-//                                              the VXI-11 core channel, else the portmapper's
+//                                              the VXI-11 core channel, else the portmapper's;
+//                                              device "hislip<n>[,port]": HiSLIP (port 4880)
 //   ASRL[n][::INSTR]  and  ASRL/dev/path[::INSTR]
 //   USB[n]::vid::pid::serial[::interface][::INSTR]   vid, pid: 0x hex or decimal
 //   GPIB[n]::primary[::secondary][::INSTR]     addresses 0..30

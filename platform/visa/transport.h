@@ -61,4 +61,11 @@ HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
 HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
                            std::unique_ptr<Transport>* out, std::string* error);
 
+// The HiSLIP transport (hislip_transport.cpp): both channels of a TCPIP
+// INSTR resource whose device name is hislip<n>; the port is the one after a
+// comma in the device name ("hislip0,4881"), else the one after the host,
+// else 4880.
+HRESULT OpenHislipTransport(const ResourceName& name, LONG open_timeout_ms,
+                            std::unique_ptr<Transport>* out, std::string* error);
+
 }  // namespace qn::visa

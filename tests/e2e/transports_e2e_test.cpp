@@ -13,7 +13,7 @@
 namespace qn::test {
 namespace {
 
-enum class Transport { kSocket, kVxi11 };
+enum class Transport { kSocket, kVxi11, kHislip };
 
 std::string ErrorText() {
     com::ErrorRecord rec;
@@ -25,11 +25,21 @@ class FlowOverTransport : public ::testing::TestWithParam<Transport> {
     void SetUp() override {
         ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
         emu_.EnableVxi11();
+        emu_.EnableHislip();
         const std::uint16_t raw = emu_.Start();
-        resource_ = GetParam() == Transport::kSocket
-                        ? "TCPIP0::127.0.0.1::" + std::to_string(raw) + "::SOCKET"
-                        : "TCPIP0::127.0.0.1:" + std::to_string(emu_.vxi11_port()) +
-                              "::inst0::INSTR";
+        switch (GetParam()) {
+            case Transport::kSocket:
+                resource_ = "TCPIP0::127.0.0.1::" + std::to_string(raw) + "::SOCKET";
+                break;
+            case Transport::kVxi11:
+                resource_ = "TCPIP0::127.0.0.1:" + std::to_string(emu_.vxi11_port()) +
+                            "::inst0::INSTR";
+                break;
+            case Transport::kHislip:
+                resource_ = "TCPIP0::127.0.0.1::hislip0," + std::to_string(emu_.hislip_port()) +
+                            "::INSTR";
+                break;
+        }
     }
     emu::Emulator emu_{"QDS4032A"};
     std::string resource_;
@@ -73,9 +83,15 @@ TEST_P(FlowOverTransport, IdentifyConfigureCaptureFetchMeasure) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Transports, FlowOverTransport,
-                         ::testing::Values(Transport::kSocket, Transport::kVxi11),
+                         ::testing::Values(Transport::kSocket, Transport::kVxi11,
+                                           Transport::kHislip),
                          [](const auto& p) {
-                             return p.param == Transport::kSocket ? "Socket" : "Vxi11";
+                             switch (p.param) {
+                                 case Transport::kSocket: return "Socket";
+                                 case Transport::kVxi11: return "Vxi11";
+                                 case Transport::kHislip: return "Hislip";
+                             }
+                             return "Unknown";
                          });
 
 }  // namespace
