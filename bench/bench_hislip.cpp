@@ -13,9 +13,11 @@ std::string HislipResource() {
            "::INSTR";
 }
 
-void BM_Idn_Socket(benchmark::State& s) { IdnCase(s, SocketResource(TheEmulator().port()), true); }
+std::string Socket() { return SocketResource(TheEmulator().port()); }
+
+void BM_Idn_Socket(benchmark::State& s) { IdnCase(s, Socket(), true); }
 void BM_Idn_Hislip(benchmark::State& s) { IdnCase(s, HislipResource(), false); }
-void BM_Block_Socket(benchmark::State& s) { BlockCase(s, SocketResource(TheEmulator().port()), true); }
+void BM_Block_Socket(benchmark::State& s) { BlockCase(s, Socket(), true); }
 void BM_Block_Hislip(benchmark::State& s) { BlockCase(s, HislipResource(), false); }
 
 BENCHMARK(BM_Idn_Socket)->UseRealTime()->Repetitions(7)->ReportAggregatesOnly(true);

@@ -18,9 +18,11 @@ std::string Vxi11Resource() {
     return "TCPIP0::127.0.0.1:" + std::to_string(TheEmulator().vxi11_port()) + "::inst0::INSTR";
 }
 
-void BM_Idn_Socket(benchmark::State& s) { IdnCase(s, SocketResource(TheEmulator().port()), true); }
+std::string Socket() { return SocketResource(TheEmulator().port()); }
+
+void BM_Idn_Socket(benchmark::State& s) { IdnCase(s, Socket(), true); }
 void BM_Idn_Vxi11(benchmark::State& s) { IdnCase(s, Vxi11Resource(), false); }
-void BM_Block_Socket(benchmark::State& s) { BlockCase(s, SocketResource(TheEmulator().port()), true); }
+void BM_Block_Socket(benchmark::State& s) { BlockCase(s, Socket(), true); }
 void BM_Block_Vxi11(benchmark::State& s) { BlockCase(s, Vxi11Resource(), false); }
 
 BENCHMARK(BM_Idn_Socket)->UseRealTime()->Repetitions(7)->ReportAggregatesOnly(true);
