@@ -18,12 +18,22 @@ std::string Vxi11Resource() {
     return "TCPIP0::127.0.0.1:" + std::to_string(TheEmulator().vxi11_port()) + "::inst0::INSTR";
 }
 
-std::string Socket() { return SocketResource(TheEmulator().port()); }
+std::string Socket() {
+    return SocketResource(TheEmulator().port());
+}
 
-void BM_Idn_Socket(benchmark::State& s) { IdnCase(s, Socket(), true); }
-void BM_Idn_Vxi11(benchmark::State& s) { IdnCase(s, Vxi11Resource(), false); }
-void BM_Block_Socket(benchmark::State& s) { BlockCase(s, Socket(), true); }
-void BM_Block_Vxi11(benchmark::State& s) { BlockCase(s, Vxi11Resource(), false); }
+void BM_Idn_Socket(benchmark::State& s) {
+    IdnCase(s, Socket(), true);
+}
+void BM_Idn_Vxi11(benchmark::State& s) {
+    IdnCase(s, Vxi11Resource(), false);
+}
+void BM_Block_Socket(benchmark::State& s) {
+    BlockCase(s, Socket(), true);
+}
+void BM_Block_Vxi11(benchmark::State& s) {
+    BlockCase(s, Vxi11Resource(), false);
+}
 
 BENCHMARK(BM_Idn_Socket)->UseRealTime()->Repetitions(7)->ReportAggregatesOnly(true);
 BENCHMARK(BM_Idn_Vxi11)->UseRealTime()->Repetitions(7)->ReportAggregatesOnly(true);
@@ -33,7 +43,7 @@ BENCHMARK(BM_Block_Vxi11)->UseRealTime()->Repetitions(7)->ReportAggregatesOnly(t
 }  // namespace
 
 int main(int argc, char** argv) {
-    return qn::bench::RunWithRatios(argc, argv,
-                                    {{"BM_Idn_Vxi11", "BM_Idn_Socket"},
-                                     {"BM_Block_Vxi11", "BM_Block_Socket", 1.5}});
+    return qn::bench::RunWithRatios(
+        argc, argv,
+        {{"BM_Idn_Vxi11", "BM_Idn_Socket"}, {"BM_Block_Vxi11", "BM_Block_Socket", 1.5}});
 }

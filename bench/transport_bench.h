@@ -70,9 +70,8 @@ inline void BlockCase(benchmark::State& state, const std::string& resource, bool
     for (auto _ : state) {
         LONG written = 0, actual = 0;
         msg->WriteString(query.get(), &written);
-        if (FAILED(direct->ReadIEEEBlockInto(qn::visa::BinaryType_UI1, dst.data(),
-                                             LONG(dst.size()), &actual, VARIANT_FALSE,
-                                             VARIANT_TRUE)))
+        if (FAILED(direct->ReadIEEEBlockInto(qn::visa::BinaryType_UI1, dst.data(), LONG(dst.size()),
+                                             &actual, VARIANT_FALSE, VARIANT_TRUE)))
             state.SkipWithError("block read failed");
     }
     state.SetBytesProcessed(state.iterations() * std::int64_t(kBlockBytes));

@@ -62,7 +62,7 @@ Got ReadHeader(const Emulator& emu, int fd, Header* h) {
     char raw[kHeaderSize];
     if (!RecvExact(emu, fd, raw, sizeof raw)) return Got::kClosed;
     return DecodeHeader(reinterpret_cast<const std::uint8_t*>(raw), h) ? Got::kHeader
-                                                                      : Got::kBadPrologue;
+                                                                       : Got::kBadPrologue;
 }
 
 // Reads a payload of `length` bytes in pieces, handing each to `sink`.
@@ -102,8 +102,7 @@ bool SendReply(const Emulator& emu, int fd, std::string_view reply, std::uint32_
         const std::size_t n =
             static_cast<std::size_t>(std::min<std::uint64_t>(reply.size(), piece_max));
         const bool last = n == reply.size();
-        if (!SendMessage(emu, fd, last ? kDataEnd : kData, 0, id, reply.substr(0, n)))
-            return false;
+        if (!SendMessage(emu, fd, last ? kDataEnd : kData, 0, id, reply.substr(0, n))) return false;
         reply.remove_prefix(n);
     } while (!reply.empty());
     return true;

@@ -33,10 +33,8 @@ constexpr std::string_view kTypeNames[] = {
 };
 
 constexpr const char* kErrorTexts[] = {
-    "unidentified error",
-    "unrecognized message type",
-    "unrecognized control code",
-    "unrecognized vendor defined message",
+    "unidentified error",        "unrecognized message type",
+    "unrecognized control code", "unrecognized vendor defined message",
     "message too large",
 };
 

@@ -219,8 +219,8 @@ class Channel {
             head_ = 0;
         }
         std::size_t got = 0;
-        HRESULT hr = RecvSome(fd_.get(), &buf_[tail_], buf_.size() - tail_, deadline, peer_, &got,
-                              error);
+        HRESULT hr =
+            RecvSome(fd_.get(), &buf_[tail_], buf_.size() - tail_, deadline, peer_, &got, error);
         if (FAILED(hr)) return Failed(hr);
         tail_ += got;
         return S_OK;
@@ -269,12 +269,10 @@ class HislipTransport final : public Transport {
     HRESULT NextReply(const Deadline& deadline, Header* h, std::string* error);
     // The next message of type `want` on the asynchronous channel (late
     // responses of timed-out requests dropped).
-    HRESULT NextAsync(std::uint8_t want, const Deadline& deadline, Header* h,
-                      std::string* error);
+    HRESULT NextAsync(std::uint8_t want, const Deadline& deadline, Header* h, std::string* error);
     // Error and FatalError messages, and anything else unexpected, as a
     // failure of the operation.
-    HRESULT Unexpected(Channel& ch, const Header& h, const Deadline& deadline,
-                       std::string* error);
+    HRESULT Unexpected(Channel& ch, const Header& h, const Deadline& deadline, std::string* error);
     HRESULT CheckPayload(Channel& ch, const Header& h, std::uint64_t bound,
                          const Deadline& deadline, std::string* error);
 
@@ -292,9 +290,8 @@ class HislipTransport final : public Transport {
 HRESULT HislipTransport::CheckPayload(Channel& ch, const Header& h, std::uint64_t bound,
                                       const Deadline& deadline, std::string* error) {
     if (h.length <= bound) return S_OK;
-    *error = MessageTypeName(h.type) + " message of " + std::to_string(h.length) +
-             " bytes from " + ch.peer() + " exceeds the " + std::to_string(bound) +
-             " bytes accepted";
+    *error = MessageTypeName(h.type) + " message of " + std::to_string(h.length) + " bytes from " +
+             ch.peer() + " exceeds the " + std::to_string(bound) + " bytes accepted";
     ch.Fatal(kFatalUnidentified, deadline);
     return E_VISA_IO;
 }
@@ -356,11 +353,10 @@ HRESULT HislipTransport::NextAsync(std::uint8_t want, const Deadline& deadline, 
             if (hr == E_VISA_TIMEOUT && owed_[want] < 255) ++owed_[want];
             return hr;
         }
-        const bool response = h->type == kAsyncStatusResponse ||
-                              h->type == kAsyncDeviceClearAcknowledge ||
-                              h->type == kAsyncMaximumMessageSizeResponse ||
-                              h->type == kAsyncLockResponse || h->type == kAsyncLockInfoResponse ||
-                              h->type == kAsyncRemoteLocalResponse;
+        const bool response =
+            h->type == kAsyncStatusResponse || h->type == kAsyncDeviceClearAcknowledge ||
+            h->type == kAsyncMaximumMessageSizeResponse || h->type == kAsyncLockResponse ||
+            h->type == kAsyncLockInfoResponse || h->type == kAsyncRemoteLocalResponse;
         if (response || h->type == kAsyncServiceRequest || h->type == kAsyncInterrupted) {
             hr = CheckPayload(async_, *h, kMaxErrorText, deadline, error);
             if (FAILED(hr)) return hr;
@@ -416,14 +412,14 @@ HRESULT HislipTransport::Open(const std::string& host, std::uint16_t port,
 }
 
 HRESULT HislipTransport::Write(const BYTE* data, std::size_t size, bool send_end,
-                               const Deadline& deadline, std::size_t* written,
-                               std::string* error) {
+                               const Deadline& deadline, std::size_t* written, std::string* error) {
     *written = 0;
     if (size == 0 && !send_end) return S_OK;
     // The unread rest of a reply belongs to an earlier message.
     in_data_ = false;
     do {
-        const std::size_t piece = std::size_t(std::min<std::uint64_t>(size - *written, server_max_));
+        const std::size_t piece =
+            std::size_t(std::min<std::uint64_t>(size - *written, server_max_));
         const bool end = send_end && *written + piece == size;
         const std::uint32_t id = next_id_;
         HRESULT hr = sync_.Send(end ? kDataEnd : kData, rmt_delivered_ ? kRmtDelivered : 0, id,

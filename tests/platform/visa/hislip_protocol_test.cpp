@@ -1,8 +1,8 @@
 // The HiSLIP message codec: the byte layout of each message the client and
 // the emulator exchange, both ways, and headers that are not HiSLIP.
-#include <gtest/gtest.h>
-
 #include "platform/visa/hislip_protocol.h"
+
+#include <gtest/gtest.h>
 
 namespace qn::hislip {
 namespace {
@@ -27,8 +27,7 @@ TEST(HislipCodec, MessagesHaveTheProtocolLayout) {
         {"InitializeResponse: overlapped, session 0x1234", kInitializeResponse, kOverlapMode,
          0x01001234u, "", Bytes({'H', 'S', 1, 1, 0x01, 0x00, 0x12, 0x34, 0, 0, 0, 0, 0, 0, 0, 0})},
         {"Data with RMT-delivered, first message id", kData, kRmtDelivered, kFirstMessageId,
-         "*IDN?",
-         Bytes({'H', 'S', 6, 1, 0xFF, 0xFF, 0xFF, 0x00, 0, 0, 0, 0, 0, 0, 0, 5})},
+         "*IDN?", Bytes({'H', 'S', 6, 1, 0xFF, 0xFF, 0xFF, 0x00, 0, 0, 0, 0, 0, 0, 0, 5})},
         {"DataEnd, id after a wrap", kDataEnd, 0, 0x00000002u, "\n",
          Bytes({'H', 'S', 7, 0, 0, 0, 0, 2, 0, 0, 0, 0, 0, 0, 0, 1})},
         {"AsyncInitialize with the session id", kAsyncInitialize, 0, 0x00001234u, "",
@@ -37,10 +36,10 @@ TEST(HislipCodec, MessagesHaveTheProtocolLayout) {
          EncodeSize(0x0102030405060708ull),
          Bytes({'H', 'S', 15, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 8})},
         {"AsyncStatusQuery names the last id sent", kAsyncStatusQuery, kRmtDelivered,
-         kFirstMessageId - kMessageIdStep,
-         "", Bytes({'H', 'S', 21, 1, 0xFF, 0xFF, 0xFE, 0xFE, 0, 0, 0, 0, 0, 0, 0, 0})},
-        {"AsyncStatusResponse: status byte in the control code", kAsyncStatusResponse, 0x50, 0,
-         "", Bytes({'H', 'S', 22, 0x50, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0})},
+         kFirstMessageId - kMessageIdStep, "",
+         Bytes({'H', 'S', 21, 1, 0xFF, 0xFF, 0xFE, 0xFE, 0, 0, 0, 0, 0, 0, 0, 0})},
+        {"AsyncStatusResponse: status byte in the control code", kAsyncStatusResponse, 0x50, 0, "",
+         Bytes({'H', 'S', 22, 0x50, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0})},
         {"AsyncDeviceClear", kAsyncDeviceClear, 0, 0, "",
          Bytes({'H', 'S', 19, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0})},
         {"DeviceClearComplete", kDeviceClearComplete, 0, 0, "",

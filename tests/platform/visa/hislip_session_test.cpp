@@ -1,7 +1,7 @@
 // HiSLIP sessions: against the emulator's server, and against a scripted
 // server that answers with stale, broken, giant or missing messages.
-#include <gtest/gtest.h>
 #include <arpa/inet.h>
+#include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <poll.h>
 #include <sys/socket.h>
@@ -165,9 +165,7 @@ class HislipPeer {
     void Send(int fd, const std::string& bytes) {
         if (fd >= 0 && !bytes.empty()) ::send(fd, bytes.data(), bytes.size(), MSG_NOSIGNAL);
     }
-    int Accept() {
-        return Wait(listen_) ? ::accept4(listen_, nullptr, nullptr, SOCK_CLOEXEC) : -1;
-    }
+    int Accept() { return Wait(listen_) ? ::accept4(listen_, nullptr, nullptr, SOCK_CLOEXEC) : -1; }
     void Run() {
         Header h;
         std::string payload;
@@ -200,9 +198,10 @@ class HislipPeer {
             if (p[1].revents) {
                 if (!Next(async, &h, &payload)) break;
                 if (h.type == kAsyncMaximumMessageSize)
-                    Send(async,
-                         EncodeMessage(kAsyncMaximumMessageSizeResponse, 0, 0, EncodeSize(server_max_)));
-                if (h.type == kAsyncStatusQuery) Send(async, EncodeMessage(kAsyncStatusResponse, 0x42, 0));
+                    Send(async, EncodeMessage(kAsyncMaximumMessageSizeResponse, 0, 0,
+                                              EncodeSize(server_max_)));
+                if (h.type == kAsyncStatusQuery)
+                    Send(async, EncodeMessage(kAsyncStatusResponse, 0x42, 0));
                 if (h.type == kAsyncDeviceClear)
                     Send(async, EncodeMessage(kAsyncDeviceClearAcknowledge, 0, 0));
             }
@@ -246,14 +245,15 @@ TEST(HislipHostile, BadRepliesFailCleanly) {
          E_VISA_IO, kClosed},
         {"peer closes mid-message",
          [](std::uint32_t id) {
-             return HislipPeer::kThenClose + HislipPeer::Reply(kDataEnd, id, "0123456789").substr(0, 20);
+             return HislipPeer::kThenClose +
+                    HislipPeer::Reply(kDataEnd, id, "0123456789").substr(0, 20);
          },
          E_VISA_CONNECTION_LOST, kClosed},
         {"status response on the synchronous channel",
          [](std::uint32_t) { return EncodeMessage(kAsyncStatusResponse, 0, 0, "xy"); }, E_VISA_IO,
          kUsable},
-        {"unknown message type",
-         [](std::uint32_t) { return EncodeMessage(99, 0, 0, "payload"); }, E_VISA_IO, kUsable},
+        {"unknown message type", [](std::uint32_t) { return EncodeMessage(99, 0, 0, "payload"); },
+         E_VISA_IO, kUsable},
         {"Error", [](std::uint32_t) { return EncodeMessage(kError, 0, 0, "query refused"); },
          E_VISA_IO, kUsable},
         {"FatalError", [](std::uint32_t) { return EncodeMessage(kFatalError, 1, 0, "bye"); },
