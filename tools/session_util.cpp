@@ -23,17 +23,22 @@ int ReportFailure(const std::string& what, HRESULT hr) {
     return 1;
 }
 
-int ReportFailure(Quorlen731XX* driver, const std::string& what, HRESULT hr) {
-    ReportFailure(what, hr);
-    if (hr != E_IVI_INSTRUMENT_STATUS) return 1;
+int PrintInstrumentErrors(Quorlen731XX* driver) {
     // The queue holds a handful of entries; stop at "no error" or a failure.
-    for (int i = 0; i < 10; ++i) {
+    int printed = 0;
+    for (; printed < 10; ++printed) {
         LONG code = 0;
         com::Bstr message;
         if (FAILED(driver->ErrorQuery(&code, message.Out())) || code == 0) break;
         std::fprintf(stderr, "instrument error %ld: %s\n", static_cast<long>(code),
                      message.utf8().c_str());
     }
+    return printed;
+}
+
+int ReportFailure(Quorlen731XX* driver, const std::string& what, HRESULT hr) {
+    ReportFailure(what, hr);
+    if (hr == E_IVI_INSTRUMENT_STATUS) PrintInstrumentErrors(driver);
     return 1;
 }
 

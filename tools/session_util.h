@@ -28,6 +28,10 @@ int ReportFailure(const std::string& what, HRESULT hr);
 // check), also prints the instrument's error queue as the driver reads it.
 int ReportFailure(Quorlen731XX* driver, const std::string& what, HRESULT hr);
 
+// Prints the instrument's error queue to stderr as the driver reads it;
+// returns the number of errors printed.
+int PrintInstrumentErrors(Quorlen731XX* driver);
+
 // Creates the driver and initializes it from the session options, with the
 // status check on unless --no-status-check (an explicit QueryInstrStatus
 // in --options still wins). Without --resource (and

@@ -200,6 +200,13 @@ int ScpiCommand(std::span<char*> argv) {
         if (FAILED(hr)) return ReportFailure("ReadString", hr);
         reply = r.utf8();
     }
+    // Direct I/O bypasses the driver's status check: ask the instrument
+    // whether it took the command.
+    if (!options.no_status_check && PrintInstrumentErrors(session.driver.get()) > 0) {
+        std::fprintf(stderr, "qn731xx scpi: the instrument reported errors for %s\n",
+                     command.c_str());
+        return 1;
+    }
     if (options.json) {
         Json j = {{"command", command}, {"reply", nullptr}};
         // The reply's own line feed is not part of its text.

@@ -107,6 +107,12 @@ TEST(CommandLine, ARefusedValueFailsWithTheInstrumentsMessageUnlessTheCheckIsOff
     // The instrument kept its record: nothing says that 1000 s was taken.
     EXPECT_NE(OutputObject(unchecked).value("time-per-record", 0.0), 1000.0) << unchecked.out;
 
+    // Direct I/O is checked as well.
+    const Result scpi = Invoke(ScpiCommand, {":TIM:RANG 1000"});
+    EXPECT_EQ(scpi.rc, 1);
+    EXPECT_NE(scpi.err.find("-222: Data out of range"), std::string::npos) << scpi.err;
+    EXPECT_EQ(Invoke(ScpiCommand, {":TIM:RANG 1000", "--no-status-check"}).rc, 0);
+
     // An explicit option in the option string wins over the default.
     const Result off = Invoke(TimebaseCommand, {"--time-per-record", "1000", "--options",
                                                 "QueryInstrStatus=false"});
