@@ -4,6 +4,12 @@ endif()
 if(QN_SANITIZE)
   add_compile_options(-fsanitize=address,undefined -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
   add_link_options(-fsanitize=address,undefined)
+  if(CMAKE_CXX_COMPILER_ID MATCHES "Clang")
+    # A C program linking the C++ driver library needs the C++ half of clang's
+    # UBSan runtime (type checks of dynamic types), which clang links only
+    # into C++ programs unless asked.
+    add_link_options($<$<LINK_LANGUAGE:C>:-fsanitize-link-c++-runtime> $<$<LINK_LANGUAGE:C>:-lstdc++>)
+  endif()
 endif()
 if(QN_TSAN)
   add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
