@@ -1,20 +1,22 @@
-// qn731xx-emulator --model MODEL [--port N] [--vxi11 [--portmapper [PORT]]] [--hislip]
+// qn731xx-emulator --model MODEL [--port N] [--vxi11 [--portmapper [PORT]]] [--hislip] [--serial]
 //                  [--idle-timeout MS] [--log FILE]
 //
 // Serves the emulated instrument on 127.0.0.1 until SIGINT or SIGTERM. The first line on
 // standard output is "listening on 127.0.0.1:PORT" (the raw socket), so that a script can start
 // it with port 0 and read the port actually bound; then one line per other server:
-// "vxi11 listening on 127.0.0.1:PORT", "portmapper listening on 127.0.0.1:PORT" and
-// "hislip listening on 127.0.0.1:PORT".
+// "vxi11 listening on 127.0.0.1:PORT", "portmapper listening on 127.0.0.1:PORT",
+// "hislip listening on 127.0.0.1:PORT" and "serial listening on /dev/pts/N".
 #include <chrono>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
+#include <optional>
 #include <string>
 #include <string_view>
 
 #include "emulator/emulator.h"
+#include "emulator/serial_line.h"
 
 namespace {
 
@@ -24,6 +26,7 @@ struct Arguments {
     std::string log;
     bool vxi11 = false;
     bool hislip = false;
+    bool serial = false;
     long portmapper = -1;  // -1: none
     long idle_ms = 0;
 };
@@ -32,7 +35,7 @@ int Usage(const char* message) {
     std::fprintf(
         stderr,
         "qn731xx-emulator: %s\nusage: qn731xx-emulator --model MODEL [--port N] [--vxi11 "
-        "[--portmapper [PORT]]] [--hislip] [--idle-timeout MS] [--log FILE]\n",
+        "[--portmapper [PORT]]] [--hislip] [--serial] [--idle-timeout MS] [--log FILE]\n",
         message);
     return 2;
 }
@@ -59,6 +62,10 @@ int main(int argc, char** argv) {
         }
         if (flag == "--hislip") {
             args.hislip = true;
+            continue;
+        }
+        if (flag == "--serial") {
+            args.serial = true;
             continue;
         }
         if (flag == "--portmapper") {
@@ -112,9 +119,15 @@ int main(int argc, char** argv) {
         if (args.hislip)
             std::printf("hislip listening on 127.0.0.1:%u\n",
                         static_cast<unsigned>(emulator.hislip_port()));
+        std::optional<qn::emu::SerialLine> line;
+        if (args.serial) {
+            line.emplace(emulator);
+            std::printf("serial listening on %s\n", line->path().c_str());
+        }
         std::fflush(stdout);
         int signal = 0;
         sigwait(&stop_signals, &signal);
+        line.reset();
         emulator.Stop();
     } catch (const std::exception& e) {
         std::fprintf(stderr, "qn731xx-emulator: %s\n", e.what());

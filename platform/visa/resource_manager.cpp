@@ -42,6 +42,7 @@ constexpr TransportKind kTransports[] = {
     {kInterfaceTcpip, "SOCKET", Any, OpenSocketTransport},
     {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport},
     {kInterfaceTcpip, "INSTR", IsHislip, OpenHislipTransport},
+    {kInterfaceAsrl, "INSTR", Any, OpenSerialTransport},
 };
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {

@@ -22,6 +22,68 @@ VARIANT_BOOL Bool(bool b) {
 MessageSession::MessageSession(ResourceName name, std::unique_ptr<Transport> transport)
     : name_(std::move(name)), transport_(std::move(transport)) {}
 
+HRESULT MessageSession::QueryInterface(REFIID riid, void** ppv) {
+    if (riid == iid_of<ISerial> && name_.interface_type != kInterfaceAsrl) {
+        if (ppv) *ppv = nullptr;
+        return ppv ? E_NOINTERFACE : E_POINTER;
+    }
+    return ComObject::QueryInterface(riid, ppv);
+}
+
+template <class T>
+HRESULT MessageSession::GetSerial(T SerialSettings::*field, T* pVal) {
+    if (!pVal) return E_POINTER;
+    std::lock_guard<std::mutex> lock(io_);
+    *pVal = serial_.*field;
+    return S_OK;
+}
+
+template <class T>
+HRESULT MessageSession::PutSerial(T SerialSettings::*field, T val) {
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        if (!transport_) return Closed();
+        SerialSettings next = serial_;
+        next.*field = val;
+        std::string error;
+        HRESULT hr = transport_->ApplySerial(next, &error);
+        if (FAILED(hr)) return Report(hr, kIidMessage, error);
+        serial_ = next;
+        return S_OK;
+    });
+}
+
+HRESULT MessageSession::get_BaudRate(LONG* pVal) {
+    return GetSerial(&SerialSettings::baud_rate, pVal);
+}
+HRESULT MessageSession::put_BaudRate(LONG val) {
+    return PutSerial(&SerialSettings::baud_rate, val);
+}
+HRESULT MessageSession::get_DataBits(SHORT* pVal) {
+    return GetSerial(&SerialSettings::data_bits, pVal);
+}
+HRESULT MessageSession::put_DataBits(SHORT val) {
+    return PutSerial(&SerialSettings::data_bits, val);
+}
+HRESULT MessageSession::get_Parity(SHORT* pVal) {
+    return GetSerial(&SerialSettings::parity, pVal);
+}
+HRESULT MessageSession::put_Parity(SHORT val) {
+    return PutSerial(&SerialSettings::parity, val);
+}
+HRESULT MessageSession::get_StopBits(SHORT* pVal) {
+    return GetSerial(&SerialSettings::stop_bits, pVal);
+}
+HRESULT MessageSession::put_StopBits(SHORT val) {
+    return PutSerial(&SerialSettings::stop_bits, val);
+}
+HRESULT MessageSession::get_FlowControl(SHORT* pVal) {
+    return GetSerial(&SerialSettings::flow_control, pVal);
+}
+HRESULT MessageSession::put_FlowControl(SHORT val) {
+    return PutSerial(&SerialSettings::flow_control, val);
+}
+
 HRESULT MessageSession::Closed() const {
     return Report(E_VISA_INVALID_OBJECT, kIidMessage, "the session is closed");
 }

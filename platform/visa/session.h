@@ -9,6 +9,7 @@
 #include <thread>
 
 #include "platform/visa/resource_name.h"
+#include "platform/visa/serial.h"
 #include "platform/visa/transport.h"
 #include "platform/visa/visa.h"
 
@@ -16,9 +17,12 @@ namespace qn::visa {
 
 class MessageSession final
     : public qn::com::ComObject<MessageSession, IMessage, qn::com::As<IVisaSession, IMessage>,
-                                IMessageDirect> {
+                                IMessageDirect, ISerial> {
   public:
     MessageSession(ResourceName name, std::unique_ptr<Transport> transport);
+
+    // ISerial only for serial resources.
+    HRESULT QueryInterface(REFIID riid, void** ppv) override;
 
     // IVisaSession
     HRESULT get_HardwareInterfaceType(SHORT* pVal) override;
@@ -50,7 +54,26 @@ class MessageSession final
     HRESULT EndOperation() override;
     HRESULT get_HasEnd(VARIANT_BOOL* pVal) override;
 
+    // ISerial
+    HRESULT get_BaudRate(LONG* pVal) override;
+    HRESULT put_BaudRate(LONG val) override;
+    HRESULT get_DataBits(SHORT* pVal) override;
+    HRESULT put_DataBits(SHORT val) override;
+    HRESULT get_Parity(SHORT* pVal) override;
+    HRESULT put_Parity(SHORT val) override;
+    HRESULT get_StopBits(SHORT* pVal) override;
+    HRESULT put_StopBits(SHORT val) override;
+    HRESULT get_FlowControl(SHORT* pVal) override;
+    HRESULT put_FlowControl(SHORT val) override;
+
   private:
+    // Reads or changes one field of the serial settings; a change is applied
+    // to the line first and kept only when the line took it.
+    template <class T>
+    HRESULT GetSerial(T SerialSettings::*field, T* pVal);
+    template <class T>
+    HRESULT PutSerial(T SerialSettings::*field, T val);
+
     // One transport read with the session's settings and deadline; the
     // caller holds io_.
     HRESULT ReadLocked(BYTE* buf, std::size_t count, DWORD flags, const Deadline& deadline,
@@ -68,6 +91,7 @@ class MessageSession final
     std::atomic<bool> send_end_{true};
     std::atomic<bool> term_enabled_{false};
     std::atomic<BYTE> term_char_{'\n'};
+    SerialSettings serial_;  // guarded by io_
 
     std::mutex op_m_;  // guards the open operation below
     std::thread::id op_thread_;

@@ -24,6 +24,15 @@ struct ReadRequest {
     bool return_available = false;  // stop once some data came and no more waits
 };
 
+// Line settings of a serial port, in the units of the VISA serial attributes.
+struct SerialSettings {
+    LONG baud_rate = 9600;
+    SHORT data_bits = 8;     // 5 to 8
+    SHORT parity = 0;        // SerialParity
+    SHORT stop_bits = 10;    // 10: one, 20: two (tenths of a bit)
+    SHORT flow_control = 0;  // SerialFlowControl bits
+};
+
 struct ReadResult {
     std::size_t bytes = 0;        // stored in buf, also on failure
     ReadEnd end = kReadEndCount;  // why the read stopped (on success)
@@ -48,6 +57,11 @@ class Transport {
     virtual void Close() = 0;
     // True when the bus marks the end of a message (END).
     virtual bool HasEnd() const { return false; }
+    // Sets the line of a serial port; other transports have none.
+    virtual HRESULT ApplySerial(const SerialSettings&, std::string* error) {
+        *error = "not a serial line";
+        return E_VISA_NOT_SUPPORTED;
+    }
 };
 
 // The raw-socket transport (socket_transport.cpp): connects to host:port of
@@ -66,6 +80,12 @@ HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
 // comma in the device name ("hislip0,4881"), else the one after the host,
 // else 4880.
 HRESULT OpenHislipTransport(const ResourceName& name, LONG open_timeout_ms,
+                            std::unique_ptr<Transport>* out, std::string* error);
+
+// The serial transport (serial_transport.cpp): the port of an ASRL resource
+// (ASRLn is /dev/ttyS<n-1>, ASRL/dev/path names the device), raw, with the
+// default SerialSettings until ApplySerial changes them.
+HRESULT OpenSerialTransport(const ResourceName& name, LONG open_timeout_ms,
                             std::unique_ptr<Transport>* out, std::string* error);
 
 }  // namespace qn::visa

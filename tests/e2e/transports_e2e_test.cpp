@@ -3,17 +3,29 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <optional>
 #include <vector>
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "emulator/emulator.h"
+#include "emulator/serial_line.h"
 #include "io/io_manager.h"
 
 namespace qn::test {
 namespace {
 
-enum class Transport { kSocket, kVxi11, kHislip };
+enum class Transport { kSocket, kVxi11, kHislip, kSerial };
+
+const char* TransportName(Transport t) {
+    switch (t) {
+        case Transport::kSocket: return "Socket";
+        case Transport::kVxi11: return "Vxi11";
+        case Transport::kHislip: return "Hislip";
+        case Transport::kSerial: return "Serial";
+    }
+    return "Unknown";
+}
 
 std::string ErrorText() {
     com::ErrorRecord rec;
@@ -39,9 +51,14 @@ class FlowOverTransport : public ::testing::TestWithParam<Transport> {
                 resource_ = "TCPIP0::127.0.0.1::hislip0," + std::to_string(emu_.hislip_port()) +
                             "::INSTR";
                 break;
+            case Transport::kSerial:
+                serial_.emplace(emu_);
+                resource_ = "ASRL" + serial_->path() + "::INSTR";
+                break;
         }
     }
     emu::Emulator emu_{"QDS4032A"};
+    std::optional<emu::SerialLine> serial_;
     std::string resource_;
 };
 
@@ -84,15 +101,8 @@ TEST_P(FlowOverTransport, IdentifyConfigureCaptureFetchMeasure) {
 
 INSTANTIATE_TEST_SUITE_P(Transports, FlowOverTransport,
                          ::testing::Values(Transport::kSocket, Transport::kVxi11,
-                                           Transport::kHislip),
-                         [](const auto& p) {
-                             switch (p.param) {
-                                 case Transport::kSocket: return "Socket";
-                                 case Transport::kVxi11: return "Vxi11";
-                                 case Transport::kHislip: return "Hislip";
-                             }
-                             return "Unknown";
-                         });
+                                           Transport::kHislip, Transport::kSerial),
+                         [](const auto& p) { return std::string(TransportName(p.param)); });
 
 }  // namespace
 }  // namespace qn::test
