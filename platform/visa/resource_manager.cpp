@@ -43,6 +43,7 @@ constexpr TransportKind kTransports[] = {
     {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport},
     {kInterfaceTcpip, "INSTR", IsHislip, OpenHislipTransport},
     {kInterfaceAsrl, "INSTR", Any, OpenSerialTransport},
+    {kInterfaceUsb, "INSTR", Any, OpenUsbtmcTransport},
 };
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {

@@ -88,4 +88,10 @@ HRESULT OpenHislipTransport(const ResourceName& name, LONG open_timeout_ms,
 HRESULT OpenSerialTransport(const ResourceName& name, LONG open_timeout_ms,
                             std::unique_ptr<Transport>* out, std::string* error);
 
+// The USBTMC transport (usbtmc_transport.cpp): the usbtmc character device
+// whose USB device has the resource's vendor id, product id, serial number
+// (and interface number, when given).
+HRESULT OpenUsbtmcTransport(const ResourceName& name, LONG open_timeout_ms,
+                            std::unique_ptr<Transport>* out, std::string* error);
+
 }  // namespace qn::visa
