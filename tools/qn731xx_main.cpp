@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "tools/commands.h"
+#include "tools/list_command.h"
 
 namespace {
 
@@ -15,6 +16,8 @@ struct Command {
 };
 
 constexpr Command kCommands[] = {
+    {"list", qn::tools::ListCommand,
+     "print the resources this machine can reach: usbtmc, serial ports, with --lan VXI-11"},
     {"info", qn::tools::InfoCommand,
      "open a session and print its flags, the instrument identity and the option tables"},
     {"fetch", qn::tools::FetchCommand,
