@@ -183,8 +183,8 @@ void BM_Wire_BareReaderConvert(benchmark::State& state) {
     state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 
-// FetchWaveform in a loop, the output array passed back in each time.
-void FetchLoop(benchmark::State& state, const std::string& resource) {
+// FetchWaveform of `points` in a loop, the output array passed back in each time.
+void FetchLoop(benchmark::State& state, const std::string& resource, std::size_t points) {
     DriverSession s(resource);
     if (!s.measurement) {
         state.SkipWithError("cannot open the session");
@@ -196,23 +196,24 @@ void FetchLoop(benchmark::State& state, const std::string& resource) {
         double x0 = 0, dx = 0;
         const HRESULT hr = s.measurement->FetchWaveform(&a, &x0, &dx);
         array = qn::com::SafeArray(a);
-        if (FAILED(hr) || array.size() != std::size_t(state.range(0))) {
+        if (FAILED(hr) || array.size() != points) {
             state.SkipWithError("fetch failed");
             break;
         }
         benchmark::DoNotOptimize(array.data<double>());
     }
-    state.SetItemsProcessed(state.iterations() * state.range(0));
+    state.SetItemsProcessed(state.iterations() * static_cast<long>(points));
 }
 
 void BM_Fetch_DriverLoop(benchmark::State& state) {
-    FetchLoop(state, PeersFor(std::size_t(state.range(0))).server->Resource());
+    const auto points = static_cast<std::size_t>(state.range(0));
+    FetchLoop(state, PeersFor(points).server->Resource(), points);
 }
 
 // The same loop against the emulator serving the prepared record from memory.
 void BM_Fetch_DriverEmulator(benchmark::State& state) {
-    const auto& emu = *PeersFor(std::size_t(state.range(0))).emulator;
-    FetchLoop(state, qn::bench::SocketResource(emu.port()));
+    const auto points = static_cast<std::size_t>(state.range(0));
+    FetchLoop(state, qn::bench::SocketResource(PeersFor(points).emulator->port()), points);
 }
 
 // The first FetchWaveform of a new session into a new array: receive buffer
@@ -263,7 +264,8 @@ void BM_Fetch_Sessions(benchmark::State& state) {
         }
     });
     const auto& emu = *emulators[std::size_t(state.thread_index())];
-    FetchLoop(state, qn::bench::SocketResource(emu.port()));
+    // The sessions have no argument: their record size is fixed.
+    FetchLoop(state, qn::bench::SocketResource(emu.port()), kPoints);
 }
 
 BENCHMARK(BM_ConvertWords)->Arg(1 << 20)->Repetitions(kRepetitions)->ReportAggregatesOnly(true);

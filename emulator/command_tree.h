@@ -25,6 +25,9 @@ struct Call {
     std::vector<int> suffixes;  // numeric suffixes of the "#" mnemonics, in path order
     const std::vector<Argument>* args = nullptr;
     std::string reply;
+    // A reply kept in memory and sent as it is, terminator included, when it is the message's
+    // only reply (no copy of a large block); used instead of `reply` when set.
+    std::shared_ptr<const std::string> prepared;
 
     int suffix(std::size_t i = 0) const { return i < suffixes.size() ? suffixes[i] : 1; }
     std::size_t arg_count() const { return args->size(); }

@@ -250,18 +250,25 @@ void Emulator::ServeRaw(int client) {
         const ssize_t n = ::recv(client, chunk.data(), chunk.size(), 0);
         if (n <= 0) return;  // closed by the client or failed
         framer.Append(std::string_view(chunk.data(), static_cast<std::size_t>(n)));
-        std::string reply;
+        std::shared_ptr<const std::string> reply;
         const bool keep = RunMessages(framer, &reply);
-        if (!reply.empty()) {
+        if (reply && !reply->empty()) {
             const auto delay = reply_delay();
             if (delay.count() > 0 && !SleepInterruptible(delay)) return;
-            if (!SendAll(client, reply)) return;
+            if (!SendAll(client, *reply)) return;
         }
         if (!keep) return;
     }
 }
 
 bool Emulator::RunMessages(MessageFramer& framer, std::string* reply) {
+    std::shared_ptr<const std::string> shared;
+    const bool keep = RunMessages(framer, &shared);
+    if (shared) *reply = *shared;
+    return keep;
+}
+
+bool Emulator::RunMessages(MessageFramer& framer, std::shared_ptr<const std::string>* reply) {
     std::lock_guard lock(instrument_mutex_);
     // All messages that arrived together run before any reply is sent, so a query followed by
     // another message without reading its reply is interrupted (-410).
@@ -301,8 +308,8 @@ bool Emulator::HandleMessage(const std::string& message) {
     return !drop;
 }
 
-std::string Emulator::ProduceReply() {
-    std::string reply = instrument_->TakeOutput();
+std::shared_ptr<const std::string> Emulator::ProduceReply() {
+    std::shared_ptr<const std::string> shared = instrument_->TakeSharedOutput();
     bool garble = false;
     {
         std::lock_guard lock(mutex_);
@@ -311,13 +318,14 @@ std::string Emulator::ProduceReply() {
             garble = true;
         }
     }
-    if (garble) {
-        // High-bit bytes never form a terminator, so the reply keeps its one line feed.
-        for (std::size_t i = 0; i + 1 < reply.size(); ++i) {
-            reply[i] = static_cast<char>((reply[i] ^ 0x5A) | 0x80);
-        }
+    if (!garble) return shared;
+    // Garbled in a copy (a prepared block stays as it is for the next query). High-bit bytes
+    // never form a terminator, so the reply keeps its one line feed.
+    std::string reply = *shared;
+    for (std::size_t i = 0; i + 1 < reply.size(); ++i) {
+        reply[i] = static_cast<char>((reply[i] ^ 0x5A) | 0x80);
     }
-    return reply;
+    return std::make_shared<const std::string>(std::move(reply));
 }
 
 void Emulator::DeviceClear() {
@@ -401,6 +409,8 @@ void Emulator::GarbleReplies(int count) {
 
 void Emulator::ServeWaveformData(std::string raw_bytes) {
     std::lock_guard lock(mutex_);
+    // Kept with its terminator, so that the reply is sent from this string as it is.
+    raw_bytes += '\n';
     faults_.waveform_data = std::make_shared<const std::string>(std::move(raw_bytes));
 }
 

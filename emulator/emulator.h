@@ -94,6 +94,8 @@ class Emulator {
     // Runs the complete messages in `framer` against the instrument, whole; the reply they
     // produced (faults applied) goes to *reply. False: the link is to be closed.
     bool RunMessages(MessageFramer& framer, std::string* reply);
+    // The same, the reply shared rather than copied when it is a prepared block (null: none).
+    bool RunMessages(MessageFramer& framer, std::shared_ptr<const std::string>* reply);
     // Device clear: drops the instrument's pending output.
     void DeviceClear();
     // The status byte, with message available also while reply_waiting (a reply taken from
@@ -140,7 +142,7 @@ class Emulator {
     void ServeHislipSync(int client, HislipSession& session);
     void ServeHislipAsync(int client, HislipSession& session);
     bool HandleMessage(const std::string& message);  // false: close the link
-    std::string ProduceReply();                      // instrument_mutex_ held
+    std::shared_ptr<const std::string> ProduceReply();  // instrument_mutex_ held
     void LogLocked(const std::string& message);      // mutex_ held
 
     std::string model_;

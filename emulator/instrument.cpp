@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <thread>
+#include <utility>
 
 #include "emulator/waveform.h"
 
@@ -37,13 +38,15 @@ Instrument::Instrument(ModelInfo model)
 
 void Instrument::Execute(std::string_view message) {
     Tick();
-    if (!output_.empty()) {
+    if (output_pending()) {
         output_.clear();
+        prepared_output_.reset();
         Error(err::kQueryInterrupted);
     }
     base_ = tree_.root();  // every message starts at the root
     base_suffixes_.clear();
     replies_.clear();
+    prepared_.reset();
     bool stop = false;
     for (std::string_view text : SplitUnits(message)) {
         UnitParse parsed = ParseUnit(text);
@@ -55,6 +58,18 @@ void Instrument::Execute(std::string_view message) {
         if (stop) break;
     }
     if (replies_.empty()) return;
+    if (replies_.size() == 1 && prepared_) {
+        // The message's only reply is prepared with its terminator: queued as it is.
+        prepared_output_ = std::move(prepared_);
+        replies_.clear();
+        return;
+    }
+    if (prepared_) {
+        // Among other replies the prepared one is copied, without its terminator.
+        for (std::string& r : replies_)
+            if (r.empty()) r.assign(*prepared_, 0, prepared_->size() - 1);
+        prepared_.reset();
+    }
     for (std::size_t i = 0; i < replies_.size(); ++i) {
         if (i > 0) output_ += ';';
         output_ += replies_[i];
@@ -84,7 +99,15 @@ void Instrument::ExecuteUnit(const ProgramUnit& unit, bool& stop) {
     call.suffixes.insert(call.suffixes.end(), match.suffixes.begin(), match.suffixes.end());
     call.args = &unit.args;
     handler(*this, call);
-    if (unit.query && !call.reply.empty()) replies_.push_back(std::move(call.reply));
+    if (unit.query && call.prepared && call.prepared->size() > 1 && !prepared_) {
+        // An empty entry stands for the prepared reply until the message ends.
+        prepared_ = std::move(call.prepared);
+        replies_.emplace_back();
+    } else if (unit.query && call.prepared && call.prepared->size() > 1) {
+        replies_.emplace_back(*call.prepared, 0, call.prepared->size() - 1);
+    } else if (unit.query && !call.reply.empty()) {
+        replies_.push_back(std::move(call.reply));
+    }
     if (unit.common) return;  // common commands leave the current path alone
     base_ = match.node->parent;
     base_suffixes_ = call.suffixes;
@@ -93,7 +116,15 @@ void Instrument::ExecuteUnit(const ProgramUnit& unit, bool& stop) {
 
 std::string Instrument::TakeOutput() {
     std::string out;
-    out.swap(output_);
+    if (prepared_output_) out = *std::exchange(prepared_output_, nullptr);
+    else out.swap(output_);
+    return out;
+}
+
+std::shared_ptr<const std::string> Instrument::TakeSharedOutput() {
+    if (prepared_output_) return std::exchange(prepared_output_, nullptr);
+    auto out = std::make_shared<std::string>();
+    out->swap(output_);
     return out;
 }
 

@@ -48,9 +48,11 @@ class Instrument {
     // Executes one message (without its terminator). A reply still in the output queue when
     // the message arrives is discarded with -410, as IEEE 488.2 6.3.2.3 requires.
     void Execute(std::string_view message);
-    bool output_pending() const { return !output_.empty(); }
+    bool output_pending() const { return !output_.empty() || prepared_output_ != nullptr; }
     // The queued reply, terminator included; empties the output queue.
     std::string TakeOutput();
+    // The same, shared rather than copied when it is a prepared reply.
+    std::shared_ptr<const std::string> TakeSharedOutput();
 
     // Services for the command handlers.
     void Error(ScpiError error) { status_.PushError(error); }
@@ -58,7 +60,7 @@ class Instrument {
     ScopeSettings& settings() { return settings_; }
     SystemState& system() { return system_; }
     const ModelInfo& model() const { return model_; }
-    bool message_available() const { return !output_.empty() || !replies_.empty(); }
+    bool message_available() const { return output_pending() || !replies_.empty(); }
     void Reset();
     bool Save(int slot);
     bool Recall(int slot);
@@ -78,14 +80,24 @@ class Instrument {
     // The acquisition count when :ACT last cleared the activity edges.
     std::optional<std::uint32_t>& activity_reset() { return activity_reset_; }
 
-    // Test hook: raw bytes served verbatim as the reply to :WAV:DATA? while set.
-    // Shared, not copied: a large block costs nothing on the other messages.
+    // Test hook: raw bytes served verbatim as the reply to :WAV:DATA? while set, followed by
+    // the terminator (the string holds it as its last byte). Shared, not copied: a large
+    // block costs nothing on the other messages and is sent straight from memory.
     void set_waveform_override(std::shared_ptr<const std::string> bytes) {
         waveform_override_ = std::move(bytes);
     }
     const std::shared_ptr<const std::string>& waveform_override() const {
         return waveform_override_;
     }
+
+    // The encoded :WAV:DATA? reply (terminator included) of the last acquisition, and the
+    // acquisition and transfer settings it was encoded for: a repeated query sends it again
+    // from memory instead of encoding the record afresh.
+    struct EncodedBlock {
+        std::string key;
+        std::shared_ptr<const std::string> reply;
+    };
+    EncodedBlock& encoded_block() { return encoded_block_; }
 
   private:
     using Clock = std::chrono::steady_clock;
@@ -99,7 +111,9 @@ class Instrument {
     SystemState system_;
     std::array<std::optional<ScopeSettings>, kSetupSlots> saved_;
     std::string output_;
+    std::shared_ptr<const std::string> prepared_output_;  // the queued reply when prepared
     std::vector<std::string> replies_;  // replies of the message being executed
+    std::shared_ptr<const std::string> prepared_;  // the message's prepared reply, if any
     const CommandTree::Node* base_ = nullptr;
     std::vector<int> base_suffixes_;
 
@@ -110,6 +124,7 @@ class Instrument {
     AcquiredRecord record_;
     std::uint32_t acquisitions_ = 0;
     std::shared_ptr<const std::string> waveform_override_;
+    EncodedBlock encoded_block_;
     std::array<InputSignal, kMaxAnalogChannels> inputs_;
     std::optional<std::uint32_t> activity_reset_;
 };

@@ -2,6 +2,8 @@
 // block served from the record of the last acquisition.
 #include <array>
 #include <cctype>
+#include <memory>
+#include <string>
 
 #include "emulator/handler_util.h"
 #include "emulator/scope_sources.h"
@@ -100,15 +102,26 @@ void QueryType(Instrument& inst, Call& call) {
 void QueryData(Instrument& inst, Call& call) {
     if (!NoArgs(inst, call)) return;
     if (inst.waveform_override()) {
-        call.reply = *inst.waveform_override();
+        call.prepared = inst.waveform_override();
         return;
     }
-    auto block = EncodeWaveformBlock(inst.settings(), inst.record(), inst.model());
-    if (!block) {
-        inst.Error(err::kSettingsConflict);
-        return;
+    // Everything the encoding depends on: the acquisition that made the record, and the
+    // transfer settings.
+    const ScopeSettings& s = inst.settings();
+    const std::string key = std::to_string(inst.acquisitions()) + ' ' + s.waveform_source + ' ' +
+                            s.waveform_format + ' ' + (s.waveform_unsigned ? '1' : '0') + ' ' +
+                            s.waveform_byte_order + ' ' + std::to_string(s.waveform_points);
+    Instrument::EncodedBlock& cache = inst.encoded_block();
+    if (!cache.reply || cache.key != key) {
+        auto block = EncodeWaveformBlock(s, inst.record(), inst.model());
+        if (!block) {
+            inst.Error(err::kSettingsConflict);
+            return;
+        }
+        block->push_back('\n');
+        cache = {key, std::make_shared<const std::string>(std::move(*block))};
     }
-    call.reply = std::move(*block);
+    call.prepared = cache.reply;
 }
 
 constexpr CommandSpec kWaveform[] = {
