@@ -150,5 +150,42 @@ TEST(EmulatorScope, ServedBlockReplacesWaveformData) {
     EXPECT_EQ(s.client.Query("SYST:ERR?"), R"(-221,"Settings conflict")");
 }
 
+// Waveform blocks are kept in memory and sent again: a kept block must never be altered by a
+// fault applied to one reply, must still combine with other replies of the same message, and
+// must be encoded afresh when the record or the transfer settings change.
+TEST(EmulatorScope, KeptBlocksAreSentUnchangedAndFollowNewRecordsAndSettings) {
+    Session s("QDS4034A");
+    auto& c = s.client;
+    const std::string served("#14\x80\n\x00\xff", 7);
+    s.emu.ServeWaveformData(served);
+    s.emu.GarbleReplies(1);
+    c.Send(":WAV:DATA?");
+    EXPECT_NE(c.ReadBytes(8), served + "\n");
+    c.Send(":WAV:DATA?");
+    EXPECT_EQ(c.ReadBytes(8), served + "\n");  // the garbling hit a copy
+    c.Send(":WAV:DATA?;*OPC?;:WAV:DATA?");
+    EXPECT_EQ(c.ReadBytes(2 * served.size() + 4), served + ";1;" + served + "\n");
+    s.emu.ClearWaveformData();
+
+    c.Send(":CHAN1:RANG 8;OFFS 0;:WAV:SOUR CHAN1;:WAV:POIN 1000;:WAV:FORM WORD;UNS 0;BYT MSBF;:DIG");
+    const std::string first = ReadBlock(c, ":WAV:DATA?");
+    ASSERT_EQ(first.size(), 2000u);
+    struct Step {
+        const char* message;
+        std::size_t size;
+        bool same_as_first;
+    };
+    for (const Step& step : {Step{"", 2000, true}, Step{":WAV:POIN 500", 1000, false},
+                             Step{":WAV:POIN 1000", 2000, true}, Step{":WAV:UNS 1", 2000, false},
+                             Step{":WAV:UNS 0", 2000, true},
+                             Step{":CHAN1:RANG 4;:DIG", 2000, false}}) {
+        if (*step.message) c.Send(step.message);
+        const std::string block = ReadBlock(c, ":WAV:DATA?");
+        EXPECT_EQ(block.size(), step.size) << step.message;
+        EXPECT_EQ(block == first, step.same_as_first) << step.message;
+    }
+    EXPECT_EQ(c.Query("SYST:ERR?"), kNoError);
+}
+
 }  // namespace
 }  // namespace qn::emu
