@@ -197,8 +197,8 @@ void Emulator::ReapWorkers(bool all) {
     for (Worker& w : finished) w.thread.join();
 }
 
-bool Emulator::WaitReadable(int fd) const {
-    const int timeout = idle_.count() > 0 ? static_cast<int>(idle_.count()) : -1;
+bool Emulator::WaitReadable(int fd, bool idle_limit) const {
+    const int timeout = idle_limit && idle_.count() > 0 ? static_cast<int>(idle_.count()) : -1;
     while (!stopping_) {
         pollfd fds[2] = {{fd, POLLIN, 0}, {wake_[0], POLLIN, 0}};
         const int n = ::poll(fds, 2, timeout);

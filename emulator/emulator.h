@@ -104,8 +104,9 @@ class Emulator {
     std::chrono::milliseconds reply_delay() const;
     // Waits up to `duration`; false when the emulator is stopping.
     bool SleepInterruptible(std::chrono::milliseconds duration) const;
-    // Waits until fd is readable (true), the idle timeout passes or the emulator stops.
-    bool WaitReadable(int fd) const;
+    // Waits until fd is readable (true), the idle timeout passes (unless idle_limit is false)
+    // or the emulator stops.
+    bool WaitReadable(int fd, bool idle_limit = true) const;
     bool WaitWritable(int fd) const;
     bool SendAll(int fd, std::string_view bytes) const;
     bool stopping() const { return stopping_; }

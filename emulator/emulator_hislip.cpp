@@ -26,6 +26,8 @@ struct HislipSession {
     bool reply_pending = false;  // a reply was sent and the client has not said it read it
     std::uint32_t last_processed = kFirstMessageId - kMessageIdStep;
     bool async_attached = false;
+    bool sync_done = false;
+    int async_fd = -1;  // shut down when the synchronous channel ends
 };
 
 struct HislipSessions {
@@ -45,9 +47,11 @@ constexpr std::uint64_t kMaxControlPayload = 256;
 constexpr auto kStatusWait = std::chrono::seconds(1);
 constexpr std::uint16_t kVendorId = ('Q' << 8) | 'E';
 
-bool RecvExact(const Emulator& emu, int fd, char* dst, std::size_t n) {
+// The asynchronous channel may stay quiet for long: it is not dropped when idle, but when its
+// synchronous channel ends.
+bool RecvExact(const Emulator& emu, int fd, char* dst, std::size_t n, bool idle_limit) {
     while (n > 0) {
-        if (!emu.WaitReadable(fd)) return false;
+        if (!emu.WaitReadable(fd, idle_limit)) return false;
         const ssize_t got = ::recv(fd, dst, n, 0);
         if (got <= 0) return false;
         dst += got;
@@ -58,20 +62,21 @@ bool RecvExact(const Emulator& emu, int fd, char* dst, std::size_t n) {
 
 enum class Got { kHeader, kBadPrologue, kClosed };
 
-Got ReadHeader(const Emulator& emu, int fd, Header* h) {
+Got ReadHeader(const Emulator& emu, int fd, Header* h, bool idle_limit = true) {
     char raw[kHeaderSize];
-    if (!RecvExact(emu, fd, raw, sizeof raw)) return Got::kClosed;
+    if (!RecvExact(emu, fd, raw, sizeof raw, idle_limit)) return Got::kClosed;
     return DecodeHeader(reinterpret_cast<const std::uint8_t*>(raw), h) ? Got::kHeader
                                                                        : Got::kBadPrologue;
 }
 
 // Reads a payload of `length` bytes in pieces, handing each to `sink`.
 template <class Sink>
-bool ReadPayload(const Emulator& emu, int fd, std::uint64_t length, Sink&& sink) {
+bool ReadPayload(const Emulator& emu, int fd, std::uint64_t length, Sink&& sink,
+                 bool idle_limit = true) {
     std::string piece;
     while (length > 0) {
         piece.resize(static_cast<std::size_t>(std::min<std::uint64_t>(length, 64 * 1024)));
-        if (!RecvExact(emu, fd, piece.data(), piece.size())) return false;
+        if (!RecvExact(emu, fd, piece.data(), piece.size(), idle_limit)) return false;
         sink(std::string_view(piece));
         length -= piece.size();
     }
@@ -145,17 +150,26 @@ void Emulator::ServeHislip(int client) {
         if (SendMessage(*this, client, kInitializeResponse, 0,
                         (std::uint32_t{kProtocolVersion} << 16) | id))
             ServeHislipSync(client, *session);
-        std::lock_guard lock(sessions.m);
-        sessions.by_id.erase(id);
+        {
+            std::lock_guard lock(sessions.m);
+            sessions.by_id.erase(id);
+        }
+        std::lock_guard lock(session->m);
+        session->sync_done = true;
+        if (session->async_fd >= 0) ::shutdown(session->async_fd, SHUT_RDWR);
         return;
     }
     std::shared_ptr<HislipSession> session;
     if (h.type == kAsyncInitialize && h.length == 0) {
         std::lock_guard lock(sessions.m);
         const auto it = sessions.by_id.find(static_cast<std::uint16_t>(h.parameter & 0xffff));
-        if (it != sessions.by_id.end() && !it->second->async_attached) {
-            session = it->second;
-            session->async_attached = true;
+        if (it != sessions.by_id.end()) {
+            std::lock_guard session_lock(it->second->m);
+            if (!it->second->async_attached && !it->second->sync_done) {
+                session = it->second;
+                session->async_attached = true;
+                session->async_fd = client;
+            }
         }
     }
     if (!session) {
@@ -164,6 +178,8 @@ void Emulator::ServeHislip(int client) {
     }
     if (SendMessage(*this, client, kAsyncInitializeResponse, 0, kVendorId))
         ServeHislipAsync(client, *session);
+    std::lock_guard lock(session->m);
+    session->async_fd = -1;  // the caller closes it
 }
 
 void Emulator::ServeHislipSync(int client, HislipSession& session) {
@@ -243,7 +259,7 @@ void Emulator::ServeHislipSync(int client, HislipSession& session) {
 void Emulator::ServeHislipAsync(int client, HislipSession& session) {
     for (;;) {
         Header h;
-        const Got got = ReadHeader(*this, client, &h);
+        const Got got = ReadHeader(*this, client, &h, false);
         if (got == Got::kBadPrologue) SendFatal(*this, client, kFatalBadHeader);
         if (got != Got::kHeader) return;
         if (h.length > kMaxControlPayload) {
@@ -251,7 +267,8 @@ void Emulator::ServeHislipAsync(int client, HislipSession& session) {
             return;
         }
         std::string payload;
-        if (!ReadPayload(*this, client, h.length, [&](std::string_view p) { payload.append(p); }))
+        if (!ReadPayload(
+                *this, client, h.length, [&](std::string_view p) { payload.append(p); }, false))
             return;
         bool sent = true;
         switch (h.type) {

@@ -91,7 +91,8 @@ TEST(EmulatorHislip, BrokenOrOutOfOrderMessagesAreRefused) {
 }
 
 // A reply larger than the client takes comes in Data pieces of that size, then DataEnd, all
-// with the id of the DataEnd that asked; the second channel of a session is refused.
+// with the id of the DataEnd that asked; the second channel of a session is refused, and the
+// asynchronous channel ends with the synchronous one.
 TEST(EmulatorHislip, RepliesAreSplitAtTheClientSizeAndTaggedWithTheQueryId) {
     Emulator emu("QDS2014A");
     emu.EnableHislip();
@@ -126,6 +127,9 @@ TEST(EmulatorHislip, RepliesAreSplitAtTheClientSizeAndTaggedWithTheQueryId) {
     }
     EXPECT_EQ(reply.rfind("QUORLEN TECHNOLOGIES,QDS2014A,", 0), 0u) << reply;
     EXPECT_EQ(reply.back(), '\n');
+    // The asynchronous channel lives as long as the synchronous one.
+    sync.Close();
+    EXPECT_TRUE(async.PeerClosed());
 }
 
 }  // namespace
