@@ -10,6 +10,7 @@
 #include <mutex>
 #include <string>
 
+#include "core/c_session_link.h"
 #include "platform/com/errorinfo.h"
 #include "platform/ivi/ivisession.h"
 
@@ -93,6 +94,7 @@ ViStatus Attach(IUnknown* driver, bool private_object, ViSession* vi) {
         IviSession_Dispose(created);
         return status;
     }
+    LinkCSession(driver, static_cast<LONG>(created));
     *vi = created;
     return VI_SUCCESS;
 }
@@ -108,6 +110,7 @@ ViStatus Detach(ViSession vi, ComPtr<IUnknown>* driver) {
         IviSession_SetDataPtr(vi, nullptr);
         data = static_cast<SessionData*>(p);
     }
+    UnlinkCSession(data->Driver(), static_cast<LONG>(vi));
     *driver = ComPtr<IUnknown>(data->Driver());
     data->Release();
     return VI_SUCCESS;

@@ -101,6 +101,47 @@ TEST_F(CSession, AnExistingDriverObjectIsBoundWithOneReference) {
     vi_ = 0;
 }
 
+// The root object behind a session's native IUnknown.
+ComPtr<Quorlen731XX> RootOf(ViSession vi) {
+    void* native = nullptr;
+    EXPECT_EQ(Qn731XX_GetNativeIUnknownPtr(vi, &native), VI_SUCCESS);
+    ComPtr<IUnknown> unknown(static_cast<IUnknown*>(native), false);
+    ComPtr<IIviDriver> driver;
+    EXPECT_EQ(unknown.As(driver), S_OK);
+    return ComPtr<Quorlen731XX>(dynamic_cast<Quorlen731XX*>(driver.get()));
+}
+
+TEST_F(CSession, TheDriverObjectKnowsItsCSessionUntilTheSessionCloses) {
+    OpenSimulated();
+    ComPtr<Quorlen731XX> root = RootOf(vi_);
+    ASSERT_TRUE(root);
+    LONG handle = 0;
+    EXPECT_EQ(root->get_NativeCHandle(&handle), S_OK);
+    EXPECT_EQ(static_cast<ViSession>(handle), vi_);
+    EXPECT_EQ(root->AttachToExistingCSession(), S_OK);
+
+    // A second session on the same object takes the link; closing the first
+    // does not take it from the second.
+    ViSession second = 0;
+    ASSERT_EQ(Qn731XX_AttachToExistingCOMSession(static_cast<IIviDriver*>(root.get()), &second),
+              VI_SUCCESS);
+    ASSERT_NE(second, vi_);
+    EXPECT_EQ(root->get_NativeCHandle(&handle), S_OK);
+    EXPECT_EQ(static_cast<ViSession>(handle), second);
+    // Detaching the first session closes the object too; the link to the
+    // second stays, and the second session still answers.
+    EXPECT_EQ(Qn731XX_close(vi_), VI_SUCCESS);
+    vi_ = 0;
+    EXPECT_EQ(root->get_NativeCHandle(&handle), S_OK);
+    EXPECT_EQ(static_cast<ViSession>(handle), second);
+
+    EXPECT_EQ(Qn731XX_close(second), IVI_ERROR_NOT_INITIALIZED);
+    handle = 7;
+    EXPECT_EQ(root->get_NativeCHandle(&handle), E_IVI_PROPERTY_NOT_SUPPORTED);
+    EXPECT_EQ(handle, 0);
+    EXPECT_EQ(root->AttachToExistingCSession(), E_IVI_METHOD_NOT_SUPPORTED);
+}
+
 TEST_F(CSession, TheSessionLockIsHeldPerThreadAndReEntered) {
     OpenSimulated();
     ViBoolean has = VI_FALSE;
