@@ -1,13 +1,14 @@
 // Session handles come from the IVI-C session library; the C layer keeps one
-// counted reference to the driver object in each handle's data pointer. One
-// mutex orders reading the pointer (and adding the call's reference) against
-// taking it out at close, so a call racing a close on another thread either
-// gets a live object or an invalid session, never a released one.
+// counted reference to the driver object in each handle's data pointer. A
+// call finds it without any lock: the library lets it add the call's
+// reference before a close taking the pointer out can go on. Close then waits
+// for the calls already inside to finish before it closes the object, so a
+// call racing a close either completes or sees an invalid session, never a
+// released or half-closed object.
 #include "capi/c_session.h"
 
 #include <cstdio>
 #include <cstring>
-#include <mutex>
 #include <string>
 
 #include "core/c_session_link.h"
@@ -15,15 +16,6 @@
 #include "platform/ivi/ivisession.h"
 
 namespace qn::capi {
-
-namespace {
-
-std::mutex& PointerMutex() {
-    static std::mutex m;
-    return m;
-}
-
-}  // namespace
 
 ViStatus Fail(ViSession vi, ViStatus status, std::string_view text) {
     IviSession_SetError(vi, status, std::string(text).c_str());
@@ -57,14 +49,13 @@ ViStatus Convert(ViSession vi, HRESULT hr) {
 }
 
 ViStatus SessionOf(ViSession vi, SessionRef* out) {
-    std::lock_guard<std::mutex> g(PointerMutex());
     void* data = nullptr;
-    ViStatus status = IviSession_GetDataPtr(vi, &data);
+    ViStatus status = ivi::RetainDataPtr(vi, &data, [](void* p) {
+        static_cast<SessionData*>(p)->AddRef();
+    });
     if (status != VI_SUCCESS) return status;
     if (!data) return IVISESSION_ERROR_INVALID_SESSION;  // being closed
-    auto* session = static_cast<SessionData*>(data);
-    session->AddRef();
-    out->reset(session);
+    out->reset(static_cast<SessionData*>(data));
     return VI_SUCCESS;
 }
 
@@ -85,10 +76,7 @@ ViStatus Attach(IUnknown* driver, bool private_object, ViSession* vi) {
         data->Release();
         return status;
     }
-    {
-        std::lock_guard<std::mutex> g(PointerMutex());
-        status = IviSession_SetDataPtr(created, data);
-    }
+    status = IviSession_SetDataPtr(created, data);
     if (status != VI_SUCCESS) {
         data->Release();
         IviSession_Dispose(created);
@@ -100,16 +88,13 @@ ViStatus Attach(IUnknown* driver, bool private_object, ViSession* vi) {
 }
 
 ViStatus Detach(ViSession vi, ComPtr<IUnknown>* driver) {
-    SessionData* data = nullptr;
-    {
-        std::lock_guard<std::mutex> g(PointerMutex());
-        void* p = nullptr;
-        ViStatus status = IviSession_GetDataPtr(vi, &p);
-        if (status != VI_SUCCESS) return status;
-        if (!p) return IVISESSION_ERROR_INVALID_SESSION;
-        IviSession_SetDataPtr(vi, nullptr);
-        data = static_cast<SessionData*>(p);
-    }
+    void* p = nullptr;
+    ViStatus status = ivi::ExchangeDataPtr(vi, nullptr, &p);
+    if (status != VI_SUCCESS) return status;
+    if (!p) return IVISESSION_ERROR_INVALID_SESSION;  // closed by another thread
+    auto* data = static_cast<SessionData*>(p);
+    // No call can find the session now; those already inside finish first.
+    data->WaitForCalls();
     UnlinkCSession(data->Driver(), static_cast<LONG>(vi));
     *driver = ComPtr<IUnknown>(data->Driver());
     data->Release();

@@ -4,9 +4,11 @@
 #pragma once
 
 #include <atomic>
+#include <chrono>
 #include <mutex>
 #include <string>
 #include <string_view>
+#include <thread>
 #include <vector>
 
 #include "platform/com/unknown.h"
@@ -30,6 +32,17 @@ public:
     }
 
     IUnknown* Driver() const { return driver_.get(); }
+
+    // Waits until the caller's reference is the only one left: the calls
+    // that found the session before it was taken out of its handle are done.
+    void WaitForCalls() const {
+        for (int spins = 0; refs_.load(std::memory_order_acquire) > 1; ++spins) {
+            if (spins < 1000)
+                std::this_thread::yield();
+            else
+                std::this_thread::sleep_for(std::chrono::milliseconds(1));
+        }
+    }
 
     // The driver's interface `iid` (borrowed: valid while the session data
     // lives), asked for once. `slot` (below kInterfaceSlots) names the

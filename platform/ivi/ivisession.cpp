@@ -1,9 +1,14 @@
-// The IVI-C session table. Each session is a shared entry found by handle
-// under the table mutex; its own state (data pointer, error record, lock
-// owner) is guarded by the entry's mutex, so a slow lock holder on one session
-// never blocks calls on another.
+// The IVI-C session table: a fixed array of slots that live as long as the
+// process. A handle names its slot in its low bits and the slot's
+// generation in the others, so finding a session is a load and a compare,
+// without any lock; a disposed handle no longer matches its slot. Each slot
+// keeps a count of the readers of its data pointer, so that a caller who
+// replaces the pointer knows when nobody can still be holding the old one.
+// The lock owner and the error record are guarded by the slot's mutex, so a
+// slow lock holder on one session never blocks calls on another.
 #include "platform/ivi/ivisession.h"
 
+#include <atomic>
 #include <condition_variable>
 #include <cstring>
 #include <memory>
@@ -11,19 +16,29 @@
 #include <new>
 #include <string>
 #include <thread>
-#include <unordered_map>
 
 namespace {
 
-struct Session {
+constexpr unsigned kSlotBits = 12;
+constexpr ViSession kSlots = ViSession{1} << kSlotBits;  // sessions open at once
+constexpr ViSession kSlotMask = kSlots - 1;
+// Generations 1 .. kMaxGeneration keep every handle nonzero and below 2^31,
+// so it stays positive as a ViInt32 too.
+constexpr ViSession kMaxGeneration = (ViSession{1} << (31 - kSlotBits)) - 1;
+
+struct Slot {
+    std::atomic<ViSession> handle{0};  // the live handle, 0 when free
+    std::atomic<bool> claimed{false};  // taken from New until Dispose has finished
+    ViSession generation = 0;          // written only by the claimer
+    std::atomic<void*> data{nullptr};
+    std::atomic<unsigned> readers{0};  // data-pointer readers in progress
+
     std::mutex m;
-    std::condition_variable released;  // the lock became free, or the session was disposed
-    void* data = nullptr;
+    std::condition_variable released;  // the lock became free, or the session ended
     ViStatus error_code = VI_SUCCESS;
     std::string error_text;
     std::thread::id owner;  // lock holder, default id when free
     unsigned depth = 0;     // re-entry count of the holder
-    bool disposed = false;
 };
 
 class SessionTable {
@@ -33,70 +48,122 @@ class SessionTable {
         return table;
     }
 
-    std::shared_ptr<Session> Find(ViSession vi) {
-        if (vi == 0) return null_session_;
-        std::lock_guard<std::mutex> g(m_);
-        auto it = sessions_.find(vi);
-        return it == sessions_.end() ? nullptr : it->second;
+    // The slot of a live handle (or of handle 0), else null. The slot stays
+    // valid memory for ever; callers re-check the handle under the slot's
+    // mutex where a late dispose matters.
+    Slot* Find(ViSession vi) {
+        if (vi == 0) return &null_session_;
+        Slot& s = slots_[vi & kSlotMask];
+        return s.handle.load(std::memory_order_acquire) == vi ? &s : nullptr;
     }
 
-    ViSession Add(std::shared_ptr<Session> s) {
-        std::lock_guard<std::mutex> g(m_);
-        // Next free handle in 1..2^31-1, so handles stay positive as ViInt32 too.
-        do {
-            next_ = next_ >= 0x7FFFFFFFu ? 1 : next_ + 1;
-        } while (sessions_.count(next_));
-        sessions_.emplace(next_, std::move(s));
-        return next_;
-    }
-
-    std::shared_ptr<Session> Remove(ViSession vi) {
-        std::lock_guard<std::mutex> g(m_);
-        auto it = sessions_.find(vi);
-        if (it == sessions_.end()) return nullptr;
-        std::shared_ptr<Session> s = std::move(it->second);
-        sessions_.erase(it);
-        return s;
+    // Claims a free slot, starting after the last one claimed so that a handle
+    // comes back only after every slot has cycled through its generations.
+    ViSession Add() {
+        const ViSession start = next_.fetch_add(1, std::memory_order_relaxed);
+        for (ViSession i = 0; i < kSlots; ++i) {
+            Slot& s = slots_[(start + i) & kSlotMask];
+            bool expected = false;
+            if (!s.claimed.compare_exchange_strong(expected, true, std::memory_order_acquire))
+                continue;
+            s.generation = s.generation >= kMaxGeneration ? 1 : s.generation + 1;
+            const ViSession vi = (s.generation << kSlotBits) | ((start + i) & kSlotMask);
+            {
+                std::lock_guard<std::mutex> g(s.m);
+                s.error_code = VI_SUCCESS;
+                s.error_text.clear();
+                s.owner = std::thread::id();
+                s.depth = 0;
+                s.data.store(nullptr, std::memory_order_relaxed);
+                s.handle.store(vi, std::memory_order_release);
+            }
+            return vi;
+        }
+        return 0;
     }
 
   private:
-    std::mutex m_;
-    std::unordered_map<ViSession, std::shared_ptr<Session>> sessions_;
-    ViSession next_ = 0;
+    std::unique_ptr<Slot[]> slots_ = std::make_unique<Slot[]>(kSlots);
+    std::atomic<ViSession> next_{0};
     // Handle 0: only its error record is used.
-    std::shared_ptr<Session> null_session_ = std::make_shared<Session>();
+    Slot null_session_;
 };
 
 // A real session (not handle 0), or null.
-std::shared_ptr<Session> FindReal(ViSession vi) {
-    return vi == 0 ? nullptr : SessionTable::Instance().Find(vi);
+Slot* FindReal(ViSession vi) { return vi == 0 ? nullptr : SessionTable::Instance().Find(vi); }
+
+// Counts a reader of the data pointer for its lifetime.
+class ReaderScope {
+  public:
+    explicit ReaderScope(Slot& s) : s_(s) { s_.readers.fetch_add(1, std::memory_order_seq_cst); }
+    ~ReaderScope() { s_.readers.fetch_sub(1, std::memory_order_release); }
+    ReaderScope(const ReaderScope&) = delete;
+    ReaderScope& operator=(const ReaderScope&) = delete;
+
+  private:
+    Slot& s_;
+};
+
+// Waits until no reader that may have seen an earlier data pointer is left.
+void WaitForReaders(Slot& s) {
+    while (s.readers.load(std::memory_order_seq_cst) != 0) std::this_thread::yield();
+}
+
+// Reads the data pointer of `vi` and passes it to `retain` (when given and the
+// pointer is not null) before anyone replacing it can go on.
+ViStatus ReadData(ViSession vi, void** data, void (*retain)(void*)) {
+    *data = nullptr;
+    Slot* s = FindReal(vi);
+    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
+    ReaderScope reading(*s);
+    // Counted first, checked second: a dispose or replace that has not seen
+    // this reader has not happened yet.
+    if (s->handle.load(std::memory_order_seq_cst) != vi) return IVISESSION_ERROR_INVALID_SESSION;
+    void* p = s->data.load(std::memory_order_seq_cst);
+    if (p && retain) retain(p);
+    *data = p;
+    return VI_SUCCESS;
 }
 
 using Clock = std::chrono::steady_clock;
 
-// Takes the lock of `s`, waiting until `deadline` (Clock::time_point::max() for ever).
-ViStatus Acquire(Session& s, Clock::time_point deadline) {
+// Takes the lock of session `vi` in `s`, waiting until `deadline`
+// (Clock::time_point::max() for ever).
+ViStatus Acquire(Slot& s, ViSession vi, Clock::time_point deadline) {
     const std::thread::id me = std::this_thread::get_id();
     std::unique_lock<std::mutex> g(s.m);
-    auto available = [&] { return s.disposed || s.depth == 0 || s.owner == me; };
+    auto ended = [&] { return s.handle.load(std::memory_order_relaxed) != vi; };
+    auto available = [&] { return ended() || s.depth == 0 || s.owner == me; };
     if (deadline == Clock::time_point::max()) {
         s.released.wait(g, available);
     } else if (!s.released.wait_until(g, deadline, available)) {
         return IVISESSION_ERROR_TIMEOUT;
     }
-    if (s.disposed) return IVISESSION_ERROR_INVALID_SESSION;
+    if (ended()) return IVISESSION_ERROR_INVALID_SESSION;
     s.owner = me;
     ++s.depth;
     return VI_SUCCESS;
 }
 
 ViStatus Lock(ViSession vi, Clock::time_point deadline, ViBoolean* caller_has_lock) {
-    std::shared_ptr<Session> s = FindReal(vi);
+    Slot* s = FindReal(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
     if (caller_has_lock && *caller_has_lock) return VI_SUCCESS;
-    ViStatus status = Acquire(*s, deadline);
+    ViStatus status = Acquire(*s, vi, deadline);
     if (status == VI_SUCCESS && caller_has_lock) *caller_has_lock = VI_TRUE;
     return status;
+}
+
+// The slot of `vi` with its mutex held, or an unlocked guard when the
+// session does not exist (any more).
+std::unique_lock<std::mutex> LockRecord(ViSession vi, Slot** out) {
+    *out = nullptr;
+    Slot* s = SessionTable::Instance().Find(vi);
+    if (!s) return {};
+    std::unique_lock<std::mutex> g(s->m);
+    if (vi != 0 && s->handle.load(std::memory_order_relaxed) != vi) return {};
+    *out = s;
+    return g;
 }
 
 }  // namespace
@@ -105,42 +172,40 @@ extern "C" {
 
 ViStatus IviSession_New(ViSession* newVi) {
     if (!newVi) return IVISESSION_ERROR_NULL_POINTER;
-    *newVi = 0;
-    try {
-        *newVi = SessionTable::Instance().Add(std::make_shared<Session>());
-        return VI_SUCCESS;
-    } catch (const std::bad_alloc&) {
-        return IVISESSION_ERROR_OUT_OF_MEMORY;
-    }
+    *newVi = SessionTable::Instance().Add();
+    return *newVi != 0 ? VI_SUCCESS : IVISESSION_ERROR_OUT_OF_MEMORY;
 }
 
 ViStatus IviSession_Dispose(ViSession vi) {
-    std::shared_ptr<Session> s = vi == 0 ? nullptr : SessionTable::Instance().Remove(vi);
+    Slot* s = FindReal(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
     {
         std::lock_guard<std::mutex> g(s->m);
-        s->disposed = true;
+        ViSession expected = vi;
+        if (!s->handle.compare_exchange_strong(expected, 0, std::memory_order_seq_cst))
+            return IVISESSION_ERROR_INVALID_SESSION;  // another dispose won
+        s->data.store(nullptr, std::memory_order_seq_cst);
+        s->owner = std::thread::id();
+        s->depth = 0;
+        s->error_code = VI_SUCCESS;
+        s->error_text.clear();
     }
     s->released.notify_all();
+    // A reader that matched the handle before it was cleared finishes before
+    // the slot can carry another session.
+    WaitForReaders(*s);
+    s->claimed.store(false, std::memory_order_release);
     return VI_SUCCESS;
 }
 
 ViStatus IviSession_SetDataPtr(ViSession vi, void* dataPtr) {
-    std::shared_ptr<Session> s = FindReal(vi);
-    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    std::lock_guard<std::mutex> g(s->m);
-    s->data = dataPtr;
-    return VI_SUCCESS;
+    void* previous = nullptr;
+    return qn::ivi::ExchangeDataPtr(vi, dataPtr, &previous);
 }
 
 ViStatus IviSession_GetDataPtr(ViSession vi, void** dataPtr) {
     if (!dataPtr) return IVISESSION_ERROR_NULL_POINTER;
-    *dataPtr = nullptr;
-    std::shared_ptr<Session> s = FindReal(vi);
-    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    std::lock_guard<std::mutex> g(s->m);
-    *dataPtr = s->data;
-    return VI_SUCCESS;
+    return ReadData(vi, dataPtr, nullptr);
 }
 
 ViStatus IviSession_Lock(ViSession vi, ViBoolean* callerHasLock) {
@@ -148,12 +213,13 @@ ViStatus IviSession_Lock(ViSession vi, ViBoolean* callerHasLock) {
 }
 
 ViStatus IviSession_Unlock(ViSession vi, ViBoolean* callerHasLock) {
-    std::shared_ptr<Session> s = FindReal(vi);
+    Slot* s = FindReal(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
     if (callerHasLock && !*callerHasLock) return VI_SUCCESS;
     bool now_free = false;
     {
         std::lock_guard<std::mutex> g(s->m);
+        if (s->handle.load(std::memory_order_relaxed) != vi) return IVISESSION_ERROR_INVALID_SESSION;
         if (s->depth == 0 || s->owner != std::this_thread::get_id())
             return IVISESSION_ERROR_NOT_LOCKED;
         if (--s->depth == 0) {
@@ -167,11 +233,11 @@ ViStatus IviSession_Unlock(ViSession vi, ViBoolean* callerHasLock) {
 }
 
 ViStatus IviSession_SetError(ViSession vi, ViStatus errorCode, ViConstString errorDescription) {
-    std::shared_ptr<Session> s = SessionTable::Instance().Find(vi);
-    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
     try {
         std::string text = errorDescription ? errorDescription : "";
-        std::lock_guard<std::mutex> g(s->m);
+        Slot* s = nullptr;
+        std::unique_lock<std::mutex> g = LockRecord(vi, &s);
+        if (!s) return IVISESSION_ERROR_INVALID_SESSION;
         s->error_code = errorCode;
         s->error_text = std::move(text);
         return VI_SUCCESS;
@@ -183,9 +249,9 @@ ViStatus IviSession_SetError(ViSession vi, ViStatus errorCode, ViConstString err
 ViStatus IviSession_GetError(ViSession vi, ViStatus* errorCode, ViInt32 bufferSize,
                              ViChar description[]) {
     if (bufferSize < 0) return IVISESSION_ERROR_INVALID_VALUE;
-    std::shared_ptr<Session> s = SessionTable::Instance().Find(vi);
+    Slot* s = nullptr;
+    std::unique_lock<std::mutex> g = LockRecord(vi, &s);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    std::lock_guard<std::mutex> g(s->m);
     if (errorCode) *errorCode = s->error_code;
     const std::size_t n = s->error_text.size();
     // The needed size, capped so that it stays a positive ViStatus.
@@ -204,9 +270,9 @@ ViStatus IviSession_GetError(ViSession vi, ViStatus* errorCode, ViInt32 bufferSi
 }
 
 ViStatus IviSession_ClearError(ViSession vi) {
-    std::shared_ptr<Session> s = SessionTable::Instance().Find(vi);
+    Slot* s = nullptr;
+    std::unique_lock<std::mutex> g = LockRecord(vi, &s);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    std::lock_guard<std::mutex> g(s->m);
     s->error_code = VI_SUCCESS;
     s->error_text.clear();
     return VI_SUCCESS;
@@ -222,6 +288,25 @@ ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoole
         return Lock(vi, Clock::time_point::max(), callerHasLock);
     if (timeout.count() < 0) timeout = std::chrono::milliseconds(0);
     return Lock(vi, Clock::now() + timeout, callerHasLock);
+}
+
+ViStatus RetainDataPtr(ViSession vi, void** dataPtr, void (*retain)(void*)) {
+    if (!dataPtr) return IVISESSION_ERROR_NULL_POINTER;
+    return ReadData(vi, dataPtr, retain);
+}
+
+ViStatus ExchangeDataPtr(ViSession vi, void* dataPtr, void** previous) {
+    if (!previous) return IVISESSION_ERROR_NULL_POINTER;
+    *previous = nullptr;
+    Slot* s = FindReal(vi);
+    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
+    {
+        std::lock_guard<std::mutex> g(s->m);
+        if (s->handle.load(std::memory_order_relaxed) != vi) return IVISESSION_ERROR_INVALID_SESSION;
+        *previous = s->data.exchange(dataPtr, std::memory_order_seq_cst);
+    }
+    WaitForReaders(*s);
+    return VI_SUCCESS;
 }
 
 }  // namespace qn::ivi

@@ -26,6 +26,8 @@ ViStatus IviSession_New(ViSession* newVi);
  * lock return IVISESSION_ERROR_INVALID_SESSION. */
 ViStatus IviSession_Dispose(ViSession vi);
 
+/* Replaces the data pointer; returns once no IviSession_GetDataPtr call can
+ * still be holding the previous one. */
 ViStatus IviSession_SetDataPtr(ViSession vi, void* dataPtr);
 /* *dataPtr is set to null on failure. */
 ViStatus IviSession_GetDataPtr(ViSession vi, void** dataPtr);
@@ -60,6 +62,15 @@ namespace qn::ivi {
 /* IviSession_Lock that gives up after `timeout` with IVISESSION_ERROR_TIMEOUT
  * (a zero timeout only tries). */
 ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoolean* callerHasLock);
+
+/* Reads the data pointer without taking any lock and, when it is not null,
+ * calls retain(pointer) before a concurrent ExchangeDataPtr (or SetDataPtr)
+ * can return: a reference taken there cannot be outrun by the replacer's
+ * release. *dataPtr is null on failure. */
+ViStatus RetainDataPtr(ViSession vi, void** dataPtr, void (*retain)(void*));
+/* Replaces the data pointer and gives the previous one in *previous, once no
+ * reader can still be holding it; the caller may then release it. */
+ViStatus ExchangeDataPtr(ViSession vi, void* dataPtr, void** previous);
 }  // namespace qn::ivi
 #endif
 

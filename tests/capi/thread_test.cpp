@@ -1,6 +1,7 @@
 // The C API from several threads: sessions of their own in parallel, one
-// session shared under the session lock, and a session closed while another
-// thread is calling it.
+// session shared under the session lock, and a session closed while other
+// threads are calling it (each call either completes or finds the session
+// invalid; none reaches a half-closed object).
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -81,10 +82,7 @@ TEST(CApiThreads, ASessionClosedDuringCallsEndsThemCleanly) {
                         Qn731XX_GetAttributeViReal64(vi, "Channel1", IVISCOPE_ATTR_VERTICAL_RANGE, &v);
                     ++calls;
                     if (s == QN731XX_ERROR_INVALID_SESSION) return;
-                    // A call that reached the object as it was being closed.
-                    if (s != VI_SUCCESS) {
-                        EXPECT_EQ(s, IVI_ERROR_NOT_INITIALIZED);
-                    }
+                    ASSERT_EQ(s, VI_SUCCESS);
                 }
             });
         }
