@@ -3,6 +3,7 @@
 // result; results are copied back only after success.
 #pragma once
 
+#include <string>
 #include <tuple>
 #include <type_traits>
 
@@ -70,6 +71,29 @@ struct TextResult {
     ~TextResult() { SysFreeString(text); }
     ViStatus CopyOut(ViSession vi) const { return CopyString(vi, text, size, buffer); }
 };
+
+// A text by the string rule, taken from `produce` (a callable that fills a
+// std::string and returns the C status of getting it) unless an earlier call
+// of the same queue left one that did not fit: a text too long for the
+// buffer stays with the session and the next call delivers it again.
+template <class Produce>
+ViStatus DeliverText(ViSession vi, SessionData::Queue queue, ViInt32 bufferSize, ViChar buffer[],
+                     Produce&& produce) {
+    return Guard(vi, [&]() -> ViStatus {
+        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, buffer);
+        SessionRef session;
+        ViStatus status = SessionOf(vi, &session);
+        if (status != VI_SUCCESS) return status;
+        std::string text;
+        if (!session->TakePending(queue, &text)) {
+            status = produce(&text);
+            if (status < 0) return status;
+        }
+        const ViStatus copied = CopyString(vi, text, bufferSize, buffer);
+        if (copied > 0 && !text.empty()) session->KeepPending(queue, std::move(text));
+        return First(status, copied);
+    });
+}
 
 // Saturates a 32-bit count into a 16-bit C result.
 inline ViInt16 ToInt16(LONG v) {

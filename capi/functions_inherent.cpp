@@ -17,25 +17,13 @@ constexpr ViInt32 kRevisionTextSize = 256;
 // that does not fit stays with the session for the next call.
 ViStatus NextRecord(ViSession vi, SessionData::Queue queue, ViInt32 bufferSize, ViChar buffer[],
                     HRESULT (IIviDriverOperation::*next)(BSTR*)) {
-    return Guard(vi, [&]() -> ViStatus {
-        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, buffer);
-        SessionRef session;
-        ViStatus status = SessionOf(vi, &session);
-        if (status != VI_SUCCESS) return status;
-        std::string text;
-        if (!session->TakePending(queue, &text)) {
-            status = CallOn<IIviDriverOperation>(
-                vi, [&](IIviDriverOperation* op) {
-                    com::Bstr record;
-                    HRESULT hr = (op->*next)(record.Out());
-                    text = record.utf8();
-                    return hr;
-                });
-            if (status < 0) return status;
-        }
-        const ViStatus copied = CopyString(vi, text, bufferSize, buffer);
-        if (copied > 0 && !text.empty()) session->KeepPending(queue, std::move(text));
-        return First(status, copied);
+    return DeliverText(vi, queue, bufferSize, buffer, [&](std::string* text) {
+        return CallOn<IIviDriverOperation>(vi, [&](IIviDriverOperation* op) {
+            com::Bstr record;
+            HRESULT hr = (op->*next)(record.Out());
+            *text = record.utf8();
+            return hr;
+        });
     });
 }
 

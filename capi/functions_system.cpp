@@ -95,17 +95,19 @@ ViStatus Qn731XX_SystemWrite(ViSession vi, ViConstString command) {
 }
 
 ViStatus Qn731XX_SystemRead(ViSession vi, ViInt32 bufferSize, ViChar buffer[]) {
-    return Guard(vi, [&]() -> ViStatus {
-        if (bufferSize < 0) return CopyString(vi, std::string_view{}, bufferSize, buffer);
-        TextResult text{bufferSize, buffer};
-        ViStatus status = CallOn<IQuorlen731XXSystem>(vi, [&](IQuorlen731XXSystem* s) {
-            ComPtr<IFormattedIO488> io;
-            HRESULT hr = s->get_IO(io.Out());
-            if (FAILED(hr)) return hr;
-            return io->ReadString(&text.text);
-        });
-        return status < 0 ? status : First(status, text.CopyOut(vi));
-    });
+    // A reply longer than the buffer is kept whole for the next call.
+    return DeliverText(vi, SessionData::Queue::kSystemRead, bufferSize, buffer,
+                       [&](std::string* text) {
+                           return CallOn<IQuorlen731XXSystem>(vi, [&](IQuorlen731XXSystem* s) {
+                               ComPtr<IFormattedIO488> io;
+                               HRESULT hr = s->get_IO(io.Out());
+                               if (FAILED(hr)) return hr;
+                               com::Bstr reply;
+                               hr = io->ReadString(reply.Out());
+                               *text = reply.utf8();
+                               return hr;
+                           });
+                       });
 }
 
 }  // extern "C"

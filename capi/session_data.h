@@ -57,10 +57,11 @@ public:
     void Expose();
 
     // Records taken from the driver's queues (coercion records, interchange
-    // warnings) that did not fit the caller's buffer: the next call delivers
-    // them instead of taking the next one, so asking for the size first loses
-    // nothing.
-    enum class Queue { kCoercion, kInterchange };
+    // warnings) and instrument replies read by Qn731XX_SystemRead that did
+    // not fit the caller's buffer: the next call delivers them instead of
+    // taking the next one, so asking for the size first loses nothing.
+    enum class Queue { kCoercion, kInterchange, kSystemRead };
+    static constexpr std::size_t kQueues = 3;
     bool TakePending(Queue q, std::string* text);
     void KeepPending(Queue q, std::string text);
 
@@ -82,8 +83,8 @@ private:
     std::atomic<IUnknown*> interfaces_[kInterfaceSlots] = {};  // each holds a reference
     std::vector<CachedItem> items_;
     bool items_cacheable_;
-    std::string pending_[2];
-    bool has_pending_[2] = {false, false};
+    std::string pending_[kQueues];
+    bool has_pending_[kQueues] = {};
 };
 
 // A counted reference to a session's data for the length of a call.

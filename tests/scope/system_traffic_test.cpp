@@ -9,6 +9,7 @@
 #include <iterator>
 #include <vector>
 
+#include "Qn731XX.h"
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
@@ -308,6 +309,28 @@ TEST_F(SystemTraffic, IoIsTheSessionsFormattedIoObject) {
     com::Bstr cls("*CLS\n");
     EXPECT_EQ(io->WriteString(cls.get(), VARIANT_TRUE), S_OK);
     EXPECT_EQ(System()->get_IO(nullptr), E_IVI_NULL_POINTER);
+}
+
+TEST_F(SystemTraffic, ACReadTooLongForTheBufferKeepsTheReplyForTheNextRead) {
+    ViSession vi = 0;
+    ASSERT_EQ(Qn731XX_AttachToExistingCOMSession(static_cast<IIviDriver*>(driver_.get()), &vi),
+              VI_SUCCESS);
+    io_->Expect("*IDN?\n", "QUORLEN,73141D,SN7,2.10\n");
+    ASSERT_EQ(Qn731XX_SystemWrite(vi, "*IDN?\n"), VI_SUCCESS);
+    char text[64];
+    // The size first (nothing copied), then a buffer one short: both keep it.
+    EXPECT_EQ(Qn731XX_SystemRead(vi, 0, nullptr), 25);
+    EXPECT_EQ(Qn731XX_SystemRead(vi, 24, text), 25);
+    EXPECT_STREQ(text, "QUORLEN,73141D,SN7,2.10");
+    EXPECT_EQ(Qn731XX_SystemRead(vi, sizeof text, text), VI_SUCCESS);
+    EXPECT_STREQ(text, "QUORLEN,73141D,SN7,2.10\n");
+    // Delivered: the next read asks the instrument again.
+    io_->Expect("*OPC?\n", "1\n");
+    ASSERT_EQ(Qn731XX_SystemWrite(vi, "*OPC?\n"), VI_SUCCESS);
+    EXPECT_EQ(Qn731XX_SystemRead(vi, sizeof text, text), VI_SUCCESS);
+    EXPECT_STREQ(text, "1\n");
+    EXPECT_EQ(Qn731XX_SystemRead(vi, -1, text), IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(Qn731XX_close(vi), VI_SUCCESS);
 }
 
 TEST_F(SystemTraffic, PointerGettersAndRegisterMovesOfAMessageSession) {
