@@ -1,5 +1,5 @@
 /* A C program driving an oscilloscope through the C API: it opens a session,
- * configures a channel and the record, captures and reads a waveform,
+ * configures a channel, an edge trigger and the record, captures and reads a waveform,
  * measures its frequency, and shows the error text of a setting the driver refuses.
  *
  *   qn731xx_c_example RESOURCE [OPTIONS]
@@ -32,6 +32,9 @@ int main(int argc, char **argv) {
     ViInt32 actual = 0;
     ViReal64 initial_x = 0.0, x_increment = 0.0, low, high, frequency = 0.0;
     ViChar model[256] = "";
+    ViChar trigger_source[64] = "";
+    ViReal64 trigger_level = 0.0;
+    ViInt32 trigger_slope = 0;
     ViInt32 i;
 
     if (argc < 2) {
@@ -46,6 +49,18 @@ int main(int argc, char **argv) {
     status = Qn731XX_ConfigureChannel(vi, "Channel1", 4.0, 0.0, QN731XX_VAL_VERTICAL_COUPLING_DC,
                                       1.0, VI_TRUE);
     if (status < 0) return report(vi, "Qn731XX_ConfigureChannel", status);
+    /* Trigger on the rising edge of channel 1 as it crosses 0.5 V. */
+    status = Qn731XX_ConfigureTrigger(vi, QN731XX_VAL_TRIGGER_EDGE, 0.0);
+    if (status < 0) return report(vi, "Qn731XX_ConfigureTrigger", status);
+    status = Qn731XX_ConfigureEdgeTriggerSource(vi, "Channel1", 0.5,
+                                                QN731XX_VAL_TRIGGER_SLOPE_POSITIVE);
+    if (status < 0) return report(vi, "Qn731XX_ConfigureEdgeTriggerSource", status);
+    Qn731XX_GetAttributeViString(vi, "", IVISCOPE_ATTR_TRIGGER_SOURCE,
+                                 (ViInt32)sizeof trigger_source, trigger_source);
+    Qn731XX_GetAttributeViReal64(vi, "", IVISCOPE_ATTR_TRIGGER_LEVEL, &trigger_level);
+    Qn731XX_GetAttributeViInt32(vi, "", IVISCOPE_ATTR_TRIGGER_SLOPE, &trigger_slope);
+    printf("trigger: edge on %s at %g V, %s\n", trigger_source, trigger_level,
+           trigger_slope == QN731XX_VAL_TRIGGER_SLOPE_POSITIVE ? "rising" : "falling");
     status = Qn731XX_ConfigureAcquisitionRecord(vi, 1e-3, 1000, -5e-4);
     if (status < 0) return report(vi, "Qn731XX_ConfigureAcquisitionRecord", status);
 

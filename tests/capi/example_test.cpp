@@ -32,6 +32,8 @@ TEST(CExample, DrivesTheEmulatorAndShowsTheRefusedSetting) {
     EXPECT_EQ(status, 0) << out;
     EXPECT_NE(out.find("model: QDS2014A"), std::string::npos) << out;
     EXPECT_NE(out.find("waveform: "), std::string::npos) << out;
+    EXPECT_NE(out.find("trigger: edge on "), std::string::npos) << out;
+    EXPECT_NE(out.find("Channel1 at 0.5 V, rising"), std::string::npos) << out;
     EXPECT_NE(out.find("frequency: "), std::string::npos) << out;
     EXPECT_NE(out.find("refused setting failed: status 0xBFFA0010"), std::string::npos) << out;
     EXPECT_NE(out.find("Invalid value (42)"), std::string::npos) << out;
