@@ -7,6 +7,8 @@
 //   server, beside BM_Wire_BareReader (the bare reader into a reused buffer:
 //   the limit of the wire) and BM_Wire_BareReaderConvert (the same plus the
 //   conversion into a reused array: the limit of a fetch);
+// - BM_Fetch_CApi: Qn731XX_FetchWaveform in a loop into the caller's reused
+//   array, against the same block server and beside the same bare reader;
 // - BM_Fetch_DriverFirst: the first fetch of a new session into a new array,
 //   with the peak memory it added;
 // - BM_Fetch_DriverEmulator: the loop against the emulator serving the same
@@ -25,6 +27,7 @@
 #include <string>
 #include <vector>
 
+#include "Qn731XX.h"
 #include "bench/block_server.h"
 #include "bench/ratio_reporter.h"
 #include "core/root.h"
@@ -205,6 +208,34 @@ void FetchLoop(benchmark::State& state, const std::string& resource, std::size_t
     state.SetItemsProcessed(state.iterations() * static_cast<long>(points));
 }
 
+// Qn731XX_FetchWaveform in a loop into the caller's array, reused.
+void BM_Fetch_CApi(benchmark::State& state) {
+    const auto points = static_cast<ViInt32>(state.range(0));
+    const std::string resource = PeersFor(std::size_t(points)).server->Resource();
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    ViSession vi = 0;
+    if (Qn731XX_InitWithOptions(const_cast<ViChar*>(resource.c_str()), VI_FALSE, VI_FALSE, "",
+                                &vi) < 0 ||
+        Qn731XX_SetAttributeViInt32(vi, "", QN731XX_ATTR_SYSTEM_TIMEOUT_MILLISECONDS, 20000) < 0) {
+        state.SkipWithError("cannot open the session");
+        Qn731XX_close(vi);
+        return;
+    }
+    std::vector<ViReal64> array(static_cast<std::size_t>(points));
+    for (auto _ : state) {
+        ViInt32 actual = 0;
+        ViReal64 x0 = 0, dx = 0;
+        if (Qn731XX_FetchWaveform(vi, "Channel1", points, array.data(), &actual, &x0, &dx) < 0 ||
+            actual != points) {
+            state.SkipWithError("fetch failed");
+            break;
+        }
+        benchmark::DoNotOptimize(array.data());
+    }
+    Qn731XX_close(vi);
+    state.SetItemsProcessed(state.iterations() * state.range(0));
+}
+
 void BM_Fetch_DriverLoop(benchmark::State& state) {
     const auto points = static_cast<std::size_t>(state.range(0));
     FetchLoop(state, PeersFor(points).server->Resource(), points);
@@ -276,6 +307,7 @@ BENCHMARK(BM_CopyDoubles)->Arg(1 << 20)->Repetitions(kRepetitions)->ReportAggreg
 QN_FETCH_BENCH(BM_Wire_BareReader);
 QN_FETCH_BENCH(BM_Wire_BareReaderConvert);
 QN_FETCH_BENCH(BM_Fetch_DriverLoop);
+QN_FETCH_BENCH(BM_Fetch_CApi);
 QN_FETCH_BENCH(BM_Fetch_DriverEmulator);
 QN_FETCH_BENCH(BM_Fetch_DriverFirst)->Iterations(5);
 BENCHMARK(BM_Fetch_Sessions)->Threads(1)->Threads(2)->Threads(8)->Repetitions(3)
@@ -289,6 +321,7 @@ int main(int argc, char** argv) {
         {{"BM_ConvertWords/1048576", "BM_CopyDoubles/1048576", 2.5, 2.5},
          {"BM_Fetch_DriverLoop/1000000", "BM_Wire_BareReader/1000000", 1.5, 0},
          {"BM_Fetch_DriverLoop/8000000", "BM_Wire_BareReader/8000000", 2.0, 0},
+         {"BM_Fetch_CApi/8000000", "BM_Wire_BareReader/8000000", 2.0, 0},
          {"BM_Fetch_DriverFirst/8000000", "BM_Wire_BareReader/8000000", 4.0, 0},
          {"BM_Fetch_DriverLoop/1000000", "BM_Wire_BareReaderConvert/1000000", 0, 0},
          {"BM_Fetch_DriverLoop/8000000", "BM_Wire_BareReaderConvert/8000000", 0, 0},
