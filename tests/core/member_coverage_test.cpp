@@ -145,7 +145,7 @@ const std::map<std::string_view, std::vector<std::string_view>>& Documented() {
           "ConfigureDelay", "ResetActivity", "ReadActivity"}},
         {"IQuorlen731XXTrigger",
          {"Type", "Source", "Level", "Coupling", "Holdoff", "Modifier", "Continuous", "Configure",
-          "AcLine", "Edge", "Glitch", "Runt", "State", "Pattern", "Width"}},
+          "AcLine", "Edge", "Glitch", "Runt", "TV", "State", "Pattern", "Width"}},
         {"IIviScopeTrigger",
          {"Type", "Source", "Level", "Coupling", "Holdoff", "Modifier", "Continuous", "Configure",
           "AcLine", "Edge", "Glitch", "Runt", "TV", "Width"}},
