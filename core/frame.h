@@ -6,6 +6,8 @@
 //   5 clear the thread's error information
 //   6 check out-pointers, preset the out-values
 //   7 open the trace record      8 fetch the model string
+//   8b check the in-values: enumerations within their sets, texts free of
+//      line feeds and NULs (see CheckIn)
 //   9 simulate (members with a simulation key, while Simulate is on)
 //  10 push the formatted command, run the body, pop the command
 //  11 close the trace record     12 restore the IID, pop the context, unlock
@@ -20,6 +22,7 @@
 #include <string_view>
 #include <type_traits>
 
+#include "core/enum_values.h"
 #include "core/frame_trace.h"
 #include "core/node.h"
 #include "io/command_format.h"
@@ -124,18 +127,37 @@ std::string VisibleText(std::string_view text);
 HRESULT InternalError(CDriverNode& node, const char* what);
 HRESULT OutOfMemory(CDriverNode& node);
 
-// Adds one in-value to the command arguments; a text holding a line feed or
-// a NUL is refused (it would end the message and start another command).
+// Checks one in-value before anything is stored or sent, with or without
+// simulation: an enumeration value must be in its set, and a text that a
+// property stores or a command carries must hold no line feed or NUL (it
+// would end the message and start another command). Texts of other members
+// are names looked up by their bodies.
+template <class T>
+HRESULT CheckIn(CDriverNode& node, const MemberInfo& m, std::size_t index, const T& v) {
+    if constexpr (std::is_enum_v<T>) {
+        if (!InEnumSet(v))
+            return node.Errors().InvalidValue(m.entry, m.params[index],
+                                              std::int32_t{static_cast<LONG>(v)});
+    } else if constexpr (std::is_same_v<T, BSTR>) {
+        const bool sent_or_stored = !m.command.empty() || m.variant == FrameVariant::E ||
+                                    m.variant == FrameVariant::G;
+        if (sent_or_stored) {
+            const std::string text = com::BstrToUtf8(v);
+            if (text.find('\n') != std::string::npos || text.find('\0') != std::string::npos)
+                return node.Errors().InvalidValue(m.entry, m.params[index], VisibleText(text));
+        }
+    }
+    return S_OK;
+}
+
+// Adds one (already checked) in-value to the command arguments.
 template <VARTYPE Vt, class T>
-HRESULT AddCommandArg(CDriverNode& node, const MemberInfo& m, std::size_t index, const T& v,
-                      CommandArgList& list) {
+HRESULT AddCommandArg(CDriverNode& /*node*/, const MemberInfo& /*m*/, std::size_t /*index*/,
+                      const T& v, CommandArgList& list) {
     if constexpr (Vt == VT_BOOL) {
         list.Add(CommandArg(std::string_view(v != VARIANT_FALSE ? "1" : "0")));
     } else if constexpr (std::is_same_v<T, BSTR>) {
-        std::string text = com::BstrToUtf8(v);
-        if (text.find('\n') != std::string::npos || text.find('\0') != std::string::npos)
-            return node.Errors().InvalidValue(m.entry, m.params[index], VisibleText(text));
-        list.AddText(std::move(text));
+        list.AddText(com::BstrToUtf8(v));
     } else if constexpr (std::is_floating_point_v<T>) {
         list.Add(CommandArg(static_cast<double>(v)));
     } else if constexpr (std::is_integral_v<T> || std::is_enum_v<T>) {
@@ -179,6 +201,15 @@ HRESULT RunFrameSteps(CDriverNode& node, const MemberInfo& m, Body&& body, Args&
         FrameTrace trace(core, m.interface_name.data(), m.entry.data(), m.params,  // 7
                          args...);
         const std::string& model = core.Model();                                  // 8
+        index = 0;                                                                // 8b
+        auto check_in = [&](auto& a) {
+            if constexpr (IsIn<std::decay_t<decltype(a)>>::value)
+                if (SUCCEEDED(hr)) hr = CheckIn(node, m, index, a.value);
+            ++index;
+        };
+        (check_in(args), ...);
+        (void)check_in;
+        if (FAILED(hr)) return hr;
 
         if (core.Simulating() &&                                                  // 9
             (m.variant == FrameVariant::F || m.variant == FrameVariant::G)) {
