@@ -355,7 +355,7 @@ TEST_F(MeasurementTraffic, SecondSourceMustBeAnAnalogChannel) {
         {"VAL_EXTERNAL", nullptr, nullptr, E_IVI_INVALID_VALUE, "VirtualToSCPI"},
         {"UserDigitalChannel3", nullptr, nullptr, E_IVI_INVALID_VALUE,
          "PutSCPIMeasurementSources"},
-        {"UserChannel2\n:RST", nullptr, nullptr, E_IVI_INVALID_VALUE, "VirtualToSCPI"},
+        {"UserChannel2\n:RST", nullptr, nullptr, E_IVI_INVALID_VALUE, "put_Source2"},
         {"UserChannel2", "CHAN1;*RST\n", nullptr, E_IVI_UNEXPECTED_RESPONSE, ""},
     };
     for (const Case& c : cases) {

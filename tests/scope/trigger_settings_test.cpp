@@ -139,8 +139,7 @@ TEST_F(TriggerSettings, CouplingWritesOneCommandPerValue) {
     }
     EXPECT_EQ(Trig()->put_Coupling(Quorlen731XXTriggerCouplingTV), E_QUORLEN731XX_SETTINGS_CONFLICT);
     EXPECT_FALSE(ErrorText().empty());
-    EXPECT_EQ(Trig()->put_Coupling(Quorlen731XXTriggerCouplingEnum(-1)),
-              E_QUORLEN731XX_SETTINGS_CONFLICT);
+    EXPECT_EQ(Trig()->put_Coupling(Quorlen731XXTriggerCouplingEnum(-1)), E_IVI_INVALID_VALUE);
     for (LONG v : {2L, 6L, -1L, 1005L})
         EXPECT_EQ(IviTrig()->put_Coupling(IviScopeTriggerCouplingEnum(v)), E_IVI_INVALID_VALUE) << v;
 }
