@@ -15,6 +15,7 @@
 #include "emulator/emulator.h"
 #include "platform/visa/hislip_protocol.h"
 #include "platform/visa/visa.h"
+#include "tests/platform/visa/loopback_peer.h"
 #include "tests/platform/visa/visa_test_util.h"
 
 namespace qn::visa::test {
@@ -122,15 +123,7 @@ class HislipPeer {
 
     explicit HislipPeer(Script script, std::uint64_t server_max = 1 << 20)
         : script_(std::move(script)), server_max_(server_max) {
-        listen_ = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        ::bind(listen_, reinterpret_cast<sockaddr*>(&a), sizeof a);
-        ::listen(listen_, 4);
-        socklen_t len = sizeof a;
-        ::getsockname(listen_, reinterpret_cast<sockaddr*>(&a), &len);
-        port_ = ntohs(a.sin_port);
+        listen_ = ListenLoopback(&port_);
         [[maybe_unused]] int rc = ::pipe(wake_);
         thread_ = std::thread([this] { Run(); });
     }

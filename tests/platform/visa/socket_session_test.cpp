@@ -223,15 +223,9 @@ struct OpenCase {
 
 TEST(SocketSessionTest, OpenFailuresAreCleanAndExplained) {
     // A port where nothing listens: bind one, then close it.
-    int fd = ::socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in a{};
-    a.sin_family = AF_INET;
-    a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    ::bind(fd, reinterpret_cast<sockaddr*>(&a), sizeof a);
-    socklen_t len = sizeof a;
-    ::getsockname(fd, reinterpret_cast<sockaddr*>(&a), &len);
-    const std::string closed_port = std::to_string(ntohs(a.sin_port));
-    ::close(fd);
+    std::uint16_t port = 0;
+    ::close(ListenLoopback(&port));
+    const std::string closed_port = std::to_string(port);
     const OpenCase kCases[] = {
         {"TCPIP0::127.0.0.1::" + closed_port + "::SOCKET", E_VISA_RESOURCE_NOT_FOUND, "connect"},
         {"TCPIP0::127.0.0.1:" + closed_port + "::inst0::INSTR", E_VISA_RESOURCE_NOT_FOUND,
