@@ -6,6 +6,8 @@
 
 #include <cstring>
 #include <limits>
+#include <tuple>
+#include <vector>
 
 #include "platform/com/bstr.h"
 #include "platform/com/variant.h"
@@ -29,15 +31,12 @@ TEST(SafeArray, OneDimensionalBoundsAndTypeForEachPlainElementType) {
         ASSERT_TRUE(sa) << c.vt;
         LONG lo = 0, hi = 0;
         VARTYPE vt = 0;
-        EXPECT_EQ(SafeArrayGetDim(sa.get()), 1u);
-        EXPECT_EQ(SafeArrayGetElemsize(sa.get()), c.size);
-        EXPECT_EQ(SafeArrayGetLBound(sa.get(), 1, &lo), S_OK);
-        EXPECT_EQ(SafeArrayGetUBound(sa.get(), 1, &hi), S_OK);
-        EXPECT_EQ(SafeArrayGetVartype(sa.get(), &vt), S_OK);
-        EXPECT_EQ(lo, -2);
-        EXPECT_EQ(hi, 2);
-        EXPECT_EQ(vt, c.vt);
-        EXPECT_EQ(sa.size(), 5u);
+        EXPECT_EQ(SafeArrayGetLBound(sa.get(), 1, &lo) | SafeArrayGetUBound(sa.get(), 1, &hi) |
+                      SafeArrayGetVartype(sa.get(), &vt),
+                  S_OK);
+        EXPECT_EQ(std::make_tuple(SafeArrayGetDim(sa.get()), SafeArrayGetElemsize(sa.get()), lo, hi,
+                                  vt, sa.size()),
+                  std::make_tuple(UINT{1}, c.size, LONG{-2}, LONG{2}, c.vt, std::size_t{5}));
         EXPECT_EQ(SafeArrayGetLBound(sa.get(), 2, &lo), DISP_E_BADINDEX);
         EXPECT_EQ(SafeArrayGetUBound(sa.get(), 0, &hi), DISP_E_BADINDEX);
     }
@@ -85,10 +84,8 @@ TEST(SafeArray, TwoDimensionalLayoutHasDimensionOneFastest) {
             ASSERT_EQ(SafeArrayPutElement(sa.get(), idx, &v), S_OK);
         }
     const LONG* data = sa.data<LONG>();
-    EXPECT_EQ(data[0], 1000);
-    EXPECT_EQ(data[1], 1001);
-    EXPECT_EQ(data[3], 1100);
-    EXPECT_EQ(data[5], 1102);
+    EXPECT_EQ(std::vector<LONG>(data, data + 6),
+              (std::vector<LONG>{1000, 1001, 1002, 1100, 1101, 1102}));
     LONG out_of_range[2] = {0, 12};
     LONG v = 0;
     EXPECT_EQ(SafeArrayGetElement(sa.get(), out_of_range, &v), DISP_E_BADINDEX);
@@ -111,17 +108,6 @@ TEST(SafeArray, RejectsBadShapesAndOverflowingSizes) {
     LONG hi = 0;
     EXPECT_EQ(SafeArrayGetUBound(last.get(), 1, &hi), S_OK);
     EXPECT_EQ(hi, kLongMax);
-}
-
-TEST(SafeArray, EmptyArrayHasNoElements) {
-    SafeArray sa = SafeArray::Vector(VT_R8, 0);
-    ASSERT_TRUE(sa);
-    LONG i = 0;
-    double v = 0;
-    EXPECT_EQ(SafeArrayGetElement(sa.get(), &i, &v), DISP_E_BADINDEX);
-    SafeArray copy;
-    EXPECT_EQ(SafeArrayCopy(sa.get(), copy.Out()), S_OK);
-    EXPECT_EQ(copy.size(), 0u);
 }
 
 TEST(SafeArray, BstrElementsAreCopiedInAndOutAndFreedWithTheArray) {
@@ -151,7 +137,6 @@ TEST(SafeArray, VariantElementsOwnTheirContents) {
     qn::com::Variant s = qn::com::Variant::String("abc");
     LONG i = 0;
     ASSERT_EQ(SafeArrayPutElement(sa.get(), &i, &s), S_OK);
-    EXPECT_EQ(SafeArrayPutElement(sa.get(), &i, nullptr), E_INVALIDARG);
     qn::com::Variant out;
     VariantClear(&out);
     ASSERT_EQ(SafeArrayGetElement(sa.get(), &i, &out), S_OK);
@@ -223,9 +208,12 @@ TEST(SafeArray, LargeArraysAreZeroedWritableAndFreedWhateverTheirBound) {
     }
 }
 
-TEST(SafeArray, NullArgumentsAreRejected) {
+TEST(SafeArray, EmptyArraysAndNullArguments) {
+    SafeArray empty = SafeArray::Vector(VT_R8, 0), sa = SafeArray::Vector(VT_I4, 1), copy;
     LONG i = 0, v = 0;
-    SafeArray sa = SafeArray::Vector(VT_I4, 1);
+    EXPECT_EQ(SafeArrayGetElement(empty.get(), &i, &v), DISP_E_BADINDEX);
+    EXPECT_EQ(SafeArrayCopy(empty.get(), copy.Out()), S_OK);
+    EXPECT_EQ(copy.size(), 0u);
     EXPECT_EQ(SafeArrayGetElement(nullptr, &i, &v), E_INVALIDARG);
     EXPECT_EQ(SafeArrayGetElement(sa.get(), nullptr, &v), E_INVALIDARG);
     EXPECT_EQ(SafeArrayGetElement(sa.get(), &i, nullptr), E_INVALIDARG);

@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <fstream>
 #include <string>
+#include <vector>
 
 namespace {
 
@@ -54,7 +55,14 @@ ConfigStore LoadOk(std::string_view xml) {
     return r.store;
 }
 
-TEST(ConfigStore, SessionCarriesAssetFlagsSetupAndModule) {
+// The six flags in the order cache, interchange check, query status, range
+// check, record coercions, simulate.
+std::vector<bool> Flags(const SessionFlags& f) {
+    return {f.cache,       f.interchange_check, f.query_instr_status,
+            f.range_check, f.record_coercions,  f.simulate};
+}
+
+TEST(ConfigStore, SessionsCarryAssetFlagsSetupAndModuleOrTheDefaults) {
     ConfigStore store = LoadOk(kStore);
     const DriverSession* s = store.FindSession("Scope1");
     ASSERT_NE(s, nullptr);
@@ -62,29 +70,16 @@ TEST(ConfigStore, SessionCarriesAssetFlagsSetupAndModule) {
     EXPECT_EQ(s->resource_descriptor, "TCPIP0::127.0.0.1::INSTR");
     EXPECT_EQ(s->software_module, "Qn731XX");
     EXPECT_EQ(s->driver_setup, "Model=QDS4032A, Trace=false");
-    EXPECT_FALSE(s->flags.cache);
-    EXPECT_TRUE(s->flags.interchange_check);
-    EXPECT_TRUE(s->flags.query_instr_status);
-    EXPECT_FALSE(s->flags.range_check);
-    EXPECT_TRUE(s->flags.record_coercions);
-    EXPECT_TRUE(s->flags.simulate);
-}
-
-TEST(ConfigStore, OmittedFlagsTakeTheDriverDefaults) {
-    ConfigStore store = LoadOk(kStore);
+    // Every flag the opposite of its default, spelt false/1/true/0/TRUE/true.
+    EXPECT_EQ(Flags(s->flags), (std::vector<bool>{false, true, true, false, true, true}));
     const DriverSession* plain = nullptr;
-    for (const auto& s : store.sessions())
-        if (s.name == "Plain") plain = &s;
+    for (const auto& session : store.sessions())
+        if (session.name == "Plain") plain = &session;
     ASSERT_NE(plain, nullptr);
     EXPECT_FALSE(plain->HasHardwareAsset());
     EXPECT_TRUE(plain->virtual_name_map.empty());
     EXPECT_TRUE(plain->resource_descriptor.empty());
-    SessionFlags d;
-    EXPECT_EQ(plain->flags.cache, d.cache);
-    EXPECT_TRUE(plain->flags.cache);
-    EXPECT_TRUE(plain->flags.range_check);
-    EXPECT_FALSE(plain->flags.simulate || plain->flags.interchange_check ||
-                 plain->flags.query_instr_status || plain->flags.record_coercions);
+    EXPECT_EQ(Flags(plain->flags), (std::vector<bool>{true, false, false, true, false, false}));
 }
 
 TEST(ConfigStore, LogicalNamesResolveFirstAndNamesAreCaseSensitive) {
@@ -93,9 +88,8 @@ TEST(ConfigStore, LogicalNamesResolveFirstAndNamesAreCaseSensitive) {
     EXPECT_EQ(store.FindSession("MyScope")->name, "Scope1");
     // "Plain" is both a logical name and a session: the logical name wins.
     EXPECT_EQ(store.FindSession("Plain")->name, "Scope1");
-    EXPECT_EQ(store.FindSession("myscope"), nullptr);
-    EXPECT_EQ(store.FindSession("TCPIP0::127.0.0.1::INSTR"), nullptr);
-    EXPECT_EQ(store.FindSession(""), nullptr);
+    for (const char* missing : {"myscope", "TCPIP0::127.0.0.1::INSTR", ""})
+        EXPECT_EQ(store.FindSession(missing), nullptr) << missing;
     EXPECT_NE(store.FindSoftwareModule("Qn731XX"), nullptr);
     EXPECT_EQ(store.FindSoftwareModule("Other"), nullptr);
 }
@@ -107,9 +101,7 @@ TEST(ConfigStore, InitialSettingsAreTypedAndIndexedFromOne) {
     const auto* settings = FindStructure(m->data_components, kConfigurableInitialSettings);
     ASSERT_NE(settings, nullptr);
     ASSERT_EQ(settings->size(), 6u);
-    EXPECT_EQ(DataComponentAt(*settings, 0), nullptr);
-    EXPECT_EQ(DataComponentAt(*settings, 7), nullptr);
-    EXPECT_EQ(DataComponentAt(*settings, -1), nullptr);
+    for (int outside : {0, 7, -1}) EXPECT_EQ(DataComponentAt(*settings, outside), nullptr);
 
     const DataComponent* model = DataComponentAt(*settings, 1);
     EXPECT_EQ(model->name, "Model");  // attribute blanks are trimmed
@@ -137,14 +129,6 @@ TEST(ConfigStore, VirtualNamesExpandWithAndWithoutRanges) {
         {"ch3", "Channel3"},       {"ch10", "Channel5"}, {"ch11", "Channel6"},
     };
     EXPECT_EQ(store.FindSession("Scope1")->virtual_name_map, expected);
-}
-
-TEST(ExpandVirtualNames, CollidingNamesAreAnError) {
-    VirtualNameMap map;
-    std::string error;
-    std::vector<VirtualName> names = {{"CH1", "Channel4", {}}, {"ch", "Channel", {{1, 2, 1}}}};
-    EXPECT_FALSE(ExpandVirtualNames(names, &map, &error));
-    EXPECT_NE(error.find("ch1"), std::string::npos) << error;
 }
 
 struct BadStore {

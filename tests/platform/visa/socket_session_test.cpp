@@ -1,5 +1,6 @@
-// Message sessions over the raw-socket transport, against a scripted
-// loopback peer.
+// What only raw-socket sessions do, against a scripted loopback peer: the
+// status byte by a common query, byte arrays, the session's properties, and
+// opens that fail (message_transport_test.cpp has what all transports share).
 #include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
@@ -7,6 +8,7 @@
 
 #include <cstring>
 
+#include "platform/visa/serial.h"
 #include "platform/visa/visa.h"
 #include "tests/platform/visa/loopback_peer.h"
 #include "tests/platform/visa/visa_test_util.h"
@@ -20,125 +22,6 @@ HRESULT OpenResource(const std::string& resource, LONG open_timeout, ComPtr<IVis
     ComPtr<IResourceManager> rm;
     EXPECT_EQ(CreateResourceManager(rm.Out()), S_OK);
     return rm->Open(Bstr(resource).get(), kNoLock, open_timeout, nullptr, out->Out());
-}
-
-TEST(SocketSessionTest, RepliesSplitAtEveryChunkSizeReadWhole) {
-    const std::string reply = "QUORLEN,731XX,SN42,1.3.20\n";
-    LoopbackPeer peer;
-    for (std::size_t chunk = 1; chunk <= reply.size(); ++chunk)
-        peer.Expect("*IDN?\n").Send(reply, chunk);
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource());
-    ASSERT_TRUE(msg);
-    for (std::size_t chunk = 1; chunk <= reply.size(); ++chunk) {
-        ASSERT_EQ(Write(msg.get(), "*IDN?\n"), S_OK);
-        std::string text;
-        ASSERT_EQ(ReadText(msg.get(), &text), S_OK) << ThreadErrorText();
-        EXPECT_EQ(text, reply) << "chunk " << chunk;
-    }
-    msg.reset();
-    EXPECT_EQ(peer.Finish(), "");
-}
-
-TEST(SocketSessionTest, TerminationCharacterAndCountEndReads) {
-    LoopbackPeer peer;
-    peer.Send("ab;cd\nef\n");
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource());
-    ASSERT_TRUE(msg);
-    std::string text;
-    // A different termination character.
-    msg->put_TerminationCharacter(';');
-    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
-    EXPECT_EQ(text, "ab;");
-    // Disabled: only the count ends the read, line feeds included.
-    msg->put_TerminationCharacterEnabled(VARIANT_FALSE);
-    ASSERT_EQ(ReadText(msg.get(), &text, 4), S_OK);
-    EXPECT_EQ(text, "cd\ne");
-    // Enabled again with line feed; the count can end a read first.
-    msg->put_TerminationCharacter('\n');
-    msg->put_TerminationCharacterEnabled(VARIANT_TRUE);
-    ASSERT_EQ(ReadText(msg.get(), &text, 1), S_OK);
-    EXPECT_EQ(text, "f");
-    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
-    EXPECT_EQ(text, "\n");
-    msg.reset();
-    EXPECT_EQ(peer.Finish(), "");
-}
-
-// The peer drips a reply slower than the timeout allows: a per-chunk limit
-// would wait for it, a total deadline fails. The late bytes must then not be
-// taken for the reply to the next query.
-TEST(SocketSessionTest, TimeoutIsTotalAndLateReplyDoesNotLeak) {
-    LoopbackPeer peer;
-    auto dripped = peer.Signal();
-    peer.Expect("SLOW?\n").Send(std::string(30, 'x') + "\n", 1, 20).Notify();
-    peer.Expect("NEXT?\n").Send("fresh\n");
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource(), 150);
-    ASSERT_TRUE(msg);
-    ASSERT_EQ(Write(msg.get(), "SLOW?\n"), S_OK);
-    std::string text;
-    EXPECT_EQ(ReadText(msg.get(), &text), E_VISA_TIMEOUT);
-    EXPECT_NE(ThreadErrorText().find("timeout"), std::string::npos);
-    LONG timeout = 0;
-    msg->get_Timeout(&timeout);
-    EXPECT_EQ(timeout, 150);
-    dripped.wait();
-    ASSERT_EQ(Write(msg.get(), "NEXT?\n"), S_OK);
-    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
-    EXPECT_EQ(text, "fresh\n");
-    msg.reset();
-    EXPECT_EQ(peer.Finish(), "");
-}
-
-TEST(SocketSessionTest, QuietLineIsNotTheEndOfAReply) {
-    LoopbackPeer peer;
-    peer.Expect("Q?\n").Send("12").Pause(200).Send("34\n");
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource(), 5000);
-    ASSERT_TRUE(msg);
-    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
-    std::string text;
-    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
-    EXPECT_EQ(text, "1234\n");
-    msg.reset();
-    EXPECT_EQ(peer.Finish(), "");
-}
-
-TEST(SocketSessionTest, DroppedConnectionFailsInsteadOfHanging) {
-    LoopbackPeer peer;
-    peer.Expect("Q?\n").Send("partial").Drop();
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource(), kTimeoutInfinite);
-    ASSERT_TRUE(msg);
-    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
-    std::string text;
-    EXPECT_EQ(ReadText(msg.get(), &text), E_VISA_CONNECTION_LOST);
-    EXPECT_NE(ThreadErrorText().find("closed"), std::string::npos);
-    EXPECT_EQ(peer.Finish(), "");
-    // Writing to the dead connection fails too (at the latest the second time).
-    HRESULT hr = Write(msg.get(), "A\n");
-    if (SUCCEEDED(hr)) hr = Write(msg.get(), "B\n");
-    EXPECT_TRUE(FAILED(hr));
-}
-
-TEST(SocketSessionTest, ClearDiscardsUnreadInput) {
-    LoopbackPeer peer;
-    auto sent = peer.Signal();
-    peer.Send("stale reply\n").Notify().Expect("Q?\n").Send("good\n");
-    peer.Start();
-    auto msg = OpenMessage(peer.Resource());
-    ASSERT_TRUE(msg);
-    sent.wait();
-    // Loopback delivers at once: the stale reply is here when the peer has sent it.
-    ASSERT_EQ(msg->Clear(), S_OK);
-    ASSERT_EQ(Write(msg.get(), "Q?\n"), S_OK);
-    std::string text;
-    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
-    EXPECT_EQ(text, "good\n");
-    msg.reset();
-    EXPECT_EQ(peer.Finish(), "");
 }
 
 TEST(SocketSessionTest, StatusByteByCommonQuery) {
@@ -208,7 +91,9 @@ TEST(SocketSessionTest, SessionPropertiesAndClose) {
     msg->get_SendEndEnabled(&send_end);
     EXPECT_EQ(send_end, VARIANT_TRUE);
     ComPtr<IRegister> reg;
+    ComPtr<ISerial> serial;
     EXPECT_EQ(msg.As(reg), E_NOINTERFACE);
+    EXPECT_EQ(msg.As(serial), E_NOINTERFACE);  // line settings are for serial sessions only
     ASSERT_EQ(msg->Close(), S_OK);
     EXPECT_EQ(Write(msg.get(), "X\n"), E_VISA_INVALID_OBJECT);
     msg.reset();
