@@ -85,8 +85,8 @@ TEST(FormattedIOTest, WordBlocksHonourByteOrderAndDirectBuffers) {
     Variant v;
     ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK);
     ASSERT_EQ(v.vt, VT_ARRAY | VT_I2);
-    EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[0], 0x0102);
-    EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[1], -2);
+    const SHORT* got = static_cast<SHORT*>(v.parray->pvData);
+    EXPECT_EQ(std::vector<SHORT>(got, got + 2), (std::vector<SHORT>{0x0102, -2}));
     b.io->put_InstrumentBigEndian(VARIANT_FALSE);
     ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK);
     EXPECT_EQ(static_cast<SHORT*>(v.parray->pvData)[0], 0x0201);
@@ -174,9 +174,7 @@ TEST(FormattedIOTest, BlockSinkGetsTheWholeBlockOrRefusesIt) {
         S_OK);
     EXPECT_EQ(actual, 3);
     const SHORT* words = reinterpret_cast<const SHORT*>(sink.memory.data());
-    EXPECT_EQ(words[0], 0x0102);
-    EXPECT_EQ(words[1], -2);
-    EXPECT_EQ(words[2], -32768);
+    EXPECT_EQ(std::vector<SHORT>(words, words + 3), (std::vector<SHORT>{0x0102, -2, -32768}));
     sink.limit = 5;
     EXPECT_EQ(
         b.direct->ReadIEEEBlockToSink(BinaryType_I2, &sink, &actual, VARIANT_FALSE, VARIANT_TRUE),
