@@ -85,22 +85,18 @@ TEST_F(AcquisitionTraffic, HiResIsAveragingOverOneAcquisition) {
     // The count stays 1 while the type is HiRes: nothing is sent.
     EXPECT_EQ(Acq()->put_NumberOfAverages(16), S_OK);
 
-    Quorlen731XXAcquisitionTypeEnum type{};
     io_->Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "1\n");
-    EXPECT_EQ(Acq()->get_Type(&type), S_OK);
-    EXPECT_EQ(type, Quorlen731XXAcquisitionTypeHiRes);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_Type), Quorlen731XXAcquisitionTypeHiRes);
     io_->Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n");
-    EXPECT_EQ(Acq()->get_Type(&type), S_OK);
-    EXPECT_EQ(type, Quorlen731XXAcquisitionTypeAverage);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_Type),
+              Quorlen731XXAcquisitionTypeAverage);
 
     // No longer HiRes: the count is sent and remembered for Average.
     io_->Expect(":ACQ:COUN 16\n").Expect(":ACQ:TYPE AVER;:ACQ:COUN 16\n");
     EXPECT_EQ(Acq()->put_NumberOfAverages(16), S_OK);
     EXPECT_EQ(Acq()->put_Type(Quorlen731XXAcquisitionTypeAverage), S_OK);
     io_->Expect(":ACQ:COUN?\n", "64\n").Expect(":ACQ:TYPE AVER;:ACQ:COUN 64\n");
-    LONG count = 0;
-    EXPECT_EQ(IviAcq()->get_NumberOfAverages(&count), S_OK);
-    EXPECT_EQ(count, 64);
+    EXPECT_EQ(Got(IviAcq(), &IIviScopeAcquisition::get_NumberOfAverages), 64);
     EXPECT_EQ(Acq()->put_Type(Quorlen731XXAcquisitionTypeAverage), S_OK);
 }
 
@@ -109,9 +105,7 @@ TEST_F(AcquisitionTraffic, CountReadWhileHiResIsNotTakenForAverage) {
     io_->Expect(":ACQ:COUN 32\n").Expect(":ACQ:TYPE AVER;:ACQ:COUN 1\n").Expect(":ACQ:COUN?\n", "1\n");
     EXPECT_EQ(Acq()->put_NumberOfAverages(32), S_OK);
     EXPECT_EQ(Acq()->put_Type(Quorlen731XXAcquisitionTypeHiRes), S_OK);
-    LONG count = 0;
-    EXPECT_EQ(Acq()->get_NumberOfAverages(&count), S_OK);
-    EXPECT_EQ(count, 1);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_NumberOfAverages), 1);
     io_->Expect(":ACQ:TYPE AVER;:ACQ:COUN 32\n");
     EXPECT_EQ(Acq()->put_Type(Quorlen731XXAcquisitionTypeAverage), S_OK);
 }
@@ -131,8 +125,8 @@ TEST_F(AcquisitionTraffic, AcquisitionTypesWithAndWithoutTokens) {
 
     Quorlen731XXAcquisitionTypeEnum type{};
     io_->Expect("ACQ:TYPE?\n", "PEAK\n").Expect("ACQ:TYPE?\n", "ENV\n");
-    EXPECT_EQ(Acq()->get_Type(&type), S_OK);
-    EXPECT_EQ(type, Quorlen731XXAcquisitionTypePeakDetect);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_Type),
+              Quorlen731XXAcquisitionTypePeakDetect);
     EXPECT_EQ(Acq()->get_Type(&type), E_IVI_UNEXPECTED_RESPONSE);
 }
 
@@ -146,25 +140,21 @@ TEST_F(AcquisitionTraffic, InterpolationSetsVectorsAndSamplingMode) {
 
     IviScopeInterpolationEnum interpolation{};
     io_->Expect(":DISP:VECT?\n", "1\n").Expect(":DISP:VECT?\n", "2\n");
-    EXPECT_EQ(IviAcq()->get_Interpolation(&interpolation), S_OK);
-    EXPECT_EQ(interpolation, IviScopeInterpolationSineX);
+    EXPECT_EQ(Got(IviAcq(), &IIviScopeAcquisition::get_Interpolation), IviScopeInterpolationSineX);
     EXPECT_EQ(IviAcq()->get_Interpolation(&interpolation), E_IVI_UNEXPECTED_RESPONSE);
 
     Quorlen731XXSampleModeEnum mode{};
     io_->Expect(":ACQ:MODE?\n", "ETIM\n").Expect(":ACQ:MODE?\n", "SEGM\n");
-    EXPECT_EQ(Acq()->get_SampleMode(&mode), S_OK);
-    EXPECT_EQ(mode, Quorlen731XXSampleModeEquivalentTime);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_SampleMode),
+              Quorlen731XXSampleModeEquivalentTime);
     EXPECT_EQ(Acq()->get_SampleMode(&mode), E_IVI_UNEXPECTED_RESPONSE);
 }
 
 TEST_F(AcquisitionTraffic, SampleRateIsTheInverseIncrementOrZero) {
     Open("73141D");
     io_->Expect(":WAV:XINC?\n", "0\n").Expect(":WAV:XINC?\n", "2E-9\n");
-    double rate = -1;
-    EXPECT_EQ(Acq()->get_SampleRate(&rate), S_OK);
-    EXPECT_EQ(rate, 0.0);
-    EXPECT_EQ(IviAcq()->get_SampleRate(&rate), S_OK);
-    EXPECT_DOUBLE_EQ(rate, 5e8);
+    EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_SampleRate), 0.0);
+    EXPECT_DOUBLE_EQ(Got(IviAcq(), &IIviScopeAcquisition::get_SampleRate), 5e8);
 }
 
 TEST_F(AcquisitionTraffic, EnvelopesAreNotSupported) {

@@ -32,12 +32,10 @@ TEST_F(ChannelTraffic, ImpedanceIsOneMegohmOrFiftyOhmWhereFitted) {
         }
         EXPECT_TRUE(io_->Done());
     }
-    double ohms = 0;
     io_->Expect(":CHAN2:IMP?\n", "FIFT\n").Expect(":CHAN2:IMP?\n", "ONEM\n");
-    EXPECT_EQ(Ivi(2)->get_InputImpedance(&ohms), S_OK);
-    EXPECT_EQ(ohms, 50.0);
-    EXPECT_EQ(User(2)->get_InputImpedance(&ohms), S_OK);
-    EXPECT_EQ(ohms, 1e6);
+    EXPECT_EQ(Got(Ivi(2).get(), &IIviScopeChannel::get_InputImpedance), 50.0);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_InputImpedance), 1e6);
+    double ohms = 0;
     io_->Expect(":CHAN2:IMP?\n", "75\n");
     EXPECT_EQ(User(2)->get_InputImpedance(&ohms), E_IVI_UNEXPECTED_RESPONSE);
 }
@@ -48,45 +46,37 @@ TEST_F(ChannelTraffic, BandwidthLimitSwitchesAtTheFilterFrequency) {
     EXPECT_EQ(User(2)->put_InputFrequencyMax(2.5e7), S_OK);
     EXPECT_EQ(User(2)->put_InputFrequencyMax(2.5e7 + 1), S_OK);
     EXPECT_EQ(Ivi(2)->put_InputFrequencyMax(1.0), S_OK);
-    double hz = 0;
     io_->Expect(":CHAN2:BWL?\n", "1\n").Expect(":CHAN2:BWL?\n", "0\n");
-    EXPECT_EQ(User(2)->get_InputFrequencyMax(&hz), S_OK);
-    EXPECT_EQ(hz, 2.5e7);
-    EXPECT_EQ(User(2)->get_InputFrequencyMax(&hz), S_OK);
-    EXPECT_EQ(hz, 3e8);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_InputFrequencyMax), 2.5e7);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_InputFrequencyMax), 3e8);
 }
 
 TEST_F(ChannelTraffic, AutomaticProbeSensingSendsNothing) {
     Open("73141D");
-    double attenuation = 0;
+    const auto probe = [&](int n) {
+        return Got(User(n).get(), &IQuorlen731XXChannel::get_ProbeAttenuation);
+    };
     // A new channel asks the instrument.
     io_->Expect(":CHAN1:PROB?\n", "10\n");
-    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
-    EXPECT_EQ(attenuation, 10.0);
-
+    EXPECT_EQ(probe(1), 10.0);
     EXPECT_EQ(Ivi(1)->put_ProbeAttenuation(-1.0), S_OK);
-    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
-    EXPECT_EQ(attenuation, -1.0);
+    EXPECT_EQ(probe(1), -1.0);
     // Channel 2 keeps its own state.
     io_->Expect(":CHAN2:PROB?\n", "1\n");
-    EXPECT_EQ(User(2)->get_ProbeAttenuation(&attenuation), S_OK);
-    EXPECT_EQ(attenuation, 1.0);
-
+    EXPECT_EQ(probe(2), 1.0);
     io_->Expect(":CHAN1:PROB 100\n").Expect(":CHAN1:PROB?\n", "100\n");
     EXPECT_EQ(User(1)->put_ProbeAttenuation(100.0), S_OK);
-    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
-    EXPECT_EQ(attenuation, 100.0);
+    EXPECT_EQ(probe(1), 100.0);
     // The sensed value is not remembered as an attenuation.
     io_->Expect(":CHAN1:PROB?\n", "100\n");
-    EXPECT_EQ(User(1)->get_ProbeSense(&attenuation), S_OK);
+    Got(User(1).get(), &IQuorlen731XXChannel::get_ProbeSense);
 
     // Reset puts the instrument's probe back at its default: automatic
     // sensing is no longer remembered, the instrument is asked.
     EXPECT_EQ(Ivi(1)->put_ProbeAttenuation(-1.0), S_OK);
     io_->Expect("*RST;*OPC?\n", "1\n").Expect(":CHAN1:PROB?\n", "1\n");
     EXPECT_EQ(driver_->Reset(), S_OK);
-    EXPECT_EQ(User(1)->get_ProbeAttenuation(&attenuation), S_OK);
-    EXPECT_EQ(attenuation, 1.0);
+    EXPECT_EQ(probe(1), 1.0);
 }
 
 TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {
@@ -104,12 +94,10 @@ TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {
     Open("73122A");
     io_->Expect(":CHAN2:COUP GND\n");
     EXPECT_EQ(Ivi(2)->put_Coupling(IviScopeVerticalCouplingGnd), S_OK);
-    IviScopeVerticalCouplingEnum coupling{};
     io_->Expect(":CHAN2:COUP?\n", "GND\n").Expect(":CHAN2:COUP?\n", "DC\n");
-    EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), S_OK);
-    EXPECT_EQ(coupling, IviScopeVerticalCouplingGnd);
-    EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), S_OK);
-    EXPECT_EQ(coupling, IviScopeVerticalCouplingDC);
+    EXPECT_EQ(Got(Ivi(2).get(), &IIviScopeChannel::get_Coupling), IviScopeVerticalCouplingGnd);
+    EXPECT_EQ(Got(Ivi(2).get(), &IIviScopeChannel::get_Coupling), IviScopeVerticalCouplingDC);
+    IviScopeVerticalCouplingEnum coupling{};
     io_->Expect(":CHAN2:COUP?\n", "LFR\n");
     EXPECT_EQ(Ivi(2)->get_Coupling(&coupling), E_IVI_UNEXPECTED_RESPONSE);
 }
@@ -149,13 +137,12 @@ TEST_F(ChannelTraffic, SkewAndProtectionNeedTheirFeatures) {
     io_->Expect(":CHAN2:PROB:SKEW -1.23456789012346e-09\n")
         .Expect(":CHAN2:PROB:SKEW?\n", "-1.23456789012346E-09\n");
     EXPECT_EQ(User(2)->put_ProbeSkew(-1.2345678901234567e-9), S_OK);
-    EXPECT_EQ(User(2)->get_ProbeSkew(&skew), S_OK);
-    EXPECT_EQ(skew, -1.23456789012346e-9);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_ProbeSkew), -1.23456789012346e-9);
     io_->Expect(":CHAN2:PROT?\n", "NORM\n").Expect(":CHAN2:PROT?\n", "TRIP\n");
-    EXPECT_EQ(User(2)->get_Protection(&protection), S_OK);
-    EXPECT_EQ(protection, Quorlen731XXChannelProtectionOK);
-    EXPECT_EQ(User(2)->get_Protection(&protection), S_OK);
-    EXPECT_EQ(protection, Quorlen731XXChannelProtectionTripped);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_Protection),
+              Quorlen731XXChannelProtectionOK);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_Protection),
+              Quorlen731XXChannelProtectionTripped);
     io_->Expect(":CHAN2:PROT:CLE\n");
     EXPECT_EQ(User(2)->ClearProtection(), S_OK);
 }
@@ -172,8 +159,7 @@ TEST_F(ChannelTraffic, LabelsWithLineBreaksOrNulAreRefused) {
     io_->Expect(":CHAN1:LAB \"Clock\"\n").Expect(":CHAN1:LAB?\n", "\"Clock\"\n");
     com::Bstr label("\"Clock\"");
     EXPECT_EQ(User(1)->put_Label(label.get()), S_OK);
-    EXPECT_EQ(User(1)->get_Label(label.Out()), S_OK);
-    EXPECT_EQ(label.utf8(), "\"Clock\"");
+    EXPECT_EQ(Got(User(1).get(), &IQuorlen731XXChannel::get_Label), "\"Clock\"");
 }
 
 // A text read before the status check failed is delivered with the failure,

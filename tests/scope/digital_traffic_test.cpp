@@ -3,6 +3,8 @@
 // the channel's pod.
 #include <gtest/gtest.h>
 
+#include <vector>
+
 #include "io/io_manager.h"
 #include "tests/scope/scope_fixture.h"
 
@@ -31,12 +33,8 @@ TEST_F(DigitalTraffic, PropertiesUseTheZeroBasedIndex) {
     EXPECT_EQ(Dig(9)->put_Label(bad.get()), E_IVI_INVALID_VALUE);
 
     io_->Expect(":DIG9:DISP?\n", "1\n").Expect(":DIG8:THR?\n", "+1.4E+00\n");
-    VARIANT_BOOL on = VARIANT_FALSE;
-    double volts = 0;
-    EXPECT_EQ(Dig(9)->get_Enabled(&on), S_OK);
-    EXPECT_EQ(on, VARIANT_TRUE);
-    EXPECT_EQ(Dig(8)->get_Threshold(&volts), S_OK);
-    EXPECT_EQ(volts, 1.4);
+    EXPECT_EQ(Got(Dig(9).get(), &IQuorlen731XXDigitalChannel::get_Enabled), VARIANT_TRUE);
+    EXPECT_EQ(Got(Dig(8).get(), &IQuorlen731XXDigitalChannel::get_Threshold), 1.4);
 }
 
 TEST_F(DigitalTraffic, TransfersSelectThePodAndRestoreTheTimeout) {
@@ -68,16 +66,14 @@ TEST_F(DigitalTraffic, TransfersSelectThePodAndRestoreTheTimeout) {
 }
 
 TEST_F(DigitalTraffic, SimulatedTransfersGiveZeroBytes) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    driver_ = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=73142D");
-    ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    driver_ = SimulatedDriver("73142D");
     SAFEARRAY* a = nullptr;
     double x0 = 1, dx = 1;
     ASSERT_EQ(Dig(3)->ReadDigitalWaveform(Quorlen731XXTimeOutEnum(10), &a, &x0, &dx), S_OK);
     com::SafeArray bytes(a);
-    ASSERT_EQ(bytes.size(), 100u);
-    for (std::size_t i = 0; i < bytes.size(); ++i) EXPECT_EQ(bytes.data<std::uint8_t>()[i], 0);
+    EXPECT_EQ(std::vector<std::uint8_t>(bytes.data<std::uint8_t>(),
+                                        bytes.data<std::uint8_t>() + bytes.size()),
+              std::vector<std::uint8_t>(100, 0));
     EXPECT_EQ(x0, 0.0);
     EXPECT_EQ(dx, 0.0);
 }

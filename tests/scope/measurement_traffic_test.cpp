@@ -213,10 +213,7 @@ TEST_F(MeasurementTraffic, TheGivenTimeoutHoldsForTheQueryAndIsRestoredOnEveryPa
 }
 
 TEST_F(MeasurementTraffic, FunctionNamesAndSimulatedResults) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    driver_ = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=73142D");
-    ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    driver_ = SimulatedDriver("73142D");
     ComPtr<IQuorlen731XXMeasurement> m = Meas("UserChannel1");
     const std::pair<LONG, const char*> names[] = {
         {0, "Rise Time"},        {13, "Neg Duty Cycle"}, {14, "Pos Duty Cycle"},
@@ -257,16 +254,13 @@ TEST_F(MeasurementTraffic, ReferenceLevelWritesCompleteTheDefinitionFromTheInstr
     io_->Expect(":MEAS:DEF? THR\n", percent).Expect(":MEAS:DEF THR,PERC,89.75,50,10.5\n");
     EXPECT_EQ(Ref()->Configure(10.5, 50, 89.75), S_OK);
 
-    double high = 0, mid = 0, low = 0;
     io_->Expect(":MEAS:DEF? THR\n", absolute)
         .Expect(":MEAS:DEF? THR\n", absolute)
         .Expect(":MEAS:DEF? THR\n", absolute);
-    EXPECT_EQ(Ref()->get_High(&high), S_OK);
-    EXPECT_EQ(static_cast<IIviScopeReferenceLevel*>(driver_.get())->get_Mid(&mid), S_OK);
-    EXPECT_EQ(Ref()->get_Low(&low), S_OK);
-    EXPECT_EQ(high, 1.5);
-    EXPECT_EQ(mid, 0.5);
-    EXPECT_EQ(low, -0.25);
+    EXPECT_EQ(Got(Ref(), &IQuorlen731XXReferenceLevel::get_High), 1.5);
+    EXPECT_EQ(Got(driver_.get(), &IIviScopeReferenceLevel::get_Mid), 0.5);
+    EXPECT_EQ(Got(Ref(), &IQuorlen731XXReferenceLevel::get_Low), -0.25);
+    double high = 0, mid = 0;
 
     // Replies that are not a definition: the read fails, the write sends nothing.
     for (const char* bad : {"PERC,90,50,10\n", "THR,PERC,90,50\n", "THR,perc,90,50,10\n",
@@ -279,7 +273,6 @@ TEST_F(MeasurementTraffic, ReferenceLevelWritesCompleteTheDefinitionFromTheInstr
         EXPECT_TRUE(io_->Done());
     }
     // An unknown mode still delivers the level it read.
-    high = 0;
     io_->Expect(":MEAS:DEF? THR\n", "THR,DIV,7,5,3\n").Expect(":MEAS:DEF? THR\n", "THR,DIV,7,5,3\n");
     EXPECT_EQ(Ref()->get_High(&high), E_IVI_UNEXPECTED_RESPONSE);
     EXPECT_EQ(high, 7.0);
@@ -288,13 +281,11 @@ TEST_F(MeasurementTraffic, ReferenceLevelWritesCompleteTheDefinitionFromTheInstr
 
 TEST_F(MeasurementTraffic, DelayEdgesReadAndWriteAsSignedNumbers) {
     Open("73142D");
-    LONG occurrence = 0;
-    Quorlen731XXMeasurementSlopeEnum slope = Quorlen731XXMeasurementSlopePositive;
+    using M = IQuorlen731XXMultiWaveformMeasurement;
     io_->Expect(":MEAS:DEF? DEL\n", "1,-2\n").Expect(":MEAS:DEF? DEL\n", "+1,-2\n");
-    EXPECT_EQ(Multi()->get_DelaySlope2(&slope), S_OK);
-    EXPECT_EQ(slope, Quorlen731XXMeasurementSlopeNegative);
-    EXPECT_EQ(Multi()->get_DelayOccurence2(&occurrence), S_OK);
-    EXPECT_EQ(occurrence, 2);
+    EXPECT_EQ(Got(Multi(), &M::get_DelaySlope2), Quorlen731XXMeasurementSlopeNegative);
+    EXPECT_EQ(Got(Multi(), &M::get_DelayOccurence2), 2);
+    LONG occurrence = 0;
 
     struct Write {
         const char* current;
@@ -374,10 +365,7 @@ TEST_F(MeasurementTraffic, SecondSourceMustBeAnAnalogChannel) {
         {"CHAN1,CHAN3\n", "UserChannel3"}, {"CHAN1\n", ""}, {"CHAN1, DIG12\n", "UserDigitalChannel12"}};
     for (const auto& [reply, name] : reads) {
         io_->Expect(":MEAS:SOUR?\n", reply);
-        BSTR s = nullptr;
-        EXPECT_EQ(Multi()->get_Source2(&s), S_OK);
-        EXPECT_EQ(com::BstrToUtf8(s), name);
-        SysFreeString(s);
+        EXPECT_EQ(Got(Multi(), &IQuorlen731XXMultiWaveformMeasurement::get_Source2), name);
     }
 }
 
@@ -408,27 +396,19 @@ TEST_F(MeasurementTraffic, SlopesOutsideTheirSetAreRefused) {
         EXPECT_EQ(Conf()->put_TimeAtValueSlope(slope), E_IVI_INVALID_VALUE);
         EXPECT_NE(ErrorText().find("put_TimeAtValueSlope"), std::string::npos);
     }
-    Quorlen731XXMeasurementSlopeEnum slope = Quorlen731XXMeasurementSlopeNegative;
-    EXPECT_EQ(Conf()->get_TimeAtEdgeSlope(&slope), S_OK);
-    EXPECT_EQ(slope, Quorlen731XXMeasurementSlopePositive);
+    EXPECT_EQ(Got(Conf(), &IQuorlen731XXConfigurableMeasurement::get_TimeAtEdgeSlope),
+              Quorlen731XXMeasurementSlopePositive);
 }
 
 TEST_F(MeasurementTraffic, SimulatedReferenceLevelsAndActivity) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    driver_ = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=73142D");
-    ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    auto* ivi = static_cast<IIviScopeReferenceLevel*>(driver_.get());
-    double high = 0, mid = 0, low = 0;
-    EXPECT_EQ(ivi->get_High(&high), S_OK);
-    EXPECT_EQ(high, 90.0);
-    EXPECT_EQ(ivi->Configure(15, 45, 85), S_OK);
-    EXPECT_EQ(Ref()->get_High(&high), S_OK);
-    EXPECT_EQ(ivi->get_Mid(&mid), S_OK);
-    EXPECT_EQ(Ref()->get_Low(&low), S_OK);
-    EXPECT_EQ(high, 85.0);
-    EXPECT_EQ(mid, 45.0);
-    EXPECT_EQ(low, 15.0);
+    driver_ = SimulatedDriver("73142D");
+    using R = IIviScopeReferenceLevel;
+    using M = IQuorlen731XXMultiWaveformMeasurement;
+    EXPECT_EQ(Got(driver_.get(), &R::get_High), 90.0);
+    EXPECT_EQ(static_cast<R*>(driver_.get())->Configure(15, 45, 85), S_OK);
+    EXPECT_EQ(Got(Ref(), &IQuorlen731XXReferenceLevel::get_High), 85.0);
+    EXPECT_EQ(Got(driver_.get(), &R::get_Mid), 45.0);
+    EXPECT_EQ(Got(Ref(), &IQuorlen731XXReferenceLevel::get_Low), 15.0);
     EXPECT_EQ(Multi()->ResetActivity(), E_IVI_METHOD_NOT_SUPPORTED);
     LONG edges = 0, levels = 0;
     EXPECT_EQ(Multi()->ReadActivity(&edges, &levels), E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
@@ -436,13 +416,8 @@ TEST_F(MeasurementTraffic, SimulatedReferenceLevelsAndActivity) {
     EXPECT_EQ(Multi()->ConfigureDelay(ch3.get(), Quorlen731XXMeasurementSlopeNegative,
                                       Quorlen731XXMeasurementSlopePositive, 2, 4),
               S_OK);
-    BSTR s = nullptr;
-    LONG occurrence = 0;
-    EXPECT_EQ(Multi()->get_Source2(&s), S_OK);
-    EXPECT_EQ(com::BstrToUtf8(s), "UserChannel3");
-    SysFreeString(s);
-    EXPECT_EQ(Multi()->get_DelayOccurence2(&occurrence), S_OK);
-    EXPECT_EQ(occurrence, 4);
+    EXPECT_EQ(Got(Multi(), &M::get_Source2), "UserChannel3");
+    EXPECT_EQ(Got(Multi(), &M::get_DelayOccurence2), 4);
 }
 
 }  // namespace

@@ -113,10 +113,7 @@ TEST_F(RefusedValues, NothingIsSentToTheInstrument) {
 }
 
 TEST_F(RefusedValues, NothingIsStoredInSimulation) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    driver_ = com::MakeComObject<Quorlen731XX>();
-    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=QMS4104B");
-    ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
+    driver_ = SimulatedDriver("QMS4104B");
     for (const Case& c : kCases) {
         SCOPED_TRACE(c.what);
         const std::string before = c.read ? c.read(*driver_.get()) : "";

@@ -7,6 +7,7 @@
 
 #include <cstdlib>
 #include <string>
+#include <type_traits>
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
@@ -23,6 +24,30 @@ ComPtr<Itf> ChannelNamed(Quorlen731XX& driver, const char* name) {
     com::Bstr n(name);
     EXPECT_EQ(static_cast<Collection*>(&driver)->get_Item(n.get(), channel.Out()), S_OK) << name;
     return channel;
+}
+
+// The value a getter gives (a BSTR as UTF-8 text), its success checked.
+template <class Itf, class T>
+auto Got(std::type_identity_t<Itf>* itf, HRESULT (Itf::*get)(T*)) {
+    if constexpr (std::is_same_v<T, BSTR>) {
+        com::Bstr s;
+        EXPECT_EQ((itf->*get)(s.Out()), S_OK) << ErrorText();
+        return s.utf8();
+    } else {
+        T v{};
+        EXPECT_EQ((itf->*get)(&v), S_OK) << ErrorText();
+        return v;
+    }
+}
+
+// A driver object simulating `model`, with `more` appended to its options.
+inline ComPtr<Quorlen731XX> SimulatedDriver(const std::string& model, const std::string& more = "") {
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
+    ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();
+    com::Bstr r(""), o("Simulate=true,DriverSetup=Model=" + model + more);
+    EXPECT_EQ(driver->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK)
+        << ErrorText();
+    return driver;
 }
 
 class ScriptedScopeTest : public ScriptedSessionTest<> {

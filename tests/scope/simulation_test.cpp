@@ -100,12 +100,7 @@ std::vector<PropertyRow> ChannelRows(IQuorlen731XXChannel* ch, double k) {
 
 class SimulatedScope : public ::testing::Test {
 protected:
-    void SetUp() override { ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1); }
-    void Open(const char* model) {
-        driver_ = com::MakeComObject<Quorlen731XX>();
-        com::Bstr r(""), o(std::string("Simulate=true,DriverSetup=Model=") + model);
-        ASSERT_EQ(driver_->Initialize(r.get(), VARIANT_FALSE, VARIANT_FALSE, o.get()), S_OK);
-    }
+    void Open(const char* model) { driver_ = SimulatedDriver(model); }
     ComPtr<IQuorlen731XXChannel> User(int n) {
         return ChannelNamed<IQuorlen731XXChannels, IQuorlen731XXChannel>(
             *driver_.get(), ("UserChannel" + std::to_string(n)).c_str());
@@ -130,27 +125,22 @@ TEST_F(SimulatedScope, AcquisitionStoresOfBothInterfacesAreIndependent) {
     for (PropertyRow& r : ivi) r.initial = r.written;
     ExpectInitial(ivi);
     // The forwarded Type writes the instrument-specific value.
-    Quorlen731XXAcquisitionTypeEnum type{};
-    EXPECT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver_.get())->get_Type(&type), S_OK);
-    EXPECT_EQ(type, Quorlen731XXAcquisitionTypeAverage);
+    EXPECT_EQ(Got(driver_.get(), &IQuorlen731XXAcquisition::get_Type),
+              Quorlen731XXAcquisitionTypeAverage);
 }
 
 TEST_F(SimulatedScope, ConfigureRecordWritesTheInstrumentSpecificSettings) {
     Open("QDS4032A");
     IIviScopeAcquisition* ivi = driver_.get();
     IQuorlen731XXAcquisition* acq = driver_.get();
+    using A = IQuorlen731XXAcquisition;
     ASSERT_EQ(ivi->ConfigureRecord(0.01, 500, -0.002), S_OK);
-    double t = 0;
-    LONG n = 0;
-    EXPECT_EQ(acq->get_TimePerRecord(&t), S_OK);
-    EXPECT_EQ(t, 0.01);
-    EXPECT_EQ(acq->get_NumberOfPointsMin(&n), S_OK);
-    EXPECT_EQ(n, 500);
-    EXPECT_EQ(acq->get_StartTime(&t), S_OK);
-    EXPECT_EQ(t, -0.002);
-    EXPECT_EQ(ivi->get_TimePerRecord(&t), S_OK);
-    EXPECT_EQ(t, 0.001);
+    EXPECT_EQ(Got(acq, &A::get_TimePerRecord), 0.01);
+    EXPECT_EQ(Got(acq, &A::get_NumberOfPointsMin), 500);
+    EXPECT_EQ(Got(acq, &A::get_StartTime), -0.002);
+    EXPECT_EQ(Got(ivi, &IIviScopeAcquisition::get_TimePerRecord), 0.001);
     // Envelopes fail in simulation too.
+    LONG n = 0;
     EXPECT_EQ(ivi->get_NumberOfEnvelopes(&n), E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
 }
 
@@ -170,12 +160,8 @@ TEST_F(SimulatedScope, ChannelStoresAreIndependentPerChannelAndInterface) {
     ExpectInitial(user1);
 
     // The class-compliant Enabled is the user channel's.
-    VARIANT_BOOL on = VARIANT_TRUE;
-    EXPECT_EQ(Ivi(1)->get_Enabled(&on), S_OK);
-    EXPECT_EQ(on, VARIANT_FALSE);
-    com::Bstr label;
-    EXPECT_EQ(User(3)->get_Label(label.Out()), S_OK);
-    EXPECT_EQ(label.utf8(), "\"1\"");
+    EXPECT_EQ(Got(Ivi(1).get(), &IIviScopeChannel::get_Enabled), VARIANT_FALSE);
+    EXPECT_EQ(Got(User(3).get(), &IQuorlen731XXChannel::get_Label), "\"1\"");
 }
 
 TEST_F(SimulatedScope, MethodsRunWithoutAnInstrument) {
@@ -184,14 +170,10 @@ TEST_F(SimulatedScope, MethodsRunWithoutAnInstrument) {
     // Simulated writes are stored as given, without the model's checks.
     ASSERT_EQ(Ivi(2)->Configure(5.0, 1.0, IviScopeVerticalCouplingGnd, 10.0, VARIANT_FALSE), S_OK);
     ASSERT_EQ(Ivi(2)->ConfigureCharacteristics(50.0, 2e7), S_OK);
-    Quorlen731XXVerticalCouplingEnum coupling{};
-    double v = 0;
-    EXPECT_EQ(User(2)->get_Coupling(&coupling), S_OK);
-    EXPECT_EQ(coupling, Quorlen731XXVerticalCouplingGnd);
-    EXPECT_EQ(User(2)->get_InputImpedance(&v), S_OK);
-    EXPECT_EQ(v, 50.0);
-    EXPECT_EQ(Ivi(2)->get_Range(&v), S_OK);
-    EXPECT_EQ(v, 40.0);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_Coupling),
+              Quorlen731XXVerticalCouplingGnd);
+    EXPECT_EQ(Got(User(2).get(), &IQuorlen731XXChannel::get_InputImpedance), 50.0);
+    EXPECT_EQ(Got(Ivi(2).get(), &IIviScopeChannel::get_Range), 40.0);
 }
 
 }  // namespace

@@ -52,6 +52,14 @@ class StatusTraffic : public ScriptedSessionTest<StatusProvider> {
 protected:
     IQuorlen731XXStatus* Status() { return driver_.get(); }
     IQuorlen731XXMeasurements* Measurements() { return driver_.get(); }
+    // Initiate of an Average acquisition: the abort sequence, the type, the
+    // saved enable, operation complete only, the old events read (by the
+    // status check when it is on, else by `esr`), then digitize.
+    void ExpectAverageInitiate(const char* count, const char* ese, const char* esr) {
+        Expect({":STOP", "ACQ:TYPE?|AVER", count, ese, "*ESE 1"});
+        if (esr) Expect({esr});
+        Expect({":DIG;*OPC"});
+    }
 };
 
 // 73141D has channel protection, 73121D has not; neither has the digitize
@@ -228,9 +236,7 @@ TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEven
     Open(kProtected);
     // Initiate: the abort sequence, the type (Average), the saved enable,
     // operation complete only, the old events read, then digitize.
-    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n")
-        .Expect("*ESE?\n", "36\n").Expect("*ESE 1\n").Expect("*ESR?\n", "0\n")
-        .Expect(":DIG;*OPC\n");
+    ExpectAverageInitiate(":ACQ:COUN?|8", "*ESE?|36", "*ESR?|0");
     EXPECT_EQ(Measurements()->Initiate(), S_OK);
     EXPECT_TRUE(driver_->Core().acquisition_control.pending);
 
@@ -257,8 +263,7 @@ TEST_F(StatusTraffic, AverageAcquisitionCompletesThroughTheOperationCompleteEven
 
 TEST_F(StatusTraffic, DigitizeIsSentWithoutAStatusCheck) {
     Open(kProtected, "QueryInstrStatus=true");
-    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n")
-        .Expect("*ESE?\n", "36\n").Expect("*ESE 1\n").Expect(":DIG;*OPC\n");
+    ExpectAverageInitiate(":ACQ:COUN?|8", "*ESE?|36", nullptr);
     EXPECT_EQ(Measurements()->Initiate(), S_OK);
     // The commands before it are checked; a status query after it would
     // read and clear the operation-complete event that ends the acquisition.
@@ -271,9 +276,7 @@ TEST_F(StatusTraffic, DigitizeIsSentWithoutAStatusCheck) {
 
 TEST_F(StatusTraffic, AbortEndsAPendingAcquisition) {
     Open(kProtected);
-    io_->Expect(":STOP\n").Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "4\n")
-        .Expect("*ESE?\n", "0\n").Expect("*ESE 1\n").Expect("*ESR?\n", "1\n")
-        .Expect(":DIG;*OPC\n");
+    ExpectAverageInitiate(":ACQ:COUN?|4", "*ESE?|0", "*ESR?|1");
     ASSERT_EQ(Measurements()->Initiate(), S_OK);
     const int clears = io_->Clears();
     io_->Expect("*ESE 0\n").Expect(":STOP\n");

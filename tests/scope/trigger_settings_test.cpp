@@ -97,23 +97,15 @@ TEST_F(TriggerSettings, CouplingIsReadThroughTheRejectFiltersFirst) {
     Open("73142A");
     for (const Case& c : cases) {
         SCOPED_TRACE(c.traffic.back());
-        for (int round = 0; round < 2; ++round) {
-            for (const char* m : c.traffic) Expect({m});
-            LONG v = -7;
-            HRESULT hr = E_FAIL;
-            if (round == 0) {
-                Quorlen731XXTriggerCouplingEnum d{};
-                hr = Trig()->get_Coupling(&d);
-                v = d;
-            } else {
-                IviScopeTriggerCouplingEnum i{};
-                hr = IviTrig()->get_Coupling(&i);
-                v = i;
-            }
-            EXPECT_EQ(hr, c.hr);
-            if (SUCCEEDED(c.hr)) {
-            EXPECT_EQ(v, round == 0 ? c.driver : c.ivi);
-        }
+        for (const char* m : c.traffic) Expect({m});
+        Quorlen731XXTriggerCouplingEnum d{};
+        EXPECT_EQ(Trig()->get_Coupling(&d), c.hr);
+        for (const char* m : c.traffic) Expect({m});
+        IviScopeTriggerCouplingEnum i{};
+        EXPECT_EQ(IviTrig()->get_Coupling(&i), c.hr);
+        if (SUCCEEDED(c.hr)) {
+            EXPECT_EQ(d, c.driver);
+            EXPECT_EQ(i, c.ivi);
         }
     }
 }
@@ -262,9 +254,7 @@ TEST_F(TriggerSettings, TvLineNumberReadsBackAcrossFields) {
     };
     for (const Case& c : cases) {
         for (const char* m : c.traffic) Expect({m});
-        LONG line = 0;
-        EXPECT_EQ(Tv()->get_LineNumber(&line), S_OK);
-        EXPECT_EQ(line, c.line);
+        EXPECT_EQ(Got(Tv(), &IQuorlen731XXTriggerTv::get_LineNumber), c.line);
     }
 }
 
@@ -363,11 +353,9 @@ TEST_F(TriggerSettings, WidthThresholdsReadBackAsWritten) {
 TEST_F(TriggerSettings, GlitchReadsStoreTheInstrumentsSettings) {
     Open("73142A");
     Expect({":TRIG:GLIT:QUAL?|GRE", ":TRIG:EDGE:SLOP?|NEG", ":TRIG:GLIT:POL?|EITH"});
-    Quorlen731XXGlitchConditionEnum condition{};
-    EXPECT_EQ(Glitch()->get_condition(&condition), S_OK);
+    Got(Glitch(), &IQuorlen731XXTriggerGlitch::get_condition);
     EXPECT_EQ(Shadow().glitch_condition, Quorlen731XXGlitchGreaterThan);
-    Quorlen731XXTriggerSlopeEnum slope{};
-    EXPECT_EQ(Edge()->get_Slope(&slope), S_OK);
+    Got(Edge(), &IQuorlen731XXTriggerEdge::get_Slope);
     EXPECT_EQ(Shadow().edge_slope, Quorlen731XXTriggerSlopeNegative);
     Quorlen731XXGlitchPolarityEnum polarity{};
     EXPECT_EQ(Glitch()->get_polarity(&polarity), E_IVI_UNEXPECTED_RESPONSE);
@@ -390,9 +378,7 @@ TEST_F(TriggerSettings, EdgeSlopesTravelAsTheirTokens) {
         SCOPED_TRACE(token);
         Expect({(":TRIG:SLOP " + token).c_str(), (":TRIG:EDGE:SLOP?|" + token).c_str()});
         EXPECT_EQ(Edge()->put_Slope(slope), S_OK);
-        Quorlen731XXTriggerSlopeEnum read{};
-        EXPECT_EQ(Edge()->get_Slope(&read), S_OK);
-        EXPECT_EQ(read, slope);
+        EXPECT_EQ(Got(Edge(), &IQuorlen731XXTriggerEdge::get_Slope), slope);
     }
 }
 
@@ -406,12 +392,8 @@ TEST_F(TriggerSettings, SimulatedSessionsKeepTheirValuesWithoutIo) {
               S_OK);
     EXPECT_EQ(State()->Configure(ch2.get(), 0.5, Quorlen731XXTriggerSlopeNegative, 1, 1, 0, 0),
               S_OK);
-    Quorlen731XXTriggerTypeEnum type{};
-    EXPECT_EQ(Trig()->get_Type(&type), S_OK);
-    EXPECT_EQ(type, Quorlen731XXTriggerGlitch);
-    double width = 0;
-    EXPECT_EQ(Glitch()->get_Width(&width), S_OK);
-    EXPECT_EQ(width, 1e-6);
+    EXPECT_EQ(Got(Trig(), &IQuorlen731XXTrigger::get_Type), Quorlen731XXTriggerGlitch);
+    EXPECT_EQ(Got(Glitch(), &IQuorlen731XXTriggerGlitch::get_Width), 1e-6);
     EXPECT_EQ(io_->Written().size(), 2u);
 }
 

@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <functional>
+#include <tuple>
 #include <vector>
 
 #include "tests/scope/trigger_fixture.h"
@@ -39,9 +40,7 @@ TEST_F(TriggerTraffic, SelectingATypeSendsItsWholeConfigurationOnANewSession) {
         for (const char* m : c.traffic) Expect({m});
         EXPECT_EQ(Trig()->put_Type(c.type), S_OK);
         EXPECT_TRUE(io_->Done());
-        Quorlen731XXTriggerTypeEnum now{};
-        EXPECT_EQ(Trig()->get_Type(&now), S_OK);
-        EXPECT_EQ(now, c.type);
+        EXPECT_EQ(Got(Trig(), &IQuorlen731XXTrigger::get_Type), c.type);
     }
 }
 
@@ -63,14 +62,10 @@ TEST_F(TriggerTraffic, RefusedTypesKeepThePreviousTypeAndSendNothing) {
     for (const Case& c : cases) {
         EXPECT_EQ(Trig()->put_Type(static_cast<Quorlen731XXTriggerTypeEnum>(c.type)), c.hr);
         EXPECT_NE(ErrorText().find(c.text), std::string::npos) << c.type;
-        Quorlen731XXTriggerTypeEnum now{};
-        EXPECT_EQ(Trig()->get_Type(&now), S_OK);
-        EXPECT_EQ(now, Quorlen731XXTriggerTV) << c.type;
+        EXPECT_EQ(Got(Trig(), &IQuorlen731XXTrigger::get_Type), Quorlen731XXTriggerTV) << c.type;
     }
-    IviScopeTriggerTypeEnum ivi{};
     EXPECT_EQ(IviTrig()->put_Type(IviScopeTriggerRunt), E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
-    EXPECT_EQ(IviTrig()->get_Type(&ivi), S_OK);
-    EXPECT_EQ(ivi, IviScopeTriggerTV);
+    EXPECT_EQ(Got(IviTrig(), &IIviScopeTrigger::get_Type), IviScopeTriggerTV);
 }
 
 // Each case writes a setting while Edge is current (nothing but the edge
@@ -202,9 +197,7 @@ TEST_F(TriggerTraffic, EdgeAfterACLineGetsItsSourceBack) {
     ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerEdge), S_OK);
     // Refused slopes send nothing and keep the stored one.
     EXPECT_EQ(AcLine()->put_Slope(Quorlen731XXACLineEither), E_IVI_INVALID_VALUE);
-    Quorlen731XXACLineSlopeEnum slope{};
-    EXPECT_EQ(AcLine()->get_Slope(&slope), S_OK);
-    EXPECT_EQ(slope, Quorlen731XXACLineNegative);
+    EXPECT_EQ(Got(AcLine(), &IQuorlen731XXTriggerAcLine::get_Slope), Quorlen731XXACLineNegative);
 }
 
 TEST_F(TriggerTraffic, DurationPatternFollowsTheSourceAndTheInstrument) {
@@ -268,22 +261,17 @@ TEST_F(TriggerTraffic, RefusedValuesNeverEnterTheShadow) {
         {"width configure either", [](TriggerTest& t) { com::Bstr s("UserChannel1"); return t.Width()->Configure(s.get(), 1.0, 1e-6, 2e-6, Quorlen731XXWidthEither, Quorlen731XXWidthWithin); }, E_IVI_INVALID_VALUE},
         {"state configure external", [](TriggerTest& t) { com::Bstr s("VAL_EXTERNAL"); return t.State()->Configure(s.get(), 1.0, Quorlen731XXTriggerSlopePositive, 1, 1, 0, 0); }, E_IVI_INVALID_VALUE},
     };
+    const auto fields = [](const TriggerShadow& s) {
+        return std::make_tuple(s.type, s.edge_slope, s.glitch_condition, s.glitch_polarity,
+                               s.width_polarity, s.width_condition, s.pattern_condition,
+                               s.state_clock_source, s.state_clock_slope, s.state.analog_mask);
+    };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
-        const TriggerShadow before = Shadow();
+        const auto before = fields(Shadow());
         EXPECT_EQ(c.write(*this), c.hr);
         EXPECT_FALSE(ErrorText().empty());
-        const TriggerShadow& after = Shadow();
-        EXPECT_EQ(after.type, before.type);
-        EXPECT_EQ(after.edge_slope, before.edge_slope);
-        EXPECT_EQ(after.glitch_condition, before.glitch_condition);
-        EXPECT_EQ(after.glitch_polarity, before.glitch_polarity);
-        EXPECT_EQ(after.width_polarity, before.width_polarity);
-        EXPECT_EQ(after.width_condition, before.width_condition);
-        EXPECT_EQ(after.pattern_condition, before.pattern_condition);
-        EXPECT_EQ(after.state_clock_source, before.state_clock_source);
-        EXPECT_EQ(after.state_clock_slope, before.state_clock_slope);
-        EXPECT_EQ(after.state.analog_mask, before.state.analog_mask);
+        EXPECT_EQ(fields(Shadow()), before);
     }
 }
 
