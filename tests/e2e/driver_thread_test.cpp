@@ -20,47 +20,17 @@
 #include "core/root.h"
 #include "emulator/emulator.h"
 #include "io/io_manager.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
 
-// A simulated channel property run through the method frame on a channel
-// object, as every simulated channel member is: the frame remembers a write
-// in the object's attribute store and returns it, or the default, on a read.
-constexpr double kLevelDefault = 1.5;
-const MemberInfo kGetLevel{"get_Level",
-                           "IIviScopeChannel",
-                           &iid_of<IIviScopeChannel>,
-                           FrameVariant::F,
-                           "IIviScopeChannel.Level",
-                           SimValue::Double(kLevelDefault),
-                           "",
-                           {"val"}};
-const MemberInfo kPutLevel{"put_Level",
-                           "IIviScopeChannel",
-                           &iid_of<IIviScopeChannel>,
-                           FrameVariant::G,
-                           "IIviScopeChannel.Level",
-                           SimValue::Double(kLevelDefault),
-                           "",
-                           {"val"}};
-// The body never runs while simulating.
-HRESULT NotSimulated() {
-    return E_UNEXPECTED;
-}
-
-HRESULT GetLevel(IIviScopeChannel* ch, double* v) {
-    return RunFrame(*static_cast<Quorlen731XXChannel*>(ch), kGetLevel, NotSimulated, out(v));
-}
-HRESULT PutLevel(IIviScopeChannel* ch, double v) {
-    return RunFrame(*static_cast<Quorlen731XXChannel*>(ch), kPutLevel, NotSimulated, in(v));
-}
-
+constexpr double kRangeDefault = 40.0;           // simulated IIviScopeChannel value
 constexpr double kTimePerRecordDefault = 0.001;  // simulated IIviScopeAcquisition value
 
 std::string TakeErrorText() {
-    com::ErrorRecord rec;
-    return com::TakeThreadError(&rec) ? rec.description : std::string("<none>");
+    const std::string text = ErrorText();
+    return text.empty() ? "<none>" : text;
 }
 
 template <class I>
@@ -135,8 +105,8 @@ TEST_F(DriverThreads, OneSimulatedSessionManyThreads) {
             for (int r = 0; r < kRounds; ++r) {
                 const double level = t * 1000 + r + 0.25;
                 double got = -1;
-                if (PutLevel(ch.get(), level) != S_OK || GetLevel(ch.get(), &got) != S_OK) ++bad;
-                if (got != level && !(pass == 1 && got == kLevelDefault)) ++bad;
+                if (ch->put_Range(level) != S_OK || ch->get_Range(&got) != S_OK) ++bad;
+                if (got != level && !(pass == 1 && got == kRangeDefault)) ++bad;
                 double tpr = -1;
                 if (acq->put_TimePerRecord(mine) != S_OK || acq->get_TimePerRecord(&tpr) != S_OK)
                     ++bad;
@@ -174,8 +144,8 @@ TEST_F(DriverThreads, OneSimulatedSessionManyThreads) {
         com::Bstr name("Channel" + std::to_string(t + 1));
         ASSERT_EQ(channels->get_Item(name.get(), &raw), S_OK);
         double got = -1;
-        EXPECT_EQ(GetLevel(raw, &got), S_OK);
-        EXPECT_EQ(got, kLevelDefault);
+        EXPECT_EQ(raw->get_Range(&got), S_OK);
+        EXPECT_EQ(got, kRangeDefault);
         EXPECT_EQ(static_cast<Quorlen731XXChannel*>(raw)->CallContexts().Depth(), 0u);
         raw->Release();
     }
@@ -194,8 +164,7 @@ TEST_F(DriverThreads, ManySessionsAtOnce) {
     std::vector<std::string> resources;
     for (const auto& model : emulated) {
         emus.push_back(std::make_unique<emu::Emulator>(model));
-        resources.push_back("TCPIP0::127.0.0.1::" + std::to_string(emus.back()->Start()) +
-                            "::SOCKET");
+        resources.push_back(SocketResource(emus.back()->Start()));
     }
     struct Plan {
         std::string resource, options, model;
@@ -273,7 +242,7 @@ TEST_F(DriverThreads, ManySessionsAtOnce) {
 // for another.
 TEST_F(DriverThreads, SharedInstrumentSessionKeepsRepliesApart) {
     emu::Emulator emu("QDS4032A");
-    const std::string resource = "TCPIP0::127.0.0.1::" + std::to_string(emu.Start()) + "::SOCKET";
+    const std::string resource = SocketResource(emu.Start());
     auto driver = com::MakeComObject<Quorlen731XX>();
     ASSERT_EQ(Init(driver.get(), resource, "QueryInstrStatus=true", true), S_OK) << TakeErrorText();
     auto acq = As<IQuorlen731XXAcquisition>(driver);

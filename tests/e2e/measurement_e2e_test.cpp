@@ -12,6 +12,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
+#include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
 
 namespace qn::test {
@@ -29,15 +30,10 @@ protected:
                                                 ":EMUL:INP1 SIN,1E3,2,0;:EMUL:INP2 SQU,1E3,4,90"),
                   S_OK);
     }
-    ComPtr<IQuorlen731XXMeasurement> Meas(const std::string& name) {
-        ComPtr<IQuorlen731XXMeasurement> m;
-        com::Bstr n(name);
-        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
-                  S_OK);
-        return m;
-    }
     HRESULT Measure(const std::string& name, Quorlen731XXMeasurementEnum f, double* v) {
-        return Meas(name)->FetchWaveformMeasurement(f, v);
+        return ChannelNamed<IQuorlen731XXMeasurements, IQuorlen731XXMeasurement>(*driver.get(),
+                                                                                name.c_str())
+            ->FetchWaveformMeasurement(f, v);
     }
 };
 
@@ -108,24 +104,17 @@ TEST_P(MeasurementOnEmulator, ImpossibleMeasurementsAndHiddenSourcesAreRefused) 
 TEST_P(MeasurementOnEmulator, ReferenceLevelsAndDelayEdgesRoundTrip) {
     auto* ref = static_cast<IIviScopeReferenceLevel*>(driver.get());
     ASSERT_EQ(ref->Configure(20.0, 45.5, 80.25), S_OK);
-    double high = 0, mid = 0, low = 0;
-    ASSERT_EQ(ref->get_High(&high), S_OK);
-    ASSERT_EQ(ref->get_Mid(&mid), S_OK);
-    ASSERT_EQ(ref->get_Low(&low), S_OK);
-    EXPECT_EQ(high, 80.25);
-    EXPECT_EQ(mid, 45.5);
-    EXPECT_EQ(low, 20.0);
-    auto* multi = static_cast<IQuorlen731XXMultiWaveformMeasurement*>(driver.get());
+    EXPECT_EQ(Got(ref, &IIviScopeReferenceLevel::get_High), 80.25);
+    EXPECT_EQ(Got(ref, &IIviScopeReferenceLevel::get_Mid), 45.5);
+    EXPECT_EQ(Got(ref, &IIviScopeReferenceLevel::get_Low), 20.0);
+    using M = IQuorlen731XXMultiWaveformMeasurement;
+    M* multi = driver.get();
     com::Bstr ch2("UserChannel2");
     ASSERT_EQ(multi->ConfigureDelay(ch2.get(), Quorlen731XXMeasurementSlopePositive,
                                     Quorlen731XXMeasurementSlopeNegative, 1, 2),
               S_OK);
-    Quorlen731XXMeasurementSlopeEnum slope = Quorlen731XXMeasurementSlopePositive;
-    LONG occurrence = 0;
-    ASSERT_EQ(multi->get_DelaySlope2(&slope), S_OK);
-    ASSERT_EQ(multi->get_DelayOccurence2(&occurrence), S_OK);
-    EXPECT_EQ(slope, Quorlen731XXMeasurementSlopeNegative);
-    EXPECT_EQ(occurrence, 2);
+    EXPECT_EQ(Got(multi, &M::get_DelaySlope2), Quorlen731XXMeasurementSlopeNegative);
+    EXPECT_EQ(Got(multi, &M::get_DelayOccurence2), 2);
     // First rising edge of the sine to the second falling edge of the square
     // (-1.25 ms; the first is at -2.25 ms). The sine crosses the middle level
     // of 45.5 % (-0.09 V) before -2 ms.
@@ -141,11 +130,8 @@ TEST(DigitalOnEmulator, PodsCarryTheirPatternAndChannelsTheirOwnBit) {
     ASSERT_EQ(session.Open("QMS4034A"), S_OK) << ErrorText();
     const ComPtr<Quorlen731XX>& driver = session.driver;
     auto dig = [&](int d) {
-        ComPtr<IQuorlen731XXDigitalChannel> c;
-        com::Bstr n("UserDigitalChannel" + std::to_string(d));
-        EXPECT_EQ(static_cast<IQuorlen731XXDigitalChannels*>(driver.get())->get_Item(n.get(), c.Out()),
-                  S_OK);
-        return c;
+        return ChannelNamed<IQuorlen731XXDigitalChannels, IQuorlen731XXDigitalChannel>(
+            *driver.get(), ("UserDigitalChannel" + std::to_string(d)).c_str());
     };
     SAFEARRAY* a = nullptr;
     double x0 = 0, dx = 0;
@@ -153,9 +139,7 @@ TEST(DigitalOnEmulator, PodsCarryTheirPatternAndChannelsTheirOwnBit) {
     EXPECT_EQ(dig(3)->FetchDigitalWaveform(&a, &x0, &dx), E_IVISCOPE_CHANNEL_NOT_ENABLED);
     ASSERT_EQ(dig(3)->put_Enabled(VARIANT_TRUE), S_OK);
     ASSERT_EQ(dig(3)->put_Threshold(-0.75), S_OK);
-    double threshold = 0;
-    ASSERT_EQ(dig(3)->get_Threshold(&threshold), S_OK);
-    EXPECT_EQ(threshold, -0.75);
+    EXPECT_EQ(Got(dig(3).get(), &IQuorlen731XXDigitalChannel::get_Threshold), -0.75);
     ASSERT_EQ(dig(3)->ReadDigitalWaveform(Quorlen731XXTimeOutEnum(5000), &a, &x0, &dx), S_OK);
     com::SafeArray pod3(a);
     a = nullptr;  // output arrays are in/out: a new call must not get pod3's array
@@ -175,10 +159,8 @@ TEST(DigitalOnEmulator, PodsCarryTheirPatternAndChannelsTheirOwnBit) {
     EXPECT_EQ(toggles7, 1);
     // Through its measurement object the channel reads its own bit, and its
     // clock-like bit 0 has a frequency.
-    ComPtr<IQuorlen731XXMeasurement> m;
-    com::Bstr name("UserDigitalChannel0");
-    ASSERT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(name.get(), m.Out()),
-              S_OK);
+    auto m = ChannelNamed<IQuorlen731XXMeasurements, IQuorlen731XXMeasurement>(
+        *driver.get(), "UserDigitalChannel0");
     ASSERT_EQ(dig(0)->put_Enabled(VARIANT_TRUE), S_OK);
     double f = 0;
     ASSERT_EQ(m->FetchWaveformMeasurement(Quorlen731XXMeasurementFrequency, &f), S_OK);

@@ -5,6 +5,7 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
+#include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
 
 namespace qn::test {
@@ -28,16 +29,12 @@ TEST_F(SystemOnEmulator, PutStateRestoresTheSettingsGetStateSaw) {
     ASSERT_EQ(External()->put_ProbeAttenuation(2.0), S_OK);
     ASSERT_EQ(Cursors()->put_X1Position(0.5), S_OK);
     ASSERT_EQ(System()->PutState(setup.get()), S_OK);
-    double v = 0;
-    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
-    EXPECT_EQ(v, 20.0);
-    EXPECT_EQ(Cursors()->get_X1Position(&v), S_OK);
-    EXPECT_EQ(v, -1.2345678901234e-6);
+    EXPECT_EQ(Got(External(), &IQuorlen731XXExternal::get_ProbeAttenuation), 20.0);
+    EXPECT_EQ(Got(Cursors(), &IQuorlen731XXCursors::get_X1Position), -1.2345678901234e-6);
     // A setup the instrument refuses fails the status check and changes nothing.
     com::SafeArray bogus = com::SafeArray::Vector(VT_UI1, 3);
     EXPECT_EQ(System()->PutState(bogus.get()), E_IVI_INSTRUMENT_STATUS);
-    EXPECT_EQ(External()->get_ProbeAttenuation(&v), S_OK);
-    EXPECT_EQ(v, 20.0);
+    EXPECT_EQ(Got(External(), &IQuorlen731XXExternal::get_ProbeAttenuation), 20.0);
 }
 
 TEST_F(SystemOnEmulator, ScreenBitmapIsABitmapFile) {
@@ -56,17 +53,11 @@ TEST_F(SystemOnEmulator, OperationCompleteTimesOutOnASilentPeerAndPollsAgain) {
     ASSERT_EQ(System()->put_TimeoutMilliseconds(20000), S_OK);
     emu->SuppressReplies(1);
     EXPECT_EQ(System()->WaitForOperationComplete(300), E_QUORLEN731XX_MAX_TIME_EXCEEDED);
-    VARIANT_BOOL polling = VARIANT_FALSE;
-    EXPECT_EQ(driver->get_QueryInstrumentStatus(&polling), S_OK);
-    EXPECT_EQ(polling, VARIANT_TRUE);
-    LONG timeout = 0;
-    EXPECT_EQ(System()->get_TimeoutMilliseconds(&timeout), S_OK);
-    EXPECT_EQ(timeout, 20000);
+    EXPECT_TRUE(driver->Core().session.flags.query_instrument_status);
+    EXPECT_EQ(Got(System(), &IQuorlen731XXSystem::get_TimeoutMilliseconds), 20000);
     // The session is in step again: the next wait succeeds and a query reads its own reply.
     EXPECT_EQ(System()->WaitForOperationComplete(2000), S_OK);
-    com::Bstr date;
-    EXPECT_EQ(System()->get_Date(date.Out()), S_OK);
-    EXPECT_EQ(date.utf8(), "+2026,+1,+1");
+    EXPECT_EQ(Got(System(), &IQuorlen731XXSystem::get_Date), "+2026,+1,+1");
 }
 
 }  // namespace

@@ -11,26 +11,13 @@
 #include "emulator/emulator.h"
 #include "emulator/serial_line.h"
 #include "io/io_manager.h"
+#include "tests/support/emulator_driver.h"
 
 namespace qn::test {
 namespace {
 
 enum class Transport { kSocket, kVxi11, kHislip, kSerial };
-
-const char* TransportName(Transport t) {
-    switch (t) {
-        case Transport::kSocket: return "Socket";
-        case Transport::kVxi11: return "Vxi11";
-        case Transport::kHislip: return "Hislip";
-        case Transport::kSerial: return "Serial";
-    }
-    return "Unknown";
-}
-
-std::string ErrorText() {
-    com::ErrorRecord rec;
-    return com::TakeThreadError(&rec) ? rec.description : std::string();
-}
+constexpr const char* kTransportNames[] = {"Socket", "Vxi11", "Hislip", "Serial"};
 
 class FlowOverTransport : public ::testing::TestWithParam<Transport> {
   protected:
@@ -41,7 +28,7 @@ class FlowOverTransport : public ::testing::TestWithParam<Transport> {
         const std::uint16_t raw = emu_.Start();
         switch (GetParam()) {
             case Transport::kSocket:
-                resource_ = "TCPIP0::127.0.0.1::" + std::to_string(raw) + "::SOCKET";
+                resource_ = SocketResource(raw);
                 break;
             case Transport::kVxi11:
                 resource_ = "TCPIP0::127.0.0.1:" + std::to_string(emu_.vxi11_port()) +
@@ -71,8 +58,7 @@ TEST_P(FlowOverTransport, IdentifyConfigureCaptureFetchMeasure) {
     ASSERT_EQ(driver->get_InstrumentModel(model.Out()), S_OK);
     EXPECT_EQ(model.utf8(), "QDS4032A");
 
-    ComPtr<IIviScopeAcquisition> acq;
-    ASSERT_EQ(ComPtr<IIviDriver>(driver.get()).As(acq), S_OK);
+    IIviScopeAcquisition* acq = driver.get();
     ASSERT_EQ(acq->put_TimePerRecord(0.002), S_OK) << ErrorText();
     double tpr = 0;
     ASSERT_EQ(acq->get_TimePerRecord(&tpr), S_OK);
@@ -102,7 +88,7 @@ TEST_P(FlowOverTransport, IdentifyConfigureCaptureFetchMeasure) {
 INSTANTIATE_TEST_SUITE_P(Transports, FlowOverTransport,
                          ::testing::Values(Transport::kSocket, Transport::kVxi11,
                                            Transport::kHislip, Transport::kSerial),
-                         [](const auto& p) { return std::string(TransportName(p.param)); });
+                         [](const auto& p) { return kTransportNames[int(p.param)]; });
 
 }  // namespace
 }  // namespace qn::test

@@ -10,6 +10,7 @@
 
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
+#include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
 
 namespace qn::test {
@@ -114,71 +115,58 @@ TEST_F(TriggerOnEmulator, AnUnreachedLevelLeavesTheAcquisitionPending) {
 TEST_F(TriggerOnEmulator, EveryTriggerTypeRoundTripsThroughTheInstrument) {
     Start("QMS4034A");
     com::Bstr ch2("UserChannel2");
-    IQuorlen731XXTriggerGlitch* glitch = driver.get();
-    IQuorlen731XXTriggerWidth* width = driver.get();
-    IQuorlen731XXTriggerTv* tv = driver.get();
-    IQuorlen731XXTriggerState* state = driver.get();
-    IQuorlen731XXTriggerPattern* pattern = driver.get();
+    using T = IQuorlen731XXTrigger;
+    using G = IQuorlen731XXTriggerGlitch;
+    using W = IQuorlen731XXTriggerWidth;
+    using V = IQuorlen731XXTriggerTv;
+    T* trig = driver.get();
+    G* glitch = driver.get();
+    W* width = driver.get();
+    V* tv = driver.get();
 
-    ASSERT_EQ(Trig()->put_Source(ch2.get()), S_OK) << ErrorText();
-    ASSERT_EQ(Trig()->put_Level(-0.125), S_OK) << ErrorText();
-    ASSERT_EQ(Trig()->put_Holdoff(1e-6), S_OK) << ErrorText();
-    ASSERT_EQ(Trig()->put_Coupling(Quorlen731XXTriggerCouplingHFReject), S_OK) << ErrorText();
-    double level = 0, holdoff = 0;
-    Quorlen731XXTriggerCouplingEnum coupling{};
-    EXPECT_EQ(Trig()->get_Level(&level), S_OK);
-    EXPECT_EQ(level, -0.125);
-    EXPECT_EQ(Trig()->get_Holdoff(&holdoff), S_OK);
-    EXPECT_EQ(holdoff, 1e-6);
-    EXPECT_EQ(Trig()->get_Coupling(&coupling), S_OK);
-    EXPECT_EQ(coupling, Quorlen731XXTriggerCouplingHFReject);
-    ASSERT_EQ(Trig()->put_Coupling(Quorlen731XXTriggerCouplingNoiseReject), S_OK);
-    EXPECT_EQ(Trig()->get_Coupling(&coupling), S_OK);
-    EXPECT_EQ(coupling, Quorlen731XXTriggerCouplingNoiseReject);
+    ASSERT_EQ(trig->put_Source(ch2.get()), S_OK) << ErrorText();
+    ASSERT_EQ(trig->put_Level(-0.125), S_OK) << ErrorText();
+    ASSERT_EQ(trig->put_Holdoff(1e-6), S_OK) << ErrorText();
+    ASSERT_EQ(trig->put_Coupling(Quorlen731XXTriggerCouplingHFReject), S_OK) << ErrorText();
+    EXPECT_EQ(Got(trig, &T::get_Level), -0.125);
+    EXPECT_EQ(Got(trig, &T::get_Holdoff), 1e-6);
+    EXPECT_EQ(Got(trig, &T::get_Coupling), Quorlen731XXTriggerCouplingHFReject);
+    ASSERT_EQ(trig->put_Coupling(Quorlen731XXTriggerCouplingNoiseReject), S_OK);
+    EXPECT_EQ(Got(trig, &T::get_Coupling), Quorlen731XXTriggerCouplingNoiseReject);
 
     ASSERT_EQ(glitch->Configure(ch2.get(), 0.25, 5e-7, Quorlen731XXGlitchNegative,
                                 Quorlen731XXGlitchGreaterThan),
               S_OK)
         << ErrorText();
-    ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerGlitch), S_OK) << ErrorText();
-    double w = 0;
-    Quorlen731XXGlitchConditionEnum condition{};
-    EXPECT_EQ(glitch->get_Width(&w), S_OK);
-    EXPECT_EQ(w, 5e-7);
-    EXPECT_EQ(glitch->get_condition(&condition), S_OK);
-    EXPECT_EQ(condition, Quorlen731XXGlitchGreaterThan);
-    com::Bstr source;
-    EXPECT_EQ(Trig()->get_Source(source.Out()), S_OK);
-    EXPECT_EQ(source.utf8(), "UserChannel2");
+    ASSERT_EQ(trig->put_Type(Quorlen731XXTriggerGlitch), S_OK) << ErrorText();
+    EXPECT_EQ(Got(glitch, &G::get_Width), 5e-7);
+    EXPECT_EQ(Got(glitch, &G::get_condition), Quorlen731XXGlitchGreaterThan);
+    EXPECT_EQ(Got(trig, &T::get_Source), "UserChannel2");
 
     ASSERT_EQ(width->Configure(ch2.get(), 0.25, 1e-6, 3e-6, Quorlen731XXWidthNegative,
                                Quorlen731XXWidthOutside),
               S_OK)
         << ErrorText();
-    ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerWidth), S_OK) << ErrorText();
-    double low = 0, high = 0;
-    EXPECT_EQ(width->get_ThresholdLow(&low), S_OK);
-    EXPECT_EQ(width->get_ThresholdHigh(&high), S_OK);
-    EXPECT_EQ(low, 1e-6);
-    EXPECT_EQ(high, 3e-6);
+    ASSERT_EQ(trig->put_Type(Quorlen731XXTriggerWidth), S_OK) << ErrorText();
+    EXPECT_EQ(Got(width, &W::get_ThresholdLow), 1e-6);
+    EXPECT_EQ(Got(width, &W::get_ThresholdHigh), 3e-6);
 
     ASSERT_EQ(tv->Configure(ch2.get(), Quorlen731XXTVSignalFormatNTSC,
-                           Quorlen731XXTVEventLineNumber, Quorlen731XXTVTriggerPositive),
+                            Quorlen731XXTVEventLineNumber, Quorlen731XXTVTriggerPositive),
               S_OK)
         << ErrorText();
-    ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerTV), S_OK) << ErrorText();
+    ASSERT_EQ(trig->put_Type(Quorlen731XXTriggerTV), S_OK) << ErrorText();
     ASSERT_EQ(tv->put_LineNumber(300), S_OK) << ErrorText();
-    LONG line = 0;
-    Quorlen731XXTVTriggerEventEnum event{};
-    EXPECT_EQ(tv->get_LineNumber(&line), S_OK) << ErrorText();
-    EXPECT_EQ(line, 300);
-    EXPECT_EQ(tv->get_Event(&event), S_OK);
-    EXPECT_EQ(event, Quorlen731XXTVEventLineNumber);
+    EXPECT_EQ(Got(tv, &V::get_LineNumber), 300);
+    EXPECT_EQ(Got(tv, &V::get_Event), Quorlen731XXTVEventLineNumber);
 
+    IQuorlen731XXTriggerPattern* pattern = driver.get();
     ASSERT_EQ(pattern->Configure(1, 3, 0x80, 0x81, Quorlen731XXPatternEnter), S_OK);
-    ASSERT_EQ(Trig()->put_Type(Quorlen731XXTriggerPattern), S_OK) << ErrorText();
+    ASSERT_EQ(trig->put_Type(Quorlen731XXTriggerPattern), S_OK) << ErrorText();
     com::Bstr dig("UserDigitalChannel3");
-    ASSERT_EQ(state->put_ClockSource(dig.get()), S_OK) << ErrorText();
+    ASSERT_EQ(static_cast<IQuorlen731XXTriggerState*>(driver.get())->put_ClockSource(dig.get()),
+              S_OK)
+        << ErrorText();
     const auto sent = emu->ReceivedMessages();
     EXPECT_EQ(sent.end()[-2], ":TRIG:PATT 0,0,DIG3,POS;:TRIG:MODE PATT");  // then *ESR?
 }
