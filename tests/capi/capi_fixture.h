@@ -20,6 +20,18 @@ inline std::string RecordedError(ViSession vi, ViStatus* code = nullptr) {
     return text;
 }
 
+// A new simulated session of `model` (0 when it could not be opened); the
+// caller has pointed the configuration store away.
+inline ViSession SimulatedSession(const char* model = "QMS4104B") {
+    const std::string options = std::string("Simulate=true,DriverSetup=Model=") + model;
+    ViSession vi = 0;
+    EXPECT_EQ(Qn731XX_InitWithOptions(const_cast<ViChar*>(""), VI_FALSE, VI_FALSE,
+                                      options.c_str(), &vi),
+              VI_SUCCESS)
+        << RecordedError(0);
+    return vi;
+}
+
 class CSessionTest : public ::testing::Test {
 protected:
     void SetUp() override { ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1); }
@@ -28,14 +40,8 @@ protected:
             EXPECT_EQ(Qn731XX_close(vi_), VI_SUCCESS);
         }
     }
-    // A simulated session of `model`.
     void OpenSimulated(const char* model = "QMS4104B") {
-        const std::string options = std::string("Simulate=true,DriverSetup=Model=") + model;
-        ASSERT_EQ(Qn731XX_InitWithOptions(const_cast<ViChar*>(""), VI_FALSE, VI_FALSE,
-                                          options.c_str(), &vi_),
-                  VI_SUCCESS)
-            << RecordedError(0);
-        ASSERT_NE(vi_, 0u);
+        ASSERT_NE(vi_ = SimulatedSession(model), 0u);
     }
 
     ViSession vi_ = 0;

@@ -181,11 +181,6 @@ TEST_F(CSession, InherentQueriesCopyTheirTextsInSimulation) {
     EXPECT_LT(Qn731XX_GetChannelName(vi_, 5, sizeof name, name), 0);
 }
 
-}  // namespace
-}  // namespace qn::test
-
-namespace qn::test {
-namespace {
 
 TEST_F(CSession, WaveformsFillNoMoreThanTheCallersArray) {
     OpenSimulated("QDS2014A");  // simulated records have 100 points
@@ -228,11 +223,6 @@ TEST_F(CSession, WaveformsFillNoMoreThanTheCallersArray) {
     EXPECT_LT(Qn731XX_FetchWaveform(vi_, "Channel9", 1, one, &actual, &x0, &dx), 0);
 }
 
-}  // namespace
-}  // namespace qn::test
-
-namespace qn::test {
-namespace {
 
 TEST_F(CSession, ARecordTooLongForTheBufferIsDeliveredByTheNextCall) {
     ComPtr<Quorlen731XX> driver = com::MakeComObject<Quorlen731XX>();

@@ -15,21 +15,14 @@ namespace qn::test {
 namespace {
 
 constexpr int kThreads = 4;
-
-ViSession OpenSimulatedSession() {
-    ViSession vi = 0;
-    EXPECT_EQ(Qn731XX_InitWithOptions(const_cast<ViChar*>(""), VI_FALSE, VI_FALSE,
-                                      "Simulate=true,DriverSetup=Model=QDS2014A", &vi),
-              VI_SUCCESS);
-    return vi;
-}
+[[maybe_unused]] const int kStoreAway =
+    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
 
 TEST(CApiThreads, SessionsOfTheirOwnKeepTheirValuesAndErrorRecords) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
     std::vector<std::thread> threads;
     for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([t] {
-            const ViSession vi = OpenSimulatedSession();
+            const ViSession vi = SimulatedSession("QDS2014A");
             const ViReal64 mine = 1.0 + t * 0.25;
             for (int i = 0; i < 20; ++i) {
                 EXPECT_EQ(Qn731XX_SetAttributeViReal64(vi, "Channel1", IVISCOPE_ATTR_VERTICAL_RANGE, mine), 0);
@@ -47,8 +40,7 @@ TEST(CApiThreads, SessionsOfTheirOwnKeepTheirValuesAndErrorRecords) {
 }
 
 TEST(CApiThreads, ASharedSessionLockedByEachThreadSeesItsOwnWrites) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
-    const ViSession vi = OpenSimulatedSession();
+    const ViSession vi = SimulatedSession("QDS2014A");
     std::vector<std::thread> threads;
     for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([vi, t] {
@@ -69,9 +61,8 @@ TEST(CApiThreads, ASharedSessionLockedByEachThreadSeesItsOwnWrites) {
 }
 
 TEST(CApiThreads, ASessionClosedDuringCallsEndsThemCleanly) {
-    ::setenv("IVI_CONFIG_STORE", "/nonexistent/qn-store.xml", 1);
     for (int round = 0; round < 5; ++round) {
-        const ViSession vi = OpenSimulatedSession();
+        const ViSession vi = SimulatedSession("QDS2014A");
         std::atomic<int> calls{0};
         std::vector<std::thread> callers;
         for (int t = 0; t < 2; ++t) {

@@ -72,11 +72,6 @@ TEST_F(CTraffic, ARefusedValueSendsNothingAndLeavesTheSessionUsable) {
               VI_SUCCESS);
 }
 
-}  // namespace
-}  // namespace qn::test
-
-namespace qn::test {
-namespace {
 
 TEST_F(CTraffic, AMeasurementSelectsItsSourceAndCopiesOnlyAResult) {
     OpenC("73142D");
@@ -107,11 +102,6 @@ TEST_F(CTraffic, AMeasurementSelectsItsSourceAndCopiesOnlyAResult) {
     EXPECT_TRUE(io_->Done());
 }
 
-}  // namespace
-}  // namespace qn::test
-
-namespace qn::test {
-namespace {
 
 TEST_F(CTraffic, SystemFunctionsSendTheirCommands) {
     OpenC();

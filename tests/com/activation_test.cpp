@@ -3,51 +3,33 @@
 // The module is opened with dlopen just to call its registration entry points.
 #include "platform/com/activation.h"
 
-#include <dlfcn.h>
 #include <gtest/gtest.h>
-#include <stdlib.h>
 
-#include <filesystem>
 #include <string>
 
 #include "IviDriver.h"
 #include "IviScope.h"
 #include "Quorlen731XXIds.h"
 #include "emulator/emulator.h"
+#include "tests/com/module_fixture.h"
 
 namespace {
 
-// Calls one of the driver module's parameterless entry points.
-HRESULT CallModule(const char* entry) {
-    void* module = ::dlopen(QN_DRIVER_MODULE_PATH, RTLD_NOW | RTLD_LOCAL);
-    if (!module) {
-        ADD_FAILURE() << ::dlerror();
-        return E_FAIL;
-    }
-    auto fn = reinterpret_cast<HRESULT (*)()>(::dlsym(module, entry));
-    HRESULT hr = fn ? fn() : E_FAIL;
-    ::dlclose(module);
-    return hr;
-}
+using qn::test::CallModule;
 
-class DriverActivation : public ::testing::Test {
+class DriverActivation : public qn::test::RegistryFileTest {
   protected:
     void SetUp() override {
-        char dir[] = "/tmp/qn-comact-XXXXXX";
-        ASSERT_NE(::mkdtemp(dir), nullptr);
-        dir_ = dir;
-        ::setenv("QN_REGISTRY_FILE", (dir_ + "/registry").c_str(), 1);
+        RegistryFileTest::SetUp();
         ::setenv("IVI_CONFIG_STORE", (dir_ + "/store.xml").c_str(), 1);  // absent
         ASSERT_EQ(CallModule("DllRegisterServer"), S_OK);
     }
     void TearDown() override {
         EXPECT_EQ(CallModule("DllUnregisterServer"), S_OK);
         CoFreeUnusedLibraries();
-        ::unsetenv("QN_REGISTRY_FILE");
         ::unsetenv("IVI_CONFIG_STORE");
-        std::filesystem::remove_all(dir_);
+        RegistryFileTest::TearDown();
     }
-    std::string dir_;
 };
 
 // Opens a simulated session, checks the identity and closes it again.

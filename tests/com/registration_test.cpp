@@ -3,9 +3,7 @@
 // failures reported; the placeholder processor.
 #include "com/registration.h"
 
-#include <dlfcn.h>
 #include <gtest/gtest.h>
-#include <stdlib.h>
 
 #include <filesystem>
 #include <fstream>
@@ -16,6 +14,7 @@
 #include "platform/com/activation.h"
 #include "platform/com/errorinfo.h"
 #include "platform/com/registry.h"
+#include "tests/com/module_fixture.h"
 
 namespace {
 
@@ -30,20 +29,8 @@ const std::string kCat1 = GuidToString(CATID_Quorlen731XXIviDrivers);
 const std::string kCat2 = GuidToString(CATID_Quorlen731XXIviScopeDrivers);
 const std::string kClassKey = "HKCR\\CLSID\\" + kClsid;
 
-// The entry points of the built driver library rather than of the driver code
-// linked into this test, so that the module path registration writes is the
-// library's own.
-HRESULT ModuleEntry(const char* name) {
-    static void* module = ::dlopen(QN_DRIVER_MODULE_PATH, RTLD_NOW | RTLD_LOCAL);
-    void* entry = module ? ::dlsym(module, name) : nullptr;
-    if (!entry) {
-        ADD_FAILURE() << "no " << name << " in " << QN_DRIVER_MODULE_PATH;
-        return E_FAIL;
-    }
-    return reinterpret_cast<HRESULT (*)()>(entry)();
-}
-HRESULT RegisterModule() { return ModuleEntry("DllRegisterServer"); }
-HRESULT UnregisterModule() { return ModuleEntry("DllUnregisterServer"); }
+HRESULT RegisterModule() { return qn::test::CallModule("DllRegisterServer"); }
+HRESULT UnregisterModule() { return qn::test::CallModule("DllUnregisterServer"); }
 
 // A key written by registration; a null name means the key alone.
 struct Expected {
@@ -87,20 +74,8 @@ const std::vector<Expected>& ForeignEntries() {
     return entries;
 }
 
-class Registration : public ::testing::Test {
+class Registration : public qn::test::RegistryFileTest {
   protected:
-    void SetUp() override {
-        char dir[] = "/tmp/qn-comreg-XXXXXX";
-        ASSERT_NE(::mkdtemp(dir), nullptr);
-        dir_ = dir;
-        file_ = dir_ + "/registry";
-        ::setenv("QN_REGISTRY_FILE", file_.c_str(), 1);
-    }
-    void TearDown() override {
-        ::unsetenv("QN_REGISTRY_FILE");
-        fs::remove_all(dir_);
-    }
-
     RegistryTree Load() {
         RegistryTree tree;
         auto status = qn::com::LoadRegistryFile(file_, &tree);
@@ -120,8 +95,6 @@ class Registration : public ::testing::Test {
         s << std::ifstream(file_).rdbuf();
         return s.str();
     }
-
-    std::string dir_, file_;
 };
 
 void ExpectPresent(const RegistryTree& tree, const std::vector<Expected>& entries) {

@@ -33,23 +33,19 @@ TEST_F(DriverTest, NullOutPointerNamesEntryAndParameter) {
     EXPECT_EQ(driver_->CallContexts().Depth(), 0u);
 }
 
-TEST_F(DriverTest, ErrorInformationBelongsToTheFailingCallOnly) {
+TEST_F(DriverTest, ErrorInformationCarriesTheCalledInterfaceAndOnlyForTheFailingCall) {
     ASSERT_EQ(Init("", "Simulate=true"), S_OK);
     EXPECT_EQ(driver_->LockObject(), E_IVI_METHOD_NOT_SUPPORTED);
-    VARIANT_BOOL b = 0;
-    EXPECT_EQ(driver_->get_Cache(&b), S_OK);
-    EXPECT_FALSE(HasErrorInfo());
-}
-
-TEST_F(DriverTest, ErrorInformationCarriesTheCalledInterface) {
-    ASSERT_EQ(Init("", "Simulate=true"), S_OK);
-    driver_->LockObject();
     com::ErrorRecord rec;
     ASSERT_TRUE(com::TakeThreadError(&rec));
     EXPECT_EQ(rec.guid, iid_of<IIviDriverUtility>);
     EXPECT_EQ(rec.source, "Quorlen731XX.Quorlen731XX.1");
     // The error context is restored after each call.
     EXPECT_EQ(driver_->Errors().ErrorIid(), GUID_NULL);
+    driver_->LockObject();
+    VARIANT_BOOL b = 0;
+    EXPECT_EQ(driver_->get_Cache(&b), S_OK);
+    EXPECT_FALSE(HasErrorInfo());
 }
 
 TEST_F(DriverTest, CacheOffInvalidatesStoredValues) {

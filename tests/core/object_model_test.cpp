@@ -126,23 +126,20 @@ TEST_F(ObjectModel, SimulatedValuesAreKeptPerObjectAndInterface) {
     ASSERT_EQ(Init("", "Simulate=true"), S_OK);
     auto cc = As<IIviScopeAcquisition>();
     auto is = As<IQuorlen731XXAcquisition>();
-    double v = -1;
-    EXPECT_EQ(cc->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 0.001);
-    EXPECT_EQ(is->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 0.0);
+    const auto values = [&] {
+        double a = -1, b = -1;
+        EXPECT_EQ(cc->get_TimePerRecord(&a), S_OK);
+        EXPECT_EQ(is->get_TimePerRecord(&b), S_OK);
+        return std::pair(a, b);
+    };
+    EXPECT_EQ(values(), std::pair(0.001, 0.0));
     EXPECT_EQ(cc->put_TimePerRecord(2.5), S_OK);
-    EXPECT_EQ(cc->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 2.5);
-    EXPECT_EQ(is->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 0.0);
+    EXPECT_EQ(values(), std::pair(2.5, 0.0));
     EXPECT_EQ(driver_->InvalidateAllAttributes(), S_OK);
-    EXPECT_EQ(cc->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 0.001);
+    EXPECT_EQ(values(), std::pair(0.001, 0.0));
     EXPECT_EQ(cc->put_TimePerRecord(7), S_OK);
     EXPECT_EQ(driver_->Reset(), S_OK);
-    EXPECT_EQ(cc->get_TimePerRecord(&v), S_OK);
-    EXPECT_EQ(v, 0.001);
+    EXPECT_EQ(values(), std::pair(0.001, 0.0));
     EXPECT_EQ(cc->get_TimePerRecord(nullptr), E_IVI_NULL_POINTER);
     EXPECT_EQ(ErrorText(),
               "Quorlen731XX: Null pointer passed for method get_TimePerRecord, parameter val.");

@@ -10,43 +10,32 @@ namespace {
 
 using namespace test;
 
-TEST(EmulatorMeasure, CommandsEachModelAcceptsOrRefuses) {
-    struct Case {
-        const char* model;
-        const char* message;
-        const char* error;  // null: accepted
-    } cases[] = {
-        {"QMS4034A", ":MEAS:DEF THR,PERC,90,50,10", nullptr},
-        {"QMS4034A", ":MEAS:DEF THR,PERC,10,50,90", R"(-222,"Data out of range")"},
-        {"QMS4034A", ":MEAS:DEF THR,PERC,90,50,50", R"(-222,"Data out of range")"},
-        {"QMS4034A", ":MEAS:DEF THR,VOLT,90,50,10", R"(-224,"Illegal parameter value")"},
-        {"QMS4034A", ":MEAS:DEF THR,ABS,2,0", R"(-109,"Missing parameter")"},
-        {"QMS4034A", ":MEAS:DEF DEL,1,-2", nullptr},
-        {"QMS4034A", ":MEAS:DEF DEL,1,X", R"(-104,"Data type error")"},
-        {"QMS4034A", ":MEAS:DEF DEL,1001,1", R"(-222,"Data out of range")"},
-        {"QMS4034A", ":MEAS:SOUR DIG15,CHAN4", nullptr},
-        {"QMS4034A", ":MEAS:SOUR DIG16", R"(-224,"Illegal parameter value")"},
-        {"QMS4034A", ":MEAS:SOUR DIG", R"(-224,"Illegal parameter value")"},
-        {"QDS4034A", ":MEAS:SOUR DIG0", R"(-224,"Illegal parameter value")"},
-        {"QMS4034A", ":DIG0:DISP 1;:DIG15:LAB \"CLK\";:DIG7:THR -1.5", nullptr},
-        {"QMS4034A", ":DIG16:DISP 1", R"(-114,"Header suffix out of range")"},
-        {"QMS4034A", ":DIG3:THR 9", R"(-222,"Data out of range")"},
-        {"QDS4034A", ":DIG0:DISP 1", R"(-113,"Undefined header")"},
-        {"QDS4034A", ":ACT?", R"(-113,"Undefined header")"},
-        {"73122D", ":ACT", nullptr},
-        {"QMS4034A", ":MEAS:FREQ? CHAN5", R"(-224,"Illegal parameter value")"},
-        {"QMS4034A", ":MEAS:TEDG? ONE, CHAN1", R"(-104,"Data type error")"},
-        {"QMS4034A", ":EMUL:INP4 SQU,1E3,2,0", nullptr},
-        {"QDS4032A", ":EMUL:INP3 SIN,1E3,2,0", R"(-114,"Header suffix out of range")"},
-        {"QMS4034A", ":EMUL:INP1 TRI,1E3,2,0", R"(-224,"Illegal parameter value")"},
-    };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::string(c.model) + " " + c.message);
-        Session s(c.model);
-        s.client.Send(c.message);
-        EXPECT_EQ(s.client.Query("SYST:ERR?"), c.error ? c.error : kNoError);
-    }
-}
+INSTANTIATE_TEST_SUITE_P(
+    Measure, Refusals,
+    ::testing::Values(
+        Refusal{"QMS4034A", ":MEAS:DEF THR,PERC,90,50,10", nullptr},
+        Refusal{"QMS4034A", ":MEAS:DEF THR,PERC,10,50,90", kOutOfRange},
+        Refusal{"QMS4034A", ":MEAS:DEF THR,PERC,90,50,50", kOutOfRange},
+        Refusal{"QMS4034A", ":MEAS:DEF THR,VOLT,90,50,10", kIllegal},
+        Refusal{"QMS4034A", ":MEAS:DEF THR,ABS,2,0", R"(-109,"Missing parameter")"},
+        Refusal{"QMS4034A", ":MEAS:DEF DEL,1,-2", nullptr},
+        Refusal{"QMS4034A", ":MEAS:DEF DEL,1,X", R"(-104,"Data type error")"},
+        Refusal{"QMS4034A", ":MEAS:DEF DEL,1001,1", kOutOfRange},
+        Refusal{"QMS4034A", ":MEAS:SOUR DIG15,CHAN4", nullptr},
+        Refusal{"QMS4034A", ":MEAS:SOUR DIG16", kIllegal},
+        Refusal{"QMS4034A", ":MEAS:SOUR DIG", kIllegal},
+        Refusal{"QDS4034A", ":MEAS:SOUR DIG0", kIllegal},
+        Refusal{"QMS4034A", ":DIG0:DISP 1;:DIG15:LAB \"CLK\";:DIG7:THR -1.5", nullptr},
+        Refusal{"QMS4034A", ":DIG16:DISP 1", R"(-114,"Header suffix out of range")"},
+        Refusal{"QMS4034A", ":DIG3:THR 9", kOutOfRange},
+        Refusal{"QDS4034A", ":DIG0:DISP 1", R"(-113,"Undefined header")"},
+        Refusal{"QDS4034A", ":ACT?", R"(-113,"Undefined header")"},
+        Refusal{"73122D", ":ACT", nullptr},
+        Refusal{"QMS4034A", ":MEAS:FREQ? CHAN5", kIllegal},
+        Refusal{"QMS4034A", ":MEAS:TEDG? ONE, CHAN1", R"(-104,"Data type error")"},
+        Refusal{"QMS4034A", ":EMUL:INP4 SQU,1E3,2,0", nullptr},
+        Refusal{"QDS4032A", ":EMUL:INP3 SIN,1E3,2,0", R"(-114,"Header suffix out of range")"},
+        Refusal{"QMS4034A", ":EMUL:INP1 TRI,1E3,2,0", kIllegal}));
 
 TEST(EmulatorMeasure, DefinitionsAndSourcesReadBack) {
     Session s("QMS4034A");

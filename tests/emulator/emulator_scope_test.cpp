@@ -28,14 +28,6 @@ TEST(EmulatorScope, RelativeHeadersKeepTheChannelSuffixOfTheirPath) {
     EXPECT_EQ(c.Query("SYST:ERR?"), kNoError);
 }
 
-struct Refusal {
-    const char* model;
-    const char* message;
-    const char* error;  // nullptr: accepted
-};
-
-class Refusals : public ::testing::TestWithParam<Refusal> {};
-
 TEST_P(Refusals, ValuesAndFeaturesTheModelLacks) {
     const Refusal& r = GetParam();
     Session s(r.model);
@@ -44,33 +36,32 @@ TEST_P(Refusals, ValuesAndFeaturesTheModelLacks) {
 }
 
 INSTANTIATE_TEST_SUITE_P(
-    Cases, Refusals,
-    ::testing::Values(Refusal{"QDS4034A", ":CHAN1:RANG 100", R"(-222,"Data out of range")"},
-                      Refusal{"QDS4034A", ":CHAN1:PROB 10;:CHAN1:RANG 100",
-                              nullptr},  // range scales with probe
-                      Refusal{"QDS4034A", ":CHAN5:RANG 1", R"(-114,"Header suffix out of range")"},
-                      Refusal{"QDS4032A", ":CHAN3:DISP 1", R"(-114,"Header suffix out of range")"},
-                      Refusal{"QDS4034A", ":CHAN1:COUP GND", R"(-241,"Hardware missing")"},
-                      Refusal{"QDS2014A", ":CHAN1:COUP GND", nullptr},
-                      Refusal{"QDS4034A", ":CHAN1:COUP XYZ", R"(-224,"Illegal parameter value")"},
-                      Refusal{"73122A", ":CHAN1:IMP FIFT", R"(-241,"Hardware missing")"},
-                      Refusal{"73141A", ":CHAN1:IMP FIFTY", nullptr},
-                      Refusal{"73122A", ":CHAN1:PROB:SKEW 1e-9", R"(-113,"Undefined header")"},
-                      Refusal{"QDS4034A", ":CHAN1:PROB:SKEW 1e-6", R"(-222,"Data out of range")"},
-                      Refusal{"QDS3014L", ":CHAN1:PROT?", R"(-113,"Undefined header")"},
-                      Refusal{"QDS3014L", ":OVL 0", R"(-113,"Undefined header")"},
-                      Refusal{"QDS4034A", "*CLS;:OPEE 31;:OVL 0", nullptr},
-                      Refusal{"QDS2014A", ":WAV:POIN MAX, 2000", R"(-108,"Parameter not allowed")"},
-                      Refusal{"QDS4032A", ":WAV:POIN MAX, 2000", nullptr},
-                      Refusal{"QDS4034A", ":WAV:POIN 0", R"(-222,"Data out of range")"},
-                      Refusal{"QDS4034A", ":POD1:DISP 1", R"(-113,"Undefined header")"},
-                      Refusal{"QMS4034A", ":POD2:DISP 1;:WAV:SOUR POD2", nullptr},
-                      Refusal{"QMS4034A", ":WAV:SOUR POD3", R"(-224,"Illegal parameter value")"},
-                      Refusal{"QDS4034A", ":TIM:REF MIDDLE", R"(-224,"Illegal parameter value")"},
-                      Refusal{"QDS4034A", ":ACQ:COUN 0", R"(-222,"Data out of range")"},
-                      Refusal{"QDS4034A", ":CHAN1:LAB \"this label is far too long to display\"",
-                              R"(-222,"Data out of range")"},
-                      Refusal{"QDS4034A", ":CHAN1:RANG 1V", R"(-104,"Data type error")"}));
+    Scope, Refusals,
+    ::testing::Values(
+        Refusal{"QDS4034A", ":CHAN1:RANG 100", kOutOfRange},
+        Refusal{"QDS4034A", ":CHAN1:PROB 10;:CHAN1:RANG 100", nullptr},
+        Refusal{"QDS4034A", ":CHAN5:RANG 1", R"(-114,"Header suffix out of range")"},
+        Refusal{"QDS4032A", ":CHAN3:DISP 1", R"(-114,"Header suffix out of range")"},
+        Refusal{"QDS4034A", ":CHAN1:COUP GND", R"(-241,"Hardware missing")"},
+        Refusal{"QDS2014A", ":CHAN1:COUP GND", nullptr},
+        Refusal{"QDS4034A", ":CHAN1:COUP XYZ", kIllegal},
+        Refusal{"73122A", ":CHAN1:IMP FIFT", R"(-241,"Hardware missing")"},
+        Refusal{"73141A", ":CHAN1:IMP FIFTY", nullptr},
+        Refusal{"73122A", ":CHAN1:PROB:SKEW 1e-9", R"(-113,"Undefined header")"},
+        Refusal{"QDS4034A", ":CHAN1:PROB:SKEW 1e-6", kOutOfRange},
+        Refusal{"QDS3014L", ":CHAN1:PROT?", R"(-113,"Undefined header")"},
+        Refusal{"QDS3014L", ":OVL 0", R"(-113,"Undefined header")"},
+        Refusal{"QDS4034A", "*CLS;:OPEE 31;:OVL 0", nullptr},
+        Refusal{"QDS2014A", ":WAV:POIN MAX, 2000", R"(-108,"Parameter not allowed")"},
+        Refusal{"QDS4032A", ":WAV:POIN MAX, 2000", nullptr},
+        Refusal{"QDS4034A", ":WAV:POIN 0", kOutOfRange},
+        Refusal{"QDS4034A", ":POD1:DISP 1", R"(-113,"Undefined header")"},
+        Refusal{"QMS4034A", ":POD2:DISP 1;:WAV:SOUR POD2", nullptr},
+        Refusal{"QMS4034A", ":WAV:SOUR POD3", kIllegal},
+        Refusal{"QDS4034A", ":TIM:REF MIDDLE", kIllegal},
+        Refusal{"QDS4034A", ":ACQ:COUN 0", kOutOfRange},
+        Refusal{"QDS4034A", ":CHAN1:LAB \"this label is far too long to display\"", kOutOfRange},
+        Refusal{"QDS4034A", ":CHAN1:RANG 1V", R"(-104,"Data type error")"}));
 
 TEST(EmulatorScope, ResetAndSetupMemory) {
     Session s("QDS4034A");
@@ -99,7 +90,7 @@ TEST(EmulatorScope, WaveformBlocksFollowFormatByteOrderAndType) {
     auto& c = s.client;
     c.Send(":CHAN1:RANG 8;OFFS 0;:WAV:SOUR CHAN1;:WAV:POIN 1000");
     c.Send(":WAV:DATA?");
-    EXPECT_EQ(c.Query("SYST:ERR?"), R"(-221,"Settings conflict")");  // nothing acquired yet
+    EXPECT_EQ(c.Query("SYST:ERR?"), kConflict);  // nothing acquired yet
     c.Send(":DIG");
     c.Send(":WAV:FORM WORD;UNS 0;BYT MSBF");
     const std::string msb = ReadBlock(c, ":WAV:DATA?");
@@ -135,7 +126,7 @@ TEST(EmulatorScope, WaveformBlocksFollowFormatByteOrderAndType) {
         EXPECT_LE(lo, hi);
     }
     c.Send(":WAV:SOUR CHAN2;:WAV:DATA?");  // channel 2 was off during the acquisition
-    EXPECT_EQ(c.Query("SYST:ERR?"), R"(-221,"Settings conflict")");
+    EXPECT_EQ(c.Query("SYST:ERR?"), kConflict);
 }
 
 TEST(EmulatorScope, ServedBlockReplacesWaveformData) {
@@ -147,7 +138,7 @@ TEST(EmulatorScope, ServedBlockReplacesWaveformData) {
     EXPECT_EQ(s.client.ReadBytes(1), "\n");
     s.emu.ClearWaveformData();
     s.client.Send(":WAV:DATA?");
-    EXPECT_EQ(s.client.Query("SYST:ERR?"), R"(-221,"Settings conflict")");
+    EXPECT_EQ(s.client.Query("SYST:ERR?"), kConflict);
 }
 
 // Waveform blocks are kept in memory and sent again: a kept block must never be altered by a

@@ -35,27 +35,8 @@ TEST(EmulatorTrigger, DriverMessagesSetTheirTypesState) {
     EXPECT_EQ(c.Query(":TRIG:MODE?;SOUR?;SWE?;LEV?"), "EDGE;CHAN1;AUTO;0");
 }
 
-struct Refusal {
-    const char* model;
-    const char* message;
-    const char* error;  // nullptr: accepted
-};
-
-class TriggerRefusals : public ::testing::TestWithParam<Refusal> {};
-
-TEST_P(TriggerRefusals, ValuesAndFeaturesTheModelLacks) {
-    const Refusal& r = GetParam();
-    Session s(r.model);
-    s.client.Send(r.message);
-    EXPECT_EQ(s.client.Query("SYST:ERR?"), r.error ? r.error : kNoError);
-}
-
-constexpr const char* kConflict = R"(-221,"Settings conflict")";
-constexpr const char* kOutOfRange = R"(-222,"Data out of range")";
-constexpr const char* kIllegal = R"(-224,"Illegal parameter value")";
-
 INSTANTIATE_TEST_SUITE_P(
-    Cases, TriggerRefusals,
+    Trigger, Refusals,
     ::testing::Values(Refusal{"QDS3014L", ":TRIG:SOUR EXT", kConflict},
                       Refusal{"QDS4032A", ":TRIG:SOUR EXT", nullptr},
                       Refusal{"QDS4032A", ":TRIG:SOUR CHAN3", kOutOfRange},

@@ -114,6 +114,18 @@ struct Session {
     ScpiClient client;
 };
 
+// A message sent to a fresh emulator of `model` and the error it leaves in
+// the queue (null: accepted). The parameterized test Refusals walks them.
+struct Refusal {
+    const char* model;
+    const char* message;
+    const char* error;
+};
+class Refusals : public ::testing::TestWithParam<Refusal> {};
+inline constexpr const char* kConflict = R"(-221,"Settings conflict")";
+inline constexpr const char* kOutOfRange = R"(-222,"Data out of range")";
+inline constexpr const char* kIllegal = R"(-224,"Illegal parameter value")";
+
 // The payload of the definite-length block that answers `query`, its header
 // and final line feed checked.
 inline std::string ReadBlock(ScpiClient& c, const std::string& query) {

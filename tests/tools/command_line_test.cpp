@@ -9,6 +9,7 @@
 
 #include "tests/tools/run_command.h"
 #include "tools/commands.h"
+#include "tools/list_command.h"
 
 namespace qn::tools {
 namespace {
@@ -117,6 +118,81 @@ TEST(CommandLine, ARefusedValueFailsWithTheInstrumentsMessageUnlessTheCheckIsOff
     const Result off = Invoke(TimebaseCommand, {"--time-per-record", "1000", "--options",
                                                 "QueryInstrStatus=false"});
     EXPECT_EQ(off.rc, 0) << off.err;
+}
+
+// Refused input of every command: the exit status (2 for usage, 1 for what
+// the driver or the instrument refused) and, where given, the text it prints.
+TEST(CommandLine, RefusedInputFailsWithItsStatusAndText) {
+    const std::vector<std::string> nowhere = {"--sysfs", "/nonexistent", "--dev", "/nonexistent"};
+    struct Case {
+        Command run;
+        std::vector<std::string> words;
+        int rc;
+        const char* text = nullptr;  // in stdout or stderr
+    };
+    const Case cases[] = {
+        {ChannelCommand, {"0"}, 2},
+        {ChannelCommand, {"1", "2"}, 2},
+        {ChannelCommand, {"1", "--range", "4V"}, 2},
+        {ChannelCommand, {"--coupling", "LF"}, 2},
+        {ChannelCommand, {"--enabled", "maybe"}, 2},
+        {ChannelCommand, {"3"}, 1},  // QDS4032A has two channels
+        {ChannelCommand, {"1", "--impedance", "75"}, 1},
+        {TimebaseCommand, {"--points", "1.5"}, 2},
+        {TimebaseCommand, {"extra"}, 2},
+        {TimebaseCommand, {"--type", "envelope"}, 1},
+        {MeasureCommand, {"--channel", "1"}, 2},
+        {MeasureCommand, {"--channel", "1", "--all", "--function", "Period"}, 2},
+        {MeasureCommand, {"--channel", "0", "--all"}, 2},
+        {MeasureCommand, {"--channel", "1x", "--all"}, 2},
+        {MeasureCommand, {"--function", "Frequency2"}, 2},
+        {MeasureCommand, {"--function", "28"}, 2},
+        {MeasureCommand, {"--function", ""}, 2},
+        {MeasureCommand, {"--channel", "3", "--all"}, 1},  // two channels
+        // Channel 2 is not shown for channel 1's delay measurement.
+        {MeasureCommand, {"--channel", "1", "--function", "Delay"}, 1,
+         "Specified channel is not enabled"},
+        {DigitalCommand, {"--channel", "0"}, 1},  // the default model has no digital channels
+        {DigitalCommand, {"--channel", "-1"}, 2},
+        {TriggerCommand, {"--type", "runt"}, 2, "--type runt"},
+        {TriggerCommand, {"--level", "1V"}, 2, "--level 1V"},
+        {TriggerCommand, {"--slope", "up"}, 2, "--slope up"},
+        {TriggerCommand, {"extra"}, 2, "not expected: extra"},
+        {TriggerCommand, {"--modifier", "autolevel"}, 1, "put_Modifier"},
+        {TriggerCommand, {"--coupling", "tv"}, 1, "Settings Conflict"},
+        {TriggerCommand, {"--source", "UserChannel9"}, 1, "UserChannel9"},
+        {TriggerCommand, {"--model", "QDS3014L", "--source", "VAL_EXTERNAL"}, 1,
+         "-221: Settings conflict"},
+        {FetchCommand, {"--trigger-level", "high"}, 2, "--trigger-level"},
+        {FetchCommand, {"--trigger-level", "nan"}, 2, "--trigger-level"},
+        {FetchCommand, {"--trigger-level", "inf"}, 2, "--trigger-level"},
+        {FetchCommand, {"--trigger-level", "1e999"}, 2, "--trigger-level"},
+        {FetchCommand, {"--trigger-source", "UserChannel7"}, 1, "UserChannel7"},
+        {ScpiCommand, {":CHAN1:RANG 2\n*RST"}, 2},
+        {ScpiCommand, {""}, 2},
+        {ScpiCommand, {}, 2},
+        {ScpiCommand, {"a", "b"}, 2},
+        {SetupCommand, {"copy", "x"}, 2},
+        {SetupCommand, {"save"}, 2},
+        {ScreenshotCommand, {}, 2},
+        {ListCommand, {"--lan-address", "127.0.0.1"}, 2, "needs --lan"},
+        {ListCommand, {"--lan", "--lan-address", "localhost:111"}, 2, "not an IPv4"},
+        {ListCommand, {"--lan", "--lan-address", "127.0.0.1:0"}, 2, "not an IPv4"},
+        {ListCommand, {"--lan", "--lan-address", "127.0.0.1:70000"}, 2, "not an IPv4"},
+    };
+    for (const Case& c : cases) {
+        std::vector<std::string> words = c.words;
+        if (c.run == ListCommand) words.insert(words.end(), nowhere.begin(), nowhere.end());
+        const Result r = Invoke(c.run, words);
+        const std::string said = c.words.empty() ? "(none)" : c.words.back();
+        EXPECT_EQ(r.rc, c.rc) << said;
+        if (c.text) {
+            EXPECT_NE((r.out + r.err).find(c.text), std::string::npos) << r.out << r.err;
+        }
+        if (c.rc == 2) {
+            EXPECT_EQ(r.out, "") << said;
+        }
+    }
 }
 
 }  // namespace

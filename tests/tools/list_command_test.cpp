@@ -65,25 +65,5 @@ TEST(ListCommand, FindsUsbSerialAndLanResourcesThatOpen) {
     EXPECT_EQ(rm->Open(com::Bstr(vxi11).get(), visa::kNoLock, 2000, nullptr, session.Out()), S_OK);
 }
 
-TEST(ListCommand, RefusesLanAddressesItCannotUse) {
-    const struct {
-        std::vector<std::string> words;
-        const char* message;
-    } cases[] = {
-        {{"--lan-address", "127.0.0.1"}, "needs --lan"},
-        {{"--lan", "--lan-address", "localhost:111"}, "not an IPv4"},
-        {{"--lan", "--lan-address", "127.0.0.1:0"}, "not an IPv4"},
-        {{"--lan", "--lan-address", "127.0.0.1:70000"}, "not an IPv4"},
-    };
-    for (const auto& c : cases) {
-        std::vector<std::string> words = c.words;
-        words.insert(words.end(), {"--sysfs", "/nonexistent", "--dev", "/nonexistent"});
-        Result r = Invoke(ListCommand, words);
-        EXPECT_EQ(r.rc, 2) << c.words.back();
-        EXPECT_NE(r.err.find(c.message), std::string::npos) << r.err;
-        EXPECT_EQ(r.out, "");
-    }
-}
-
 }  // namespace
 }  // namespace qn::tools

@@ -1,5 +1,5 @@
-// qn731xx channel and timebase against the embedded emulator, and the
-// parsing of their option values.
+// qn731xx channel, timebase and trigger against the embedded emulator, the
+// trigger options of qn731xx fetch, and the parsing of option values.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -38,18 +38,24 @@ TEST(SettingsCommand, TimebaseSetsAndPrintsTheInstrumentsValues) {
         "record-length": 500, "sample-rate": 500000, "sample-mode": "REALTIME"})")) << r.out;
 }
 
-TEST(SettingsCommand, BadInputIsRefusedBeforeOrByTheDriver) {
-    const std::vector<std::vector<std::string>> usage_errors = {
-        {"0"}, {"1", "2"}, {"1", "--range", "4V"}, {"--coupling", "LF"}, {"--enabled", "maybe"},
-        {"--no-such-option"}};
-    for (const auto& words : usage_errors) EXPECT_EQ(Invoke(ChannelCommand, words).rc, 2);
-    EXPECT_EQ(Invoke(TimebaseCommand, {"--points", "1.5"}).rc, 2);
-    EXPECT_EQ(Invoke(TimebaseCommand, {"extra"}).rc, 2);
-    // Values the driver or the instrument refuses fail the command.
-    EXPECT_EQ(Invoke(ChannelCommand, {"3"}).rc, 1);  // QDS4032A has two channels
-    EXPECT_EQ(Invoke(ChannelCommand, {"1", "--impedance", "75"}).rc, 1);
-    EXPECT_EQ(Invoke(TimebaseCommand, {"--type", "envelope"}).rc, 1);
-    EXPECT_EQ(Invoke(TimebaseCommand, {"--help"}).rc, 0);
+TEST(TriggerCommand, SetsAndPrintsTheTrigger) {
+    Result r = Invoke(TriggerCommand, {"--type", "edge", "--source", "UserChannel2", "--level",
+                                       "0.5", "--slope", "negative", "--holdoff", "0.25",
+                                       "--coupling", "hfreject", "--modifier", "none", "--json"});
+    ASSERT_EQ(r.rc, 0) << r.out << r.err;
+    EXPECT_EQ(OutputObject(r), Json::parse(R"({"type": "edge", "source": "UserChannel2",
+        "level": 0.5, "slope": "negative", "coupling": "hfreject", "holdoff": 0.25,
+        "modifier": "none", "continuous": false})")) << r.out;
+
+    r = Invoke(TriggerCommand, {"--type", "glitch", "--source", "VAL_EXTERNAL"});
+    ASSERT_EQ(r.rc, 0) << r.err;
+    EXPECT_NE(r.out.find("VAL_EXTERNAL"), std::string::npos) << r.out;
+}
+
+TEST(TriggerCommand, FetchAcquiresOnTheGivenTrigger) {
+    Result r = Invoke(FetchCommand, {"--trigger-level", "1", "--trigger-source", "UserChannel1"});
+    ASSERT_EQ(r.rc, 0) << r.out << r.err;
+    EXPECT_NE(r.out.find("Channel1"), std::string::npos) << r.out;
 }
 
 TEST(SettingsCommand, ValuesParseByKind) {

@@ -87,14 +87,6 @@ TEST_F(SystemCommands, ScreenshotIsABitmapFile) {
     std::remove(file.c_str());
 }
 
-TEST_F(SystemCommands, BadArgumentsAreUsageErrors) {
-    const std::vector<std::vector<std::string>> scpi = {{":CHAN1:RANG 2\n*RST"}, {""}, {}, {"a", "b"}};
-    for (const auto& words : scpi) EXPECT_EQ(Run(ScpiCommand, words).rc, 2);
-    EXPECT_EQ(Run(SetupCommand, {"copy", "x"}).rc, 2);
-    EXPECT_EQ(Run(SetupCommand, {"save"}).rc, 2);
-    EXPECT_EQ(Run(ScreenshotCommand, {}).rc, 2);
-}
-
 TEST_F(SystemCommands, SystemPrintsClockSerialAndTimeout) {
     Result r = Run(SystemCommand, {"--date", "+2026,+12,+6", "--timeout", "50", "--json"});
     ASSERT_EQ(r.rc, 0) << r.err;
