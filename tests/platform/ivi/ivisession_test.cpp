@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <cstring>
 #include <string>
 #include <thread>
 #include <vector>
@@ -63,9 +64,12 @@ TEST(IviSession, ErrorRecordFollowsTheBufferRuleAndIsPerHandle) {
     ViStatus code = 0;
     EXPECT_EQ(IviSession_GetError(s.vi(), &code, 0, nullptr), 5);  // size query keeps the record
     EXPECT_EQ(code, -5);
-    char small[3] = {'x', 'x', 'x'};
-    EXPECT_EQ(IviSession_GetError(s.vi(), &code, 3, small), 5);  // truncated, still kept
-    EXPECT_STREQ(small, "ab");
+    for (const char* want : {"ab", "abc"}) {  // one and two short of the text's size
+        char small[4] = {'x', 'x', 'x', 'x'};
+        const int size = int(std::strlen(want)) + 1;
+        EXPECT_EQ(IviSession_GetError(s.vi(), &code, size, small), 5);  // truncated, still kept
+        EXPECT_STREQ(small, want);
+    }
     char exact[5];
     EXPECT_EQ(IviSession_GetError(s.vi(), &code, 5, exact), VI_SUCCESS);  // delivered: cleared
     EXPECT_STREQ(exact, "abcd");

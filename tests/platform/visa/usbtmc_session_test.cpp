@@ -29,8 +29,15 @@ TEST(UsbtmcSessionTest, MessagesEndAtTheDevicesEndAndUseItsOperations) {
     EXPECT_NE(ThreadErrorText().find("/dev/usbtmc9"), std::string::npos);
     ASSERT_FALSE(script->timeouts.empty());
     for (std::uint32_t ms : script->timeouts) EXPECT_TRUE(ms >= 1 && ms <= 1000) << ms;
+    // A clear forgets a reply read in part: nothing of it is drained before the next write.
+    script->replies = {"PARTIAL REPLY\n"};
+    ASSERT_EQ(ReadText(msg.get(), &text, 4), S_OK);
     ASSERT_EQ(msg->Clear(), S_OK);
     EXPECT_EQ(script->clears, 1);
+    script->replies = {"AFTER\n"};
+    ASSERT_EQ(Write(msg.get(), "X\n"), S_OK);
+    ASSERT_EQ(ReadText(msg.get(), &text), S_OK);
+    EXPECT_EQ(text, "AFTER\n");
     SHORT stb = 0;
     ASSERT_EQ(msg->ReadSTB(&stb), S_OK);
     EXPECT_EQ(stb, 0x50);
