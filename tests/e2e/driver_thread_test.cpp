@@ -156,6 +156,19 @@ TEST_F(DriverThreads, OneSimulatedSessionManyThreads) {
     EXPECT_EQ(driver->Close(), S_OK);
 }
 
+// Error information belongs to the thread whose call failed: another
+// thread finds none of it, and the failing thread still has it afterwards.
+TEST_F(DriverThreads, ErrorInformationStaysWithTheFailingThread) {
+    auto driver = com::MakeComObject<Quorlen731XX>();
+    ASSERT_EQ(Init(driver.get(), "", "Simulate=true,DriverSetup=Model=QDS4034A", false), S_OK);
+    com::Bstr name;
+    ASSERT_EQ(As<IIviScopeChannels>(driver)->get_Name(-5, name.Out()), E_IVI_INVALID_VALUE);
+    std::string seen = "not run";
+    std::thread([&] { seen = ErrorText(); }).join();
+    EXPECT_EQ(seen, "");
+    EXPECT_NE(ErrorText().find("Invalid value (-5) for method get_Name"), std::string::npos);
+}
+
 // One session per thread: simulated ones and ones against an emulator of
 // their own, each opened, used and closed several times.
 TEST_F(DriverThreads, ManySessionsAtOnce) {

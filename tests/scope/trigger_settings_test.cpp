@@ -210,18 +210,29 @@ TEST_F(TriggerSettings, TvLinesAreSelectedThroughTheirField) {
         LONG line;
         std::vector<const char*> sent;  // empty: refused
     };
+    // Each format's last line and the one after it (NTSC and PAL-M 525, PAL
+    // and SECAM 625, generic 1024, 480p 525, 720p 750, 1080 lines 1125).
     const Case cases[] = {
         {"NTSC", 300, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 37"}},
         {"NTS", 263, {":TRIG:TV:MODE LINEF1;:TRIG:TV:LINE 263"}},
         {"NTSC", 264, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 1"}},
         {"NTSC", 525, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 262"}},
         {"NTSC", 526, {}},
-        {"PAL", 400, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 400"}},
-        {"SEC", 313, {":TRIG:TV:MODE LINEF1;:TRIG:TV:LINE 313"}},
-        {"PALM", 264, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 264"}},
+        {"PAL", 625, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 625"}},
         {"PAL", 626, {}},
-        {"GEN", 1000, {":TRIG:TV:MODE LINEF1;:TRIG:TV:LINE 1000"}},
-        {"P720L60HZ", 700, {":TRIG:TV:MODE LINE", ":TRIG:TV:LINE 700"}},
+        {"SEC", 313, {":TRIG:TV:MODE LINEF1;:TRIG:TV:LINE 313"}},
+        {"SEC", 626, {}},
+        {"PALM", 264, {":TRIG:TV:MODE LINEF2;:TRIG:TV:LINE 264"}},
+        {"PALM", 526, {}},
+        {"GEN", 1024, {":TRIG:TV:MODE LINEF1;:TRIG:TV:LINE 1024"}},
+        {"GEN", 1025, {}},
+        {"P480L60HZ", 525, {":TRIG:TV:MODE LINE", ":TRIG:TV:LINE 525"}},
+        {"P480L60HZ", 526, {}},
+        {"P720L60HZ", 750, {":TRIG:TV:MODE LINE", ":TRIG:TV:LINE 750"}},
+        {"P720L60HZ", 751, {}},
+        {"P1080L24HZ", 1125, {":TRIG:TV:MODE LINE", ":TRIG:TV:LINE 1125"}},
+        {"P1080L24HZ", 1126, {}},
+        {"I1080L50HZ", 1125, {":TRIG:TV:MODE LINE", ":TRIG:TV:LINE 1125"}},
         {"I1080L50HZ", 1126, {}},
     };
     Open("73142A");

@@ -77,16 +77,16 @@ protected:
 
 TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
     Start("QDS4032A");
-    ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:DIG"), S_OK);
+    ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS -0.5;:DIG"), S_OK);
     emu->ServeWaveformData(WordBlock({0, 8000, -32768, -8000}));
     std::vector<double> v;
     EXPECT_EQ(Fetch("Channel1", &v), S_IVISCOPE_INVALID_WFM_ELEMENT) << ErrorText();
     EXPECT_NE(ErrorText().find("At least one element in the retrieved waveform was invalid."),
               std::string::npos);
     ASSERT_EQ(v.size(), 4u);
-    EXPECT_EQ(v[0], 0.0);
-    EXPECT_EQ(v[1], 1.0);
-    EXPECT_EQ(v[3], -1.0);
+    EXPECT_EQ(v[0], -0.5);  // the origin is the offset
+    EXPECT_EQ(v[1], 0.5);
+    EXPECT_EQ(v[3], -1.5);
     VARIANT_BOOL invalid = VARIANT_FALSE;
     auto* coll = static_cast<IIviScopeMeasurements*>(driver.get());
     EXPECT_EQ(coll->IsWaveformElementInvalid(v[2], &invalid), S_OK);
@@ -100,8 +100,11 @@ TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
                                               ":WAV:TYPE?", ":WAV:DATA?"}));
 }
 
+// The read scales with the factor queries, the fetch with the preamble: with
+// an offset (the y origin) they must still agree.
 TEST_F(WaveformOnEmulator, ReadDigitizesAndBothMeasurementKindsAgree) {
     Start("QDS4032A");
+    ASSERT_EQ(Io().InstrWrite(":CHAN1:OFFS -0.37109375"), S_OK);
     ComPtr<IIviScopeMeasurement> cc;
     com::Bstr n("Channel1");
     ASSERT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(n.get(), cc.Out()), S_OK);
@@ -121,7 +124,7 @@ TEST_F(WaveformOnEmulator, ReadDigitizesAndBothMeasurementKindsAgree) {
 
 TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     Start("QDS4032A");
-    ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0;:ACQ:TYPE PEAK;:DIG"), S_OK);
+    ASSERT_EQ(Io().InstrWrite(":CHAN1:RANG 8;:CHAN1:OFFS 0.25;:ACQ:TYPE PEAK;:DIG"), S_OK);
     std::vector<std::int16_t> raw(2001);
     for (std::size_t i = 0; i < raw.size(); ++i) raw[i] = static_cast<std::int16_t>(i);
     emu->ServeWaveformData(WordBlock(raw));
@@ -132,8 +135,8 @@ TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     const auto mins = Values(lo), maxs = Values(hi);
     ASSERT_EQ(mins.size(), 1000u);
     ASSERT_EQ(maxs.size(), 1000u);
-    EXPECT_EQ(mins[999], 1998 * 1.25e-4);
-    EXPECT_EQ(maxs[999], 1999 * 1.25e-4);
+    EXPECT_EQ(mins[999], 1998 * 1.25e-4 + 0.25);
+    EXPECT_EQ(maxs[999], 1999 * 1.25e-4 + 0.25);
 
     SAFEARRAY* a = nullptr;
     EXPECT_EQ(m->FetchWaveform(&a, &x0, &dx), E_IVISCOPE_INVALID_ACQ_TYPE);
