@@ -5,6 +5,8 @@
 #include <gtest/gtest.h>
 
 #include <functional>
+#include <iterator>
+#include <tuple>
 
 #include "io/io_manager.h"
 #include "tests/scope/scope_fixture.h"
@@ -114,50 +116,85 @@ TEST_F(MeasurementTraffic, TwoSourceFormsUseTheInstrumentsSecondSource) {
     }
 }
 
-TEST_F(MeasurementTraffic, FunctionsAreCheckedAgainstTheObjectKindBeforeAnyTraffic) {
+// The measurement functions as documented: the query token of the plain
+// forms (null for the others), the name, and whether a digital, an external
+// and the math object take it (an analog channel takes every function).
+struct Function {
+    const char* token;
+    const char* name;
+    bool digital, external, math;
+};
+const Function kFunctions[] = {
+    {"RIS", "Rise Time", 0, 0, 1},          {"FALL", "Fall Time", 0, 0, 1},
+    {"FREQ", "Frequency", 1, 0, 1},         {"PER", "Period", 1, 0, 1},
+    {"VRMS", "RMS", 0, 0, 1},               {"VPP", "Peak-To-Peak", 0, 1, 1},
+    {"VMAX", "Maximum", 0, 1, 1},           {"VMIN", "Minimum", 0, 1, 1},
+    {"VTOP", "Top", 0, 0, 1},               {"VBAS", "Base", 0, 0, 1},
+    {"VAV", "Y Average", 0, 1, 1},          {"NWID", "Neg Width", 1, 0, 1},
+    {"PWID", "Pos Width", 1, 0, 1},         {"DUTY", "Neg Duty Cycle", 1, 0, 1},
+    {"DUTY", "Pos Duty Cycle", 1, 0, 1},    {"VAMP", "Amplitude", 0, 0, 1},
+    {"VRMS", "Cycle Y RMS", 0, 0, 1},       {"VAV", "Cycle Y Average", 0, 0, 1},
+    {"OVER", "OverShoot", 0, 0, 1},         {"PRES", "Preshoot", 0, 0, 1},
+    {"COUN", "Frequency Counter", 1, 0, 0}, {"XMAX", "X At Max", 0, 1, 1},
+    {"XMIN", "X At Min", 0, 1, 1},          {nullptr, "Delay", 0, 0, 1},
+    {nullptr, "Phase", 0, 0, 1},            {nullptr, "Value At X", 0, 0, 1},
+    {nullptr, "X At Value", 0, 0, 1},       {nullptr, "X Of Edge", 1, 0, 1},
+};
+
+// Every function on every kind of object: refused ones fail before any
+// traffic (the read member too, before acquiring), taken plain ones query
+// their token on the object's source.
+TEST_F(MeasurementTraffic, EveryFunctionHasItsTokenNameAndObjects) {
     Open("73142D");
-    // Make the first two class-compliant-named measurements the math and the
-    // external object, as a model with those inputs would.
+    // The first two class-compliant-named measurements become the math and
+    // the external object, as on a model with those inputs.
     driver_->Core().repcaps.math_measurements = {1, 1};
     driver_->Core().repcaps.external_measurements = {2, 2};
-    struct Case {
-        const char* object;
-        Quorlen731XXMeasurementEnum function;
-        const char* source;  // null: refused
-        const char* token;
-    } cases[] = {
-        {"UserDigitalChannel3", Quorlen731XXMeasurementRiseTime, nullptr, ""},
-        {"UserDigitalChannel3", Quorlen731XXMeasurementFrequency, "DIG3", "FREQ"},
-        {"UserDigitalChannel15", Quorlen731XXMeasurementFrequencyCounter, "DIG15", "COUN"},
-        {"UserDigitalChannel0", Quorlen731XXMeasurementVoltagePeakToPeak, nullptr, ""},
-        {"Channel1", Quorlen731XXMeasurementFrequencyCounter, nullptr, ""},
-        {"Channel1", Quorlen731XXMeasurementOverShoot, "MATH", "OVER"},
-        {"Channel2", Quorlen731XXMeasurementVoltageAverage, "CHAN2", "VAV"},
-        {"Channel2", Quorlen731XXMeasurementRiseTime, nullptr, ""},
-        {"UserChannel4", Quorlen731XXMeasurementFrequencyCounter, "CHAN4", "COUN"},
-        {"UserChannel4", static_cast<Quorlen731XXMeasurementEnum>(28), nullptr, ""},
-        {"UserChannel4", static_cast<Quorlen731XXMeasurementEnum>(-1), nullptr, ""},
-    };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::string(c.object) + " " + std::to_string(c.function));
-        if (c.source) {
-            ExpectSelected(c.source);
-            io_->Expect(std::string(":MEAS:") + c.token + "?\n", "1\n");
+    for (LONG value = 0; value < LONG(std::size(kFunctions)); ++value) {
+        const Function& f = kFunctions[value];
+        const auto function = static_cast<Quorlen731XXMeasurementEnum>(value);
+        SCOPED_TRACE(f.name);
+        com::Bstr name;
+        EXPECT_EQ(Meas("UserChannel1")->FunctionName(function, name.Out()), S_OK);
+        EXPECT_EQ(name.utf8(), f.name);
+        const std::tuple<const char*, const char*, bool> objects[] = {
+            {"UserChannel4", "CHAN4", true},
+            {"UserDigitalChannel15", "DIG15", f.digital},
+            {"Channel2", "CHAN2", f.external},
+            {"Channel1", "MATH", f.math}};
+        for (const auto& [object, source, taken] : objects) {
+            SCOPED_TRACE(object);
+            if (taken && !f.token) continue;  // the other forms have their own tests
+            if (taken) {
+                ExpectSelected(source);
+                io_->Expect(std::string(":MEAS:") + f.token + "?\n", "1\n");
+            }
+            double v = 0;
+            EXPECT_EQ(Meas(object)->FetchWaveformMeasurement(function, &v),
+                      taken ? S_OK : E_IVI_INVALID_VALUE);
+            if (taken) {
+                EXPECT_EQ(v, function == Quorlen731XXMeasurementDutyCycleNeg ? 99.0 : 1.0);
+            } else {
+                const std::string text = ErrorText();
+                EXPECT_NE(text.find("FetchWaveformMeasurement"), std::string::npos) << text;
+                EXPECT_NE(text.find("MeasFunction"), std::string::npos) << text;
+                EXPECT_EQ(Meas(object)->ReadWaveformMeasurement(
+                              function, Quorlen731XXTimeOutEnum(100), &v),
+                          E_IVI_INVALID_VALUE);
+                EXPECT_NE(ErrorText().find("WaveformMeasurement"), std::string::npos);
+            }
+            EXPECT_TRUE(io_->Done());
         }
+    }
+    // Functions outside the set have no name and are refused everywhere.
+    for (LONG bad : {28, -1}) {
+        const auto function = static_cast<Quorlen731XXMeasurementEnum>(bad);
+        com::Bstr name;
         double v = 0;
-        HRESULT hr = Meas(c.object)->FetchWaveformMeasurement(c.function, &v);
-        EXPECT_EQ(hr, c.source ? S_OK : E_IVI_INVALID_VALUE);
-        if (!c.source) {
-            const std::string text = ErrorText();
-            EXPECT_NE(text.find("FetchWaveformMeasurement"), std::string::npos) << text;
-            EXPECT_NE(text.find("MeasFunction"), std::string::npos) << text;
-            // The read member refuses too, before acquiring.
-            EXPECT_EQ(Meas(c.object)->ReadWaveformMeasurement(c.function,
-                                                              Quorlen731XXTimeOutEnum(100), &v),
-                      E_IVI_INVALID_VALUE);
-            EXPECT_NE(ErrorText().find("WaveformMeasurement"), std::string::npos);
-        }
-        EXPECT_TRUE(io_->Done());
+        EXPECT_EQ(Meas("UserChannel4")->FunctionName(function, name.Out()), E_IVI_INVALID_VALUE);
+        EXPECT_EQ(name.utf8(), "");
+        EXPECT_EQ(Meas("UserChannel4")->FetchWaveformMeasurement(function, &v),
+                  E_IVI_INVALID_VALUE);
     }
     // A hidden source ends the measurement after the display check.
     io_->Expect(":STAT? CHAN3\n", "0\n");
@@ -212,24 +249,11 @@ TEST_F(MeasurementTraffic, TheGivenTimeoutHoldsForTheQueryAndIsRestoredOnEveryPa
     EXPECT_EQ(io->timeouts, (std::vector<LONG>{1234, 1234, 1234}));
 }
 
-TEST_F(MeasurementTraffic, FunctionNamesAndSimulatedResults) {
+TEST_F(MeasurementTraffic, SimulatedResultsAreZero) {
     driver_ = SimulatedDriver("73142D");
-    ComPtr<IQuorlen731XXMeasurement> m = Meas("UserChannel1");
-    const std::pair<LONG, const char*> names[] = {
-        {0, "Rise Time"},        {13, "Neg Duty Cycle"}, {14, "Pos Duty Cycle"},
-        {20, "Frequency Counter"}, {27, "X Of Edge"},     {28, nullptr},
-        {-1, nullptr},
-    };
-    for (const auto& [value, name] : names) {
-        BSTR text = nullptr;
-        // A function outside the set has no name: refused.
-        EXPECT_EQ(m->FunctionName(static_cast<Quorlen731XXMeasurementEnum>(value), &text),
-                  name ? S_OK : E_IVI_INVALID_VALUE);
-        EXPECT_EQ(com::BstrToUtf8(text), name ? name : "") << value;
-        SysFreeString(text);
-    }
     double v = 5;
-    EXPECT_EQ(m->FetchWaveformMeasurement(Quorlen731XXMeasurementDelay, &v), S_OK);
+    EXPECT_EQ(Meas("UserChannel1")->FetchWaveformMeasurement(Quorlen731XXMeasurementDelay, &v),
+              S_OK);
     EXPECT_EQ(v, 0.0);
     v = 5;
     EXPECT_EQ(IviMeas("Channel1")->ReadWaveformMeasurement(IviScopeMeasurementFrequency, 10, &v),
