@@ -171,13 +171,13 @@ TEST_F(AcquisitionTraffic, EnvelopesAreNotSupported) {
 TEST_F(AcquisitionTraffic, ConfigureRecordStopsAtTheFirstFailure) {
     Open("73141D");
     Features().digital_channel_count = 0;
-    io_->Expect(":TIM:RANG 0.002\n")
+    io_->Expect(":TIM:RANG 0.00234567890123457\n")
         .Expect(":WAV:SOUR?\n", "CHAN1\n")
         .Expect(":STAT? CHAN1\n", "0\n")
         .Expect(":STAT? CHAN1\n", "0\n")
         .Expect(":STAT? CHAN2\n", "0\n")
         .Expect(":STAT? MATH\n", "0\n");
-    EXPECT_EQ(IviAcq()->ConfigureRecord(0.002, 500, 0.0), E_IVISCOPE_CHANNEL_NOT_ENABLED);
+    EXPECT_EQ(IviAcq()->ConfigureRecord(0.0023456789012345678, 500, 0.0), E_IVISCOPE_CHANNEL_NOT_ENABLED);
     EXPECT_EQ(ErrorText(), "Quorlen731XX: Specified channel is not enabled.");
 
     io_->Expect(":TIM:RANG 0.001\n");

@@ -104,8 +104,8 @@ TEST_F(ChannelTraffic, GroundCouplingNeedsTheFeature) {
 
 TEST_F(ChannelTraffic, ConfigureStopsAtTheFirstFailure) {
     Open("73141D");
-    io_->Expect(":CHAN1:PROB 10\n").Expect(":CHAN1:RANG 2\n").Expect(":CHAN1:OFFS 0.5\n");
-    EXPECT_EQ(Ivi(1)->Configure(2.0, 0.5, IviScopeVerticalCouplingGnd, 10.0, VARIANT_TRUE),
+    io_->Expect(":CHAN1:PROB 12.3456789012346\n").Expect(":CHAN1:RANG 2\n").Expect(":CHAN1:OFFS 0.5\n");
+    EXPECT_EQ(Ivi(1)->Configure(2.0, 0.5, IviScopeVerticalCouplingGnd, 12.345678901234567, VARIANT_TRUE),
               E_QUORLEN731XX_VERTICAL_GROUND_COUPLING);
     EXPECT_TRUE(io_->Done());
 

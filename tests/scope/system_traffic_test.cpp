@@ -76,9 +76,11 @@ TEST_F(SystemTraffic, SingleCommandMembersSendTheirCommands) {
         {":MARK:MODE MAN", [&] { return m->put_Enabled(VARIANT_TRUE); }},
         {":MARK:MODE OFF", [&] { return m->put_Enabled(VARIANT_FALSE); }},
         {":MARK:X2P -0.123456789012346", [&] { return m->put_X2Position(-0.12345678901234567); }},
-        {":MARK:Y1P 2.5e-09", [&] { return m->put_Y1Position(2.5e-9); }},
+        {":MARK:X1P 3.45678901234568e+21", [&] { return m->put_X1Position(3.4567890123456789e21); }},
+        {":MARK:Y1P -2.34567890123457e-09", [&] { return m->put_Y1Position(-2.3456789012345678e-9); }},
+        {":MARK:Y2P 0.987654321098765", [&] { return m->put_Y2Position(0.98765432109876543); }},
         {":EXT:UNIT AMP", [&] { return e->put_Units(Quorlen731XXUnitsAmps); }},
-        {":EXT:PROB 10", [&] { return e->put_ProbeAttenuation(10.0); }},
+        {":EXT:PROB 12.3456789012346", [&] { return e->put_ProbeAttenuation(12.345678901234567); }},
     };
     for (const auto& [sent, call] : cases) {
         SCOPED_TRACE(sent);

@@ -195,10 +195,10 @@ TEST_F(TriggerSettings, ConfigureSelectsTheTypeThenTheHoldoff) {
     EXPECT_EQ(Trig()->Configure(Quorlen731XXTriggerImmediate, 1.0),
               E_QUORLEN731XX_MODEL_NOT_SUPPORTED);
     Expect({":TRIG:TV:SOUR CHAN2", ":TRIG:SOUR CHAN2;:TRIG:GLIT:SOUR CHAN2",
-            ":TRIG:LEV -0.25"});
+            ":TRIG:LEV -0.123456789012346"});
     com::Bstr ch2("UserChannel2");
     IIviScopeTriggerEdge* edge = driver_.get();
-    EXPECT_EQ(edge->Configure(ch2.get(), -0.25, IviScopeTriggerSlopeNegative), S_OK);
+    EXPECT_EQ(edge->Configure(ch2.get(), -0.12345678901234567, IviScopeTriggerSlopeNegative), S_OK);
     // TV is current: the edge slope waits for Edge.
     Expect({":TRIG:SLOP NEG", ":TRIG:MODE EDGE"});
     EXPECT_EQ(Trig()->put_Type(Quorlen731XXTriggerEdge), S_OK);

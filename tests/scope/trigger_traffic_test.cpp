@@ -90,9 +90,9 @@ TEST_F(TriggerTraffic, SettingsOfAnotherTypeWaitUntilTheirTypeIsSelected) {
          {":TRIG:MODE GLIT", ":TRIG:GLIT:QUAL GRE;:TRIG:GLIT:POL POS",
           ":TRIG:GLIT:LESS 0;:TRIG:GLIT:GRE 0", ":TRIG:GLIT:LESS?|2e-09"}},
         {"width low threshold",
-         [](TriggerTest& t) { return t.Width()->put_ThresholdLow(-2.5e-06); },
+         [](TriggerTest& t) { return t.Width()->put_ThresholdLow(-2.3456789012345678e-06); },
          Quorlen731XXTriggerWidth,
-         {":TRIG:MODE DUR;:TRIG:DUR:QUAL INR;:TRIG:DUR:RANG -2.5e-06,0", "TRIG:DUR:PATT 1,1"}},
+         {":TRIG:MODE DUR;:TRIG:DUR:QUAL INR;:TRIG:DUR:RANG -2.34567890123457e-06,0", "TRIG:DUR:PATT 1,1"}},
         {"width condition and polarity",
          [](TriggerTest& t) {
              HRESULT hr = t.Width()->put_condition(Quorlen731XXWidthOutside);
