@@ -171,50 +171,46 @@ TEST_F(IoManagerTest, EveryOperationOpensItsTraceRecord) {
     std::filesystem::remove_all(dir);
 }
 
+// Boolean and enumeration queries of the command on the stack: the reply is
+// converted, one outside the set is an unexpected response, and one read
+// before a failed status check is still delivered.
 TEST_F(IoManagerTest, CommandStackQueries) {
     Open();
     io_->Expect("\n");
     EXPECT_EQ(Io().InstrPrintCommand(), S_OK);  // empty stack: just the terminator
-
-    driver_->Commands().PushCommand(":CHAN1:DISP?");
-    io_->Expect(":CHAN1:DISP?\n", " 1 \n").Expect(":CHAN1:DISP?\n", "ON\n");
-    VARIANT_BOOL b = VARIANT_FALSE;
-    EXPECT_EQ(Io().InstrQueryCommandBool(&b), S_OK);
-    EXPECT_EQ(b, VARIANT_TRUE);
-    EXPECT_EQ(Io().InstrQueryCommandBool(&b), E_IVI_UNEXPECTED_RESPONSE);
-    EXPECT_EQ(b, VARIANT_FALSE);
-
     static const CEnumCommandTable kUnits{{"", 0, "VOLT"}, {"", 1, "AMP"}};
-    driver_->Commands().PopCommand();
-    driver_->Commands().PushCommand(":CHAN1:UNIT?");
-    io_->Expect(":CHAN1:UNIT?\n", "AMP\n").Expect(":CHAN1:UNIT?\n", "volt\n");
-    LONG units = -1;
-    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), S_OK);
-    EXPECT_EQ(units, 1);
-    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), E_IVI_UNEXPECTED_RESPONSE);
-    EXPECT_EQ(units, 1);
-    driver_->Commands().PopCommand();
-}
-
-// A reply read before the status check failed is still delivered, by the
-// boolean and enumeration queries as by the numeric ones.
-TEST_F(IoManagerTest, CommandStackQueriesDeliverTheReplyWhenTheStatusCheckFails) {
-    Open();
-    driver_->Core().session.flags.query_instrument_status = true;
+    struct Case {
+        const char* command;
+        const char* reply;
+        bool status_check;
+        HRESULT hr;
+        LONG value;  // boolean: 1 true, 0 false (set false from true); enumeration from -1
+    };
+    const Case cases[] = {
+        {":CHAN1:DISP?", " 1 ", false, S_OK, 1},
+        {":CHAN1:DISP?", "ON", false, E_IVI_UNEXPECTED_RESPONSE, 0},
+        {":CHAN1:DISP?", "1", true, E_IVI_INSTRUMENT_STATUS, 1},
+        {":CHAN1:UNIT?", "AMP", false, S_OK, 1},
+        {":CHAN1:UNIT?", "volt", false, E_IVI_UNEXPECTED_RESPONSE, -1},
+        {":CHAN1:UNIT?", "AMP", true, E_IVI_INSTRUMENT_STATUS, 1},
+    };
     io_->AnswerStatusWith("+32");
-    driver_->Commands().PushCommand(":CHAN1:DISP?");
-    io_->Expect(":CHAN1:DISP?\n", "1\n");
-    VARIANT_BOOL b = VARIANT_FALSE;
-    EXPECT_EQ(Io().InstrQueryCommandBool(&b), E_IVI_INSTRUMENT_STATUS);
-    EXPECT_EQ(b, VARIANT_TRUE);
-    driver_->Commands().PopCommand();
-    static const CEnumCommandTable kUnits{{"", 0, "VOLT"}, {"", 1, "AMP"}};
-    driver_->Commands().PushCommand(":CHAN1:UNIT?");
-    io_->Expect(":CHAN1:UNIT?\n", "AMP\n");
-    LONG units = -1;
-    EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &units), E_IVI_INSTRUMENT_STATUS);
-    EXPECT_EQ(units, 1);
-    driver_->Commands().PopCommand();
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.command) + " " + c.reply);
+        driver_->Core().session.flags.query_instrument_status = c.status_check;
+        driver_->Commands().PushCommand(c.command);
+        io_->Expect(std::string(c.command) + "\n", std::string(c.reply) + "\n");
+        LONG value = -1;
+        if (std::string_view(c.command).ends_with("DISP?")) {
+            VARIANT_BOOL b = VARIANT_TRUE;
+            EXPECT_EQ(Io().InstrQueryCommandBool(&b), c.hr);
+            value = b == VARIANT_TRUE ? 1 : b == VARIANT_FALSE ? 0 : -2;
+        } else {
+            EXPECT_EQ(Io().InstrQueryCommandEnum(kUnits, &value), c.hr);
+        }
+        EXPECT_EQ(value, c.value);
+        driver_->Commands().PopCommand();
+    }
 }
 
 TEST_F(IoManagerTest, ErrorQueryParsesTheReplyWithoutCheckingStatus) {

@@ -137,6 +137,18 @@ struct BadStore {
     const char* expected;  // part of the error text
 };
 
+// A software module holding one data component "a" of type and value.
+std::string Component(const char* type, const char* value) {
+    return "<SoftwareModule name='m'><DataComponent name='a' type='" + std::string(type) + "'" +
+           (value ? " value='" + std::string(value) + "'" : "") + "/></SoftwareModule>";
+}
+// A session with a virtual name "c" over one range.
+std::string Range(const char* start, const char* end, const char* physical) {
+    return "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='" +
+           std::string(start) + "' end='" + end + "' physicalStart='" + physical +
+           "'/></VirtualName></DriverSession>";
+}
+
 const BadStore kBadStores[] = {
     {"unknown_element", "<Session name='x'/>", "unexpected <Session>"},
     {"misspelt_flag", "<DriverSession name='x' simualte='1'/>", "unknown attribute \"simualte\""},
@@ -147,47 +159,20 @@ const BadStore kBadStores[] = {
     {"unknown_module", "<DriverSession name='x' softwareModule='none'/>",
      "unknown software module"},
     {"dangling_logical_name", "<LogicalName name='a' session='none'/>", "unknown session"},
-    {"unknown_type",
-     "<SoftwareModule name='m'><DataComponent name='a' type='Text' value='1'/></SoftwareModule>",
-     "unknown type \"Text\""},
-    {"integer_overflow",
-     "<SoftwareModule name='m'><DataComponent name='a' type='Integer' "
-     "value='2147483648'/></SoftwareModule>",
-     "not a valid Integer"},
-    {"integer_junk",
-     "<SoftwareModule name='m'><DataComponent name='a' type='Integer' "
-     "value='12abc'/></SoftwareModule>",
-     "not a valid Integer"},
-    {"real_junk",
-     "<SoftwareModule name='m'><DataComponent name='a' type='Real' value='1.5V'/></SoftwareModule>",
-     "not a valid Real"},
-    {"boolean_junk",
-     "<SoftwareModule name='m'><DataComponent name='a' type='Boolean' "
-     "value='on'/></SoftwareModule>",
-     "not a valid Boolean"},
-    {"missing_value",
-     "<SoftwareModule name='m'><DataComponent name='a' type='String'/></SoftwareModule>",
-     "needs a \"value\""},
+    {"unknown_type", Component("Text", "1"), "unknown type \"Text\""},
+    {"integer_overflow", Component("Integer", "2147483648"), "not a valid Integer"},
+    {"integer_junk", Component("Integer", "12abc"), "not a valid Integer"},
+    {"real_junk", Component("Real", "1.5V"), "not a valid Real"},
+    {"boolean_junk", Component("Boolean", "on"), "not a valid Boolean"},
+    {"missing_value", Component("String", nullptr), "needs a \"value\""},
     {"duplicate_component",
      "<SoftwareModule name='m'><DataComponent name='a' type='String' value=''/>"
      "<DataComponent name='a' type='String' value=''/></SoftwareModule>",
      "defined twice"},
-    {"range_reversed",
-     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='4' end='1' "
-     "physicalStart='1'/></VirtualName></DriverSession>",
-     "end is below"},
-    {"range_huge",
-     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='2000000000' "
-     "physicalStart='1'/></VirtualName></DriverSession>",
-     "more than 100000"},
-    {"range_negative",
-     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='-1' end='1' "
-     "physicalStart='1'/></VirtualName></DriverSession>",
-     "non-negative"},
-    {"range_physical_overflow",
-     "<DriverSession name='x'><VirtualName name='c' mapTo='C'><Range start='0' end='9' "
-     "physicalStart='2147483645'/></VirtualName></DriverSession>",
-     "exceed"},
+    {"range_reversed", Range("4", "1", "1"), "end is below"},
+    {"range_one_too_many", Range("0", "100000", "1"), "more than 100000"},
+    {"range_negative", Range("-1", "1", "1"), "non-negative"},
+    {"range_physical_overflow", Range("0", "9", "2147483639"), "exceed"},
     {"virtual_collision",
      "<DriverSession name='x'><VirtualName name='c1' mapTo='A'/><VirtualName name='C' "
      "mapTo='B'><Range start='1' end='1' physicalStart='1'/></VirtualName></DriverSession>",
@@ -201,6 +186,15 @@ TEST(ConfigStore, SchemaErrorsNameTheProblemAndItsPosition) {
         EXPECT_EQ(r.status, LoadStatus::kError) << bad.name;
         EXPECT_NE(r.error.find(bad.expected), std::string::npos) << bad.name << ": " << r.error;
         EXPECT_EQ(r.error.rfind("test.xml: line 2", 0), 0u) << bad.name << ": " << r.error;
+    }
+}
+
+// The largest range and the one ending at the largest physical index load.
+TEST(ConfigStore, RangesAtTheirLimitsLoad) {
+    for (const std::string& range : {Range("1", "100000", "1"), Range("0", "9", "2147483638")}) {
+        LoadResult r =
+            ConfigStore::Parse("<IviConfigurationStore>" + range + "</IviConfigurationStore>");
+        EXPECT_TRUE(r.loaded()) << range << ": " << r.error;
     }
 }
 
