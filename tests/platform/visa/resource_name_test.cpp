@@ -19,15 +19,15 @@ struct Good {
 constexpr Good kGood[] = {
     {"TCPIP0::192.168.1.5::5025::SOCKET", 6, 0, "SOCKET", "192.168.1.5", 5025, "",
      "TCPIP0::192.168.1.5::5025::SOCKET"},
-    {"tcpip3::Scope-A::5025::socket", 6, 3, "SOCKET", "Scope-A", 5025, "",
-     "TCPIP3::Scope-A::5025::SOCKET"},
+    {"tcpip3::Scope-A::65535::socket", 6, 3, "SOCKET", "Scope-A", 65535, "",
+     "TCPIP3::Scope-A::65535::SOCKET"},
     {"TCPIP::[::1]::5025::SOCKET", 6, 0, "SOCKET", "::1", 5025, "", "TCPIP0::[::1]::5025::SOCKET"},
     {"TCPIP::host", 6, 0, "INSTR", "host", 0, "inst0", "TCPIP0::host::inst0::INSTR"},
     {"TCPIP0::host::INSTR", 6, 0, "INSTR", "host", 0, "inst0", "TCPIP0::host::inst0::INSTR"},
     {"TCPIP0::host::hislip0::instr", 6, 0, "INSTR", "host", 0, "hislip0",
      "TCPIP0::host::hislip0::INSTR"},
-    {"TCPIP0::127.0.0.1:4000::inst0::INSTR", 6, 0, "INSTR", "127.0.0.1", 4000, "inst0",
-     "TCPIP0::127.0.0.1:4000::inst0::INSTR"},
+    {"TCPIP0::127.0.0.1:65535::inst0::INSTR", 6, 0, "INSTR", "127.0.0.1", 65535, "inst0",
+     "TCPIP0::127.0.0.1:65535::inst0::INSTR"},
     {"TCPIP::[::1]:1::INSTR", 6, 0, "INSTR", "::1", 1, "inst0", "TCPIP0::[::1]:1::inst0::INSTR"},
     {"  TCPIP0::host::5025::SOCKET\t", 6, 0, "SOCKET", "host", 5025, "",
      "TCPIP0::host::5025::SOCKET"},
@@ -39,7 +39,7 @@ constexpr Good kGood[] = {
     {"usb::2391::6038::MY123::0", 7, 0, "INSTR", "", 0, "",
      "USB0::0x0957::0x1796::MY123::0::INSTR"},
     {"GPIB0::7::INSTR", 1, 0, "INSTR", "", 0, "", "GPIB0::7::INSTR"},
-    {"GPIB1::7::30", 1, 1, "INSTR", "", 0, "", "GPIB1::7::30::INSTR"},
+    {"GPIB1::30::30", 1, 1, "INSTR", "", 0, "", "GPIB1::30::30::INSTR"},
 };
 
 TEST(ResourceNameTest, AcceptedFormsParseAndPrintCanonically) {
@@ -61,12 +61,12 @@ TEST(ResourceNameTest, AcceptedFormsParseAndPrintCanonically) {
 }
 
 TEST(ResourceNameTest, PartsOfSerialUsbAndGpibResources) {
-    auto usb = ParseResourceName("USB0::0x0957::0x1796::MY123::2::INSTR");
+    auto usb = ParseResourceName("USB0::0x0957::0xFFFF::MY123::255::INSTR");
     ASSERT_TRUE(usb);
     EXPECT_EQ(usb->vendor_id, 0x0957);
-    EXPECT_EQ(usb->product_id, 0x1796);
+    EXPECT_EQ(usb->product_id, 0xFFFF);
     EXPECT_EQ(usb->serial_number, "MY123");
-    EXPECT_EQ(usb->usb_interface, 2);
+    EXPECT_EQ(usb->usb_interface, 255);
     auto gpib = ParseResourceName("GPIB0::7::3::INSTR");
     ASSERT_TRUE(gpib);
     EXPECT_EQ(gpib->primary_address, 7);
