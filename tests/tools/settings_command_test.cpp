@@ -67,9 +67,13 @@ TEST(SettingsCommand, ValuesParseByKind) {
         const char* printed;
     };
     const Case cases[] = {
-        {SettingKind::kReal, "1e-3", true, "0.001"},  {SettingKind::kReal, "", false, ""},
+        {SettingKind::kReal, "1e-3", true, "0.001"},
+        {SettingKind::kReal, "-0.12345678901234567", true, "-0.123456789012346"},  {SettingKind::kReal, "", false, ""},
         {SettingKind::kReal, "2 V", false, ""},       {SettingKind::kInteger, "-7", true, "-7"},
-        {SettingKind::kInteger, "9999999999", false, ""},
+        {SettingKind::kInteger, "2147483647", true, "2147483647"},
+        {SettingKind::kInteger, "2147483648", false, ""},
+        {SettingKind::kInteger, "-2147483648", true, "-2147483648"},
+        {SettingKind::kInteger, "-2147483649", false, ""},
         {SettingKind::kSwitch, "ON", true, "on"},     {SettingKind::kSwitch, "0", true, "off"},
         {SettingKind::kChoice, "dc", true, "DC"},     {SettingKind::kChoice, "D", false, ""},
         {SettingKind::kQuotedText, "A B", true, "\"A B\""},
