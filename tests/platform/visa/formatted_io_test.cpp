@@ -5,9 +5,7 @@
 #include <cstring>
 #include <vector>
 
-#include "platform/visa/visa.h"
-#include "tests/platform/visa/loopback_peer.h"
-#include "tests/platform/visa/visa_test_util.h"
+#include "tests/platform/visa/instrument_ends.h"
 
 namespace qn::visa::test {
 namespace {
@@ -15,34 +13,30 @@ namespace {
 using qn::com::Bstr;
 using qn::com::Variant;
 
-// A formatted-I/O object over a session on the peer; at the end the session
-// is released and the peer's script must have run to its end.
+// A formatted-I/O object over a socket session whose instrument end the
+// test drives.
 struct Bound {
-    explicit Bound(LoopbackPeer& p, LONG timeout_ms = 2000) : peer(p) {
-        p.Start();
-        msg = OpenMessage(p.Resource(), timeout_ms);
+    explicit Bound(LONG timeout_ms = 2000) {
+        msg = end.Open(timeout_ms);
         EXPECT_EQ(CreateFormattedIO488(io.Out()), S_OK);
         EXPECT_EQ(io->put_IO(msg.get()), S_OK);
         EXPECT_EQ(io.As(direct), S_OK);
     }
-    ~Bound() {
-        direct.reset();
-        io.reset();
-        msg.reset();
-        EXPECT_EQ(peer.Finish(), "");
+    // Writes a query, checks that the instrument got it, has it answered and
+    // reads the reply through the formatted object.
+    std::string Query(const std::string& query, const std::string& reply) {
+        EXPECT_EQ(Write(msg.get(), query), S_OK);
+        EXPECT_EQ(end.ReceiveLine(), query);
+        end.Send(reply);
+        Bstr text;
+        EXPECT_EQ(io->ReadString(text.Out()), S_OK) << ThreadErrorText();
+        return text.utf8();
     }
-    LoopbackPeer& peer;
+    SocketEnd end;
     ComPtr<IMessage> msg;
     ComPtr<IFormattedIO488> io;
     ComPtr<IFormattedIO488Direct> direct;
 };
-
-std::string Query(Bound& b, const std::string& q) {
-    Write(b.msg.get(), q);
-    std::string text;
-    EXPECT_EQ(ReadText(b.msg.get(), &text), S_OK) << ThreadErrorText();
-    return text;
-}
 
 // Binary data with line feeds in it: only the declared length may end it.
 std::string BinaryData(std::size_t n) {
@@ -59,12 +53,9 @@ std::string Block(const std::string& data) {
 TEST(FormattedIOTest, BlockWithEmbeddedLineFeedsAtEveryChunkSize) {
     const std::string data = BinaryData(300);
     const std::size_t kChunks[] = {1, 2, 3, 5, 7, 11, 64, 299, 300, 4096};
-    LoopbackPeer peer;
-    for (std::size_t chunk : kChunks) peer.Expect("WAV?\n").Send(Block(data) + "\n", chunk);
-    peer.Expect("*OPC?\n").Send("1\n");
-    Bound b(peer);
+    Bound b;
     for (std::size_t chunk : kChunks) {
-        Write(b.msg.get(), "WAV?\n");
+        b.end.Send(Block(data) + "\n", chunk, 0);
         Variant v;
         ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_UI1, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK)
             << "chunk " << chunk << ": " << ThreadErrorText();
@@ -72,16 +63,17 @@ TEST(FormattedIOTest, BlockWithEmbeddedLineFeedsAtEveryChunkSize) {
         ASSERT_EQ(qn::com::SafeArrayCount(v.parray), data.size());
         EXPECT_EQ(std::memcmp(v.parray->pvData, data.data(), data.size()), 0) << chunk;
     }
-    // The trailing line feed was consumed: the next reply is not shifted.
-    EXPECT_EQ(Query(b, "*OPC?\n"), "1\n");
+    // Each trailing line feed was consumed: the next reply is not shifted.
+    b.end.Send("1\n");
+    Bstr next;
+    ASSERT_EQ(b.io->ReadString(next.Out()), S_OK);
+    EXPECT_EQ(next.utf8(), "1\n");
 }
 
 TEST(FormattedIOTest, WordBlocksHonourByteOrderAndDirectBuffers) {
     const std::string be("\x01\x02\xff\xfe", 4);  // 0x0102, 0xfffe big-endian
-    LoopbackPeer peer;
-    peer.Send(Block(be) + "\n").Send(Block(be) + "\n").Send("xx#14" + be + "\n");
-    peer.Send(Block(be + be) + "\n");
-    Bound b(peer);
+    Bound b;
+    b.end.Send(Block(be) + "\n" + Block(be) + "\nxx#14" + be + "\n" + Block(be + be) + "\n");
     Variant v;
     ASSERT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), S_OK);
     ASSERT_EQ(v.vt, VT_ARRAY | VT_I2);
@@ -127,13 +119,11 @@ TEST(FormattedIOTest, BlocksEndWithTheirMessageWithTheTerminationCharacterOnAndO
         {false, "#16ab\ncd\n\n", "ab\ncd\n"},
         {true, "#11\n\n", "\n"},
     };
-    LoopbackPeer peer;
-    for (const Case& c : cases) peer.Expect("WAV?\n").Send(c.reply + "NEXT\n");
-    Bound b(peer);
+    Bound b;
     for (const Case& c : cases) {
         SCOPED_TRACE(c.reply + (c.term_char ? " (term char on)" : " (term char off)"));
         b.msg->put_TerminationCharacterEnabled(c.term_char ? VARIANT_TRUE : VARIANT_FALSE);
-        Write(b.msg.get(), "WAV?\n");
+        b.end.Send(c.reply + "NEXT\n");
         BYTE data[16] = {};
         LONG actual = -1;
         ASSERT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_UI1, data, 16, &actual, VARIANT_FALSE,
@@ -163,10 +153,8 @@ TEST(FormattedIOTest, BlockSinkGetsTheWholeBlockOrRefusesIt) {
         }
     } sink;
     const std::string be("\x01\x02\xff\xfe\x80\x00", 6);
-    LoopbackPeer peer;
-    peer.Send(Block(be) + "\n").Send(Block(be) + "\n").Send(Block("") + "\n");
-    peer.Expect("*IDN?\n").Send("ok\n");
-    Bound b(peer);
+    Bound b;
+    b.end.Send(Block(be) + "\n" + Block(be) + "\n" + Block("") + "\n");
     LONG actual = -1;
     sink.limit = 6;
     ASSERT_EQ(
@@ -185,7 +173,7 @@ TEST(FormattedIOTest, BlockSinkGetsTheWholeBlockOrRefusesIt) {
         S_OK);
     EXPECT_EQ(actual, 0);
     EXPECT_EQ(sink.asked, (std::vector<std::size_t>{6, 6}));  // never for an empty block
-    EXPECT_EQ(Query(b, "*IDN?\n"), "ok\n");
+    EXPECT_EQ(b.Query("*IDN?\n", "ok\n"), "ok\n");
     EXPECT_EQ(
         b.direct->ReadIEEEBlockToSink(BinaryType_I2, nullptr, &actual, VARIANT_FALSE, VARIANT_TRUE),
         E_POINTER);
@@ -206,32 +194,24 @@ TEST(FormattedIOTest, BadBlockHeadersFailAndTheSessionRecovers) {
         {"12345\n", E_VISA_INVALID_FORMAT},    // no block at all
         {"#13abcd\n", E_VISA_INVALID_FORMAT},  // 3 bytes for 2-byte elements
     };
-    LoopbackPeer peer;
-    std::vector<std::future<void>> sent;
-    for (const Case& c : kCases) {
-        sent.push_back(peer.Signal());
-        peer.Expect("WAV?\n").Send(c.reply).Notify().Expect("*OPC?\n").Send("1\n");
-    }
-    Bound b(peer, 500);
+    Bound b(500);
     b.direct->put_MaxBlockBytes(1000);
-    for (std::size_t i = 0; i < std::size(kCases); ++i) {
-        Write(b.msg.get(), "WAV?\n");
-        sent[i].wait();
+    for (const Case& c : kCases) {
+        b.end.Send(c.reply);
         Variant v;
-        EXPECT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v),
-                  kCases[i].expected)
-            << kCases[i].reply;
-        if (FAILED(kCases[i].expected)) {
+        EXPECT_EQ(b.io->ReadIEEEBlock(BinaryType_I2, VARIANT_FALSE, VARIANT_TRUE, &v), c.expected)
+            << c.reply;
+        if (FAILED(c.expected)) {
             EXPECT_FALSE(ThreadErrorText().empty());
         }
-        EXPECT_EQ(Query(b, "*OPC?\n"), "1\n") << kCases[i].reply;
+        EXPECT_EQ(b.Query("*OPC?\n", "1\n"), "1\n") << c.reply;
     }
 }
 
 TEST(FormattedIOTest, ConnectionDroppedMidBlock) {
-    LoopbackPeer peer;
-    peer.Send("#41000" + std::string(10, 'x')).Drop();
-    Bound b(peer, kTimeoutInfinite);
+    Bound b(kTimeoutInfinite);
+    b.end.Send("#41000" + std::string(10, 'x'));
+    b.end.HangUp();
     BYTE buf[1000];
     LONG actual = 0;
     EXPECT_EQ(b.direct->ReadIEEEBlockInto(BinaryType_UI1, buf, 1000, &actual, VARIANT_FALSE,
@@ -241,17 +221,15 @@ TEST(FormattedIOTest, ConnectionDroppedMidBlock) {
 }
 
 TEST(FormattedIOTest, NumbersAndListsOfEachType) {
-    LoopbackPeer peer;
-    peer.Send("+1.5E+01;-7,40000\n").Send("1, 2 ,3\n").Send("1.5,ABC,#H10\n").Send("\n");
-    peer.Send("2.7V\n");
-    Bound b(peer);
+    Bound b;
+    b.end.Send("-1.2345678901234567E+01;-32768,32768\n1, 2 ,3\n1.5,ABC,#H10\n\n2.7V\n");
     Variant v;
     ASSERT_EQ(b.io->ReadNumber(ASCIIType_R8, VARIANT_FALSE, &v), S_OK);
     EXPECT_EQ(v.vt, VT_R8);
-    EXPECT_DOUBLE_EQ(v.dblVal, 15.0);
+    EXPECT_EQ(v.dblVal, -12.345678901234567);  // every digit
     ASSERT_EQ(b.io->ReadNumber(ASCIIType_I2, VARIANT_FALSE, &v), S_OK);
     EXPECT_EQ(v.vt, VT_I2);
-    EXPECT_EQ(v.iVal, -7);
+    EXPECT_EQ(v.iVal, -32768);  // the smallest, and the largest + 1 overflows
     EXPECT_EQ(b.io->ReadNumber(ASCIIType_I2, VARIANT_TRUE, &v), DISP_E_OVERFLOW);
     ASSERT_EQ(b.io->ReadList(ASCIIType_I4, nullptr, &v), S_OK);
     ASSERT_EQ(v.vt, VT_ARRAY | VT_I4);
@@ -273,21 +251,19 @@ TEST(FormattedIOTest, NumbersAndListsOfEachType) {
 }
 
 TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
-    LoopbackPeer peer;
-    peer.Expect(":TIM:SCAL -1.23456789012345e-05\n");
-    peer.Expect(":CHAN1:OFFS -3\n");
-    peer.Expect("VALS 1,2.5,-3\n");
-    peer.Expect(std::string(":WMEM #14\x01\x02\xff\xfe\n", 12));
-    Bound b(peer);
+    Bound b;
     ASSERT_EQ(b.io->WriteString(Bstr(":TIM:SCAL ").get(), VARIANT_FALSE), S_OK);
     ASSERT_EQ(
         b.io->WriteNumber(Variant::Double(-1.23456789012345e-05), ASCIIType_R8, VARIANT_FALSE),
         S_OK);
     ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    EXPECT_EQ(b.end.ReceiveLine(), ":TIM:SCAL -1.23456789012345e-05\n");
     ASSERT_EQ(b.io->WriteString(Bstr(":CHAN1:OFFS ").get(), VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteNumber(Variant::Double(-2.6), ASCIIType_I4, VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
-    EXPECT_EQ(b.io->WriteNumber(Variant::Double(1e6), ASCIIType_I2, VARIANT_TRUE), DISP_E_OVERFLOW);
+    EXPECT_EQ(b.end.ReceiveLine(), ":CHAN1:OFFS -3\n");
+    EXPECT_EQ(b.io->WriteNumber(Variant::Double(32768), ASCIIType_I2, VARIANT_TRUE),
+              DISP_E_OVERFLOW);
 
     Variant list;
     list.vt = VT_ARRAY | VT_R8;
@@ -297,6 +273,7 @@ TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
     ASSERT_EQ(b.io->WriteString(Bstr("VALS ").get(), VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteList(&list, ASCIIType_R8, nullptr, VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    EXPECT_EQ(b.end.ReceiveLine(), "VALS 1,2.5,-3\n");
 
     Variant words;
     words.vt = VT_ARRAY | VT_I2;
@@ -305,22 +282,17 @@ TEST(FormattedIOTest, WritesAreBufferedAndByteExact) {
     std::memcpy(words.parray->pvData, w, sizeof w);
     ASSERT_EQ(b.io->WriteIEEEBlock(Bstr(":WMEM ").get(), words, VARIANT_FALSE), S_OK);
     ASSERT_EQ(b.io->WriteString(Bstr("\n").get(), VARIANT_TRUE), S_OK);
+    EXPECT_EQ(b.end.ReceiveLine(), std::string(":WMEM #14\x01\x02\xff\xfe\n", 14));
 }
 
 // A reply that timed out half-read must not prefix the next one.
 TEST(FormattedIOTest, TimedOutReplyDoesNotLeakIntoTheNext) {
-    LoopbackPeer peer;
-    auto late = peer.Signal();
-    peer.Expect("A?\n").Send("abc").Pause(300).Send("def\n").Notify();
-    peer.Expect("B?\n").Send("good\n");
-    Bound b(peer, 150);
-    Write(b.msg.get(), "A?\n");
+    Bound b(150);
+    b.end.Send("abc");
     Bstr text;
     EXPECT_EQ(b.io->ReadString(text.Out()), E_VISA_TIMEOUT);
-    late.wait();
-    Write(b.msg.get(), "B?\n");
-    ASSERT_EQ(b.io->ReadString(text.Out()), S_OK) << ThreadErrorText();
-    EXPECT_EQ(text.utf8(), "good\n");
+    b.end.Send("def\n");
+    EXPECT_EQ(b.Query("B?\n", "good\n"), "good\n");
 }
 
 TEST(FormattedIOTest, UnboundObjectAndArguments) {

@@ -47,7 +47,7 @@ class InstrumentEnd {
 class FdEnd : public InstrumentEnd {
   public:
     ~FdEnd() override { HangUp(); }
-    void Send(const std::string& bytes, std::size_t piece, int gap_ms) override {
+    void Send(const std::string& bytes, std::size_t piece = 0, int gap_ms = 1) override {
         Join();
         if (piece == 0) {
             WriteAll(bytes);
