@@ -74,20 +74,21 @@ TEST_F(IoManagerTest, TerminatorIsAppendedOnceAndStrippedOnce) {
     EXPECT_EQ(reply, "x\n");
 }
 
+// Whole numbers are cut toward zero (an empty reply is 0); reals keep every
+// digit, and a word is NaN.
 TEST_F(IoManagerTest, NumericRepliesConvertByType) {
     Open();
-    io_->Expect("A?\n", "\n")
-        .Expect("B?\n", "2.7\n")
-        .Expect("C?\n", "-2.7\n")
-        .Expect("D?\n", "OFF\n");
-    LONG l = 7;
-    EXPECT_EQ(Io().InstrQuery("A?", &l), S_OK);
-    EXPECT_EQ(l, 0);
-    EXPECT_EQ(Io().InstrQuery("B?", &l), S_OK);
-    EXPECT_EQ(l, 2);
-    EXPECT_EQ(Io().InstrQuery("C?", &l), S_OK);
-    EXPECT_EQ(l, -2);
+    for (auto [reply, want] :
+         {std::pair<const char*, LONG>{"\n", 0}, {"2.7\n", 2}, {"-2.7\n", -2}}) {
+        io_->Expect("A?\n", reply);
+        LONG l = 7;
+        EXPECT_EQ(Io().InstrQuery("A?", &l), S_OK);
+        EXPECT_EQ(l, want) << reply;
+    }
+    io_->Expect("D?\n", "-1.2345678901234567E-05\n").Expect("D?\n", "OFF\n");
     double d = 0;
+    EXPECT_EQ(Io().InstrQuery("D?", &d), S_OK);
+    EXPECT_EQ(d, -1.2345678901234567E-05);
     EXPECT_EQ(Io().InstrQuery("D?", &d), S_OK);
     EXPECT_TRUE(std::isnan(d));
 }
