@@ -6,6 +6,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
+#include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
 
 namespace qn::test {
@@ -16,29 +17,23 @@ protected:
     CDriverIOManager Io() { return qn::Io(*driver.get()); }
 };
 
-TEST_F(DriverOnEmulator, IdentifiesAndChecksTheModel) {
-    ASSERT_EQ(Open("QDS2014A"), S_OK) << ErrorText();
-    com::Bstr s;
-    driver->get_InstrumentManufacturer(s.Out());
-    EXPECT_EQ(s.utf8(), "QUORLEN TECHNOLOGIES");
-    driver->get_InstrumentModel(s.Out());
-    EXPECT_EQ(s.utf8(), "QDS2014A");
-    driver->get_IoResourceDescriptor(s.Out());
-    EXPECT_EQ(s.utf8(), SocketResource(port));
-    EXPECT_EQ(emu->ReceivedMessages().front(), "*IDN?");
-    EXPECT_EQ(driver->Close(), S_OK);
-}
-
-TEST_F(DriverOnEmulator, ResetAndSelfTestTalkToTheInstrument) {
-    ASSERT_EQ(Open("QMS3104A", "", true, /*reset=*/true), S_OK) << ErrorText();
+TEST_F(DriverOnEmulator, IdentifiesResetsAndSelfTests) {
+    ASSERT_EQ(Open("QDS2014A", "", true, /*reset=*/true), S_OK) << ErrorText();
+    using I = IIviDriverIdentity;
+    EXPECT_EQ(Got(driver.get(), &I::get_InstrumentManufacturer), "QUORLEN TECHNOLOGIES");
+    EXPECT_EQ(Got(driver.get(), &I::get_InstrumentModel), "QDS2014A");
+    EXPECT_EQ(Got(driver.get(), &IIviDriverOperation::get_IoResourceDescriptor),
+              SocketResource(port));
     LONG result = -1;
     com::Bstr msg;
     EXPECT_EQ(driver->SelfTest(&result, msg.Out()), S_OK);
     EXPECT_EQ(result, 0);
     EXPECT_EQ(msg.utf8(), "Selftest passed");
-    auto log = emu->ReceivedMessages();
+    const auto log = emu->ReceivedMessages();
+    EXPECT_EQ(log.front(), "*IDN?");
     EXPECT_NE(std::find(log.begin(), log.end(), "*RST;*OPC?"), log.end());
     EXPECT_NE(std::find(log.begin(), log.end(), "*TST?"), log.end());
+    EXPECT_EQ(driver->Close(), S_OK);
 }
 
 TEST_F(DriverOnEmulator, MissingReplyTimesOutAndTheSessionRecovers) {

@@ -21,13 +21,6 @@ protected:
     void Start(const char* model, const char* options = "QueryInstrStatus=true") {
         ASSERT_EQ(Open(model, options, true, true), S_OK) << ErrorText();
     }
-    ComPtr<IIviScopeMeasurement> Measurement(int channel) {
-        ComPtr<IIviScopeMeasurement> m;
-        com::Bstr n("Channel" + std::to_string(channel));
-        EXPECT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
-                  S_OK);
-        return m;
-    }
     IQuorlen731XXTrigger* Trig() { return driver.get(); }
 };
 
@@ -48,10 +41,9 @@ TEST_F(TriggerOnEmulator, EdgeTriggerPutsTheCrossingAtTheTriggerPoint) {
     for (const Case& c : cases) {
         const std::string channel = "UserChannel" + std::to_string(c.channel);
         SCOPED_TRACE(channel + " at " + std::to_string(c.level));
-        ComPtr<IQuorlen731XXChannel> ch;
+        auto ch = ChannelNamed<IQuorlen731XXChannels, IQuorlen731XXChannel>(*driver.get(),
+                                                                            channel.c_str());
         com::Bstr name(channel);
-        ASSERT_EQ(static_cast<IQuorlen731XXChannels*>(driver.get())->get_Item(name.get(), ch.Out()),
-                  S_OK);
         ASSERT_EQ(ch->put_Enabled(VARIANT_TRUE), S_OK) << ErrorText();
         ASSERT_EQ(static_cast<IQuorlen731XXAcquisition*>(driver.get())->put_StartTime(
                       c.position - 5e-4),
@@ -64,9 +56,9 @@ TEST_F(TriggerOnEmulator, EdgeTriggerPutsTheCrossingAtTheTriggerPoint) {
 
         SAFEARRAY* a = nullptr;
         double x0 = 0, dx = 0;
-        ASSERT_EQ(Measurement(c.channel)->ReadWaveform(5000, &a, &x0, &dx),
-                  S_OK)
-            << ErrorText();
+        auto m = ChannelNamed<IIviScopeMeasurements, IIviScopeMeasurement>(
+            *driver.get(), ("Channel" + std::to_string(c.channel)).c_str());
+        ASSERT_EQ(m->ReadWaveform(5000, &a, &x0, &dx), S_OK) << ErrorText();
         com::SafeArray owner(a);
         const std::vector<double> v(owner.data<double>(), owner.data<double>() + owner.size());
         ASSERT_GT(dx, 0.0);

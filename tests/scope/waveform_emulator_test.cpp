@@ -12,6 +12,7 @@
 #include "core/root.h"
 #include "io/io_manager.h"
 #include "scope/waveform_transfer.h"
+#include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
 
 namespace qn::test {
@@ -39,11 +40,7 @@ protected:
     }
     CDriverIOManager Io() { return qn::Io(*driver.get()); }
     ComPtr<IQuorlen731XXMeasurement> Measurement(const char* name) {
-        ComPtr<IQuorlen731XXMeasurement> m;
-        com::Bstr n(name);
-        EXPECT_EQ(static_cast<IQuorlen731XXMeasurements*>(driver.get())->get_Item(n.get(), m.Out()),
-                  S_OK);
-        return m;
+        return ChannelNamed<IQuorlen731XXMeasurements, IQuorlen731XXMeasurement>(*driver.get(), name);
     }
     HRESULT Fetch(const char* name, std::vector<double>* values, double* x0 = nullptr) {
         SAFEARRAY* a = nullptr;
@@ -105,9 +102,7 @@ TEST_F(WaveformOnEmulator, FetchScalesWordsAndReportsInvalidPoints) {
 TEST_F(WaveformOnEmulator, ReadDigitizesAndBothMeasurementKindsAgree) {
     Start("QDS4032A");
     ASSERT_EQ(Io().InstrWrite(":CHAN1:OFFS -0.37109375"), S_OK);
-    ComPtr<IIviScopeMeasurement> cc;
-    com::Bstr n("Channel1");
-    ASSERT_EQ(static_cast<IIviScopeMeasurements*>(driver.get())->get_Item(n.get(), cc.Out()), S_OK);
+    auto cc = ChannelNamed<IIviScopeMeasurements, IIviScopeMeasurement>(*driver.get(), "Channel1");
     SAFEARRAY* a = nullptr;
     double x0 = 0, dx = 0;
     ASSERT_EQ(cc->ReadWaveform(5000, &a, &x0, &dx), S_OK) << ErrorText();
