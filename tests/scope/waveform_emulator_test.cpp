@@ -11,6 +11,7 @@
 #include "Quorlen731XXErrors.h"
 #include "core/root.h"
 #include "io/io_manager.h"
+#include "scope/waveform_scaling.h"
 #include "scope/waveform_transfer.h"
 #include "tests/scope/scope_fixture.h"
 #include "tests/support/emulator_driver.h"
@@ -132,6 +133,14 @@ TEST_F(WaveformOnEmulator, MinMaxSplitsPairsAndRecordTypesMustMatch) {
     ASSERT_EQ(maxs.size(), 1000u);
     EXPECT_EQ(mins[999], 1998 * 1.25e-4 + 0.25);
     EXPECT_EQ(maxs[999], 1999 * 1.25e-4 + 0.25);
+    // The time axis is the preamble's.
+    std::string preamble;
+    WaveformScaling s;
+    ASSERT_EQ(Io().InstrQuery(":WAV:PRE?", &preamble, 255), S_OK);
+    ASSERT_TRUE(ParsePreamble(preamble, &s)) << preamble;
+    EXPECT_NE(s.x_origin, 0.0);
+    EXPECT_EQ(x0, s.x_origin);
+    EXPECT_EQ(dx, s.x_increment);
 
     SAFEARRAY* a = nullptr;
     EXPECT_EQ(m->FetchWaveform(&a, &x0, &dx), E_IVISCOPE_INVALID_ACQ_TYPE);
