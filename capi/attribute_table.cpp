@@ -143,9 +143,22 @@ std::span<const AttributeRow> AttributeRows() { return kRows; }
 
 namespace {
 
+// An open-addressed table keyed by ID: every attribute call looks its ID up,
+// so the lookup is one multiply and, as a rule, one probe.
 struct Lookup {
-    std::vector<Attribute> by_id;  // sorted by ID
+    static constexpr unsigned kBits = 10;
+    static constexpr std::size_t kSlots = std::size_t{1} << kBits;
+    static_assert(std::size(kRows) * 2 <= kSlots, "the table stays at most half full");
+    ViAttr ids[kSlots] = {};  // 0: a free slot (no attribute has ID 0)
+    Attribute attributes[kSlots];
     std::size_t interfaces = 0;
+
+    static std::size_t Home(ViAttr id) { return (id * 2654435761u) >> (32 - kBits); }
+    std::size_t SlotOf(ViAttr id) const {
+        std::size_t i = Home(id);
+        while (ids[i] != 0 && ids[i] != id) i = (i + 1) & (kSlots - 1);
+        return i;
+    }
 };
 
 const Lookup& Table() {
@@ -160,10 +173,10 @@ const Lookup& Table() {
                 a.interface_slot = static_cast<std::size_t>(it - seen.begin());
                 if (it == seen.end()) seen.push_back(a.property->iid);
             }
-            l.by_id.push_back(a);
+            const std::size_t slot = l.SlotOf(row.id);
+            l.ids[slot] = row.id;
+            l.attributes[slot] = a;
         }
-        std::sort(l.by_id.begin(), l.by_id.end(),
-                  [](const Attribute& x, const Attribute& y) { return x.row->id < y.row->id; });
         l.interfaces = seen.size();
         return l;
     }();
@@ -173,10 +186,10 @@ const Lookup& Table() {
 }  // namespace
 
 Attribute FindAttribute(ViAttr id) {
-    const std::vector<Attribute>& v = Table().by_id;
-    auto it = std::lower_bound(v.begin(), v.end(), id,
-                               [](const Attribute& a, ViAttr key) { return a.row->id < key; });
-    return it != v.end() && it->row->id == id ? *it : Attribute{};
+    if (id == 0) return {};
+    const Lookup& l = Table();
+    const std::size_t slot = l.SlotOf(id);
+    return l.ids[slot] == id ? l.attributes[slot] : Attribute{};
 }
 
 std::size_t AttributeInterfaceCount() { return Table().interfaces; }

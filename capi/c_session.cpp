@@ -1,10 +1,9 @@
 // Session handles come from the IVI-C session library; the C layer keeps one
 // counted reference to the driver object in each handle's data pointer. A
-// call finds it without any lock: the library lets it add the call's
-// reference before a close taking the pointer out can go on. Close then waits
-// for the calls already inside to finish before it closes the object, so a
-// call racing a close either completes or sees an invalid session, never a
-// released or half-closed object.
+// call finds it without any lock and is counted as a reader of the pointer
+// while it runs; a close taking the pointer out waits for the readers before
+// it closes the object, so a call racing a close either completes or sees an
+// invalid session, never a released or half-closed object.
 #include "capi/c_session.h"
 
 #include <cstdio>
@@ -50,12 +49,10 @@ ViStatus Convert(ViSession vi, HRESULT hr) {
 
 ViStatus SessionOf(ViSession vi, SessionRef* out) {
     void* data = nullptr;
-    ViStatus status = ivi::RetainDataPtr(vi, &data, [](void* p) {
-        static_cast<SessionData*>(p)->AddRef();
-    });
+    void* reader = nullptr;
+    const ViStatus status = ivi::BeginDataRead(vi, &data, &reader);
     if (status != VI_SUCCESS) return status;
-    if (!data) return IVISESSION_ERROR_INVALID_SESSION;  // being closed
-    out->reset(static_cast<SessionData*>(data));
+    out->Read(static_cast<SessionData*>(data), reader);
     return VI_SUCCESS;
 }
 
@@ -93,8 +90,7 @@ ViStatus Detach(ViSession vi, ComPtr<IUnknown>* driver) {
     if (status != VI_SUCCESS) return status;
     if (!p) return IVISESSION_ERROR_INVALID_SESSION;  // closed by another thread
     auto* data = static_cast<SessionData*>(p);
-    // No call can find the session now; those already inside finish first.
-    data->WaitForCalls();
+    // No call can find the session now, and those that found it are done.
     UnlinkCSession(data->Driver(), static_cast<LONG>(vi));
     *driver = ComPtr<IUnknown>(data->Driver());
     data->Release();

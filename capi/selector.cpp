@@ -8,27 +8,29 @@ namespace qn::capi {
 
 namespace {
 
-std::string_view Trim(std::string_view s) {
-    const auto first = s.find_first_not_of(" \t");
-    if (first == std::string_view::npos) return {};
-    return s.substr(first, s.find_last_not_of(" \t") - first + 1);
-}
+bool IsBlank(char c) { return c == ' ' || c == '\t'; }
 
 }  // namespace
 
+// One pass over the selector (it is parsed on every attribute call, so no
+// per-character searches): each comma-separated element, trimmed of blanks,
+// must be non-empty and free of ':', '[' and ']'.
 ViStatus FirstSelectorName(ViSession vi, ViConstString selector, std::string_view* name) {
-    std::string_view rest = selector ? selector : "";
+    const char* p = selector ? selector : "";
     std::string_view first;
-    bool is_first = true;
-    bool bad = Trim(rest).empty();
-    while (!bad) {
-        const std::size_t comma = rest.find(',');
-        const std::string_view element = Trim(rest.substr(0, comma));
-        if (element.empty() || element.find_first_of(":[]") != std::string_view::npos) bad = true;
-        if (is_first) first = element;
-        is_first = false;
-        if (comma == std::string_view::npos) break;
-        rest.remove_prefix(comma + 1);
+    bool bad = false;
+    for (bool is_first = true;; is_first = false) {
+        while (IsBlank(*p)) ++p;
+        const char* const begin = p;
+        const char* end = p;
+        for (; *p != '\0' && *p != ','; ++p) {
+            if (*p == ':' || *p == '[' || *p == ']') bad = true;
+            if (!IsBlank(*p)) end = p + 1;
+        }
+        if (end == begin) bad = true;
+        if (is_first) first = std::string_view(begin, static_cast<std::size_t>(end - begin));
+        if (*p == '\0') break;
+        ++p;
     }
     if (bad) return Fail(vi, kBadlyFormedSelector, "The repeated capability selector is badly-formed.");
     *name = first;

@@ -1,5 +1,7 @@
 #include "capi/session_data.h"
 
+#include "platform/ivi/ivisession.h"
+
 namespace qn::capi {
 
 HRESULT SessionData::Interface(const IID& iid, std::size_t slot, IUnknown** out) {
@@ -18,6 +20,15 @@ HRESULT SessionData::Interface(const IID& iid, std::size_t slot, IUnknown** out)
     }
     *out = itf;
     return S_OK;
+}
+
+void SessionRef::End() {
+    if (reader_)
+        ivi::EndDataRead(reader_);
+    else if (d_)
+        d_->Release();
+    d_ = nullptr;
+    reader_ = nullptr;
 }
 
 IUnknown* SessionData::FindItem(const IID& collection, std::string_view name) {

@@ -4,11 +4,9 @@
 #pragma once
 
 #include <atomic>
-#include <chrono>
 #include <mutex>
 #include <string>
 #include <string_view>
-#include <thread>
 #include <vector>
 
 #include "platform/com/unknown.h"
@@ -32,17 +30,6 @@ public:
     }
 
     IUnknown* Driver() const { return driver_.get(); }
-
-    // Waits until the caller's reference is the only one left: the calls
-    // that found the session before it was taken out of its handle are done.
-    void WaitForCalls() const {
-        for (int spins = 0; refs_.load(std::memory_order_acquire) > 1; ++spins) {
-            if (spins < 1000)
-                std::this_thread::yield();
-            else
-                std::this_thread::sleep_for(std::chrono::milliseconds(1));
-        }
-    }
 
     // The driver's interface `iid` (borrowed: valid while the session data
     // lives), asked for once. `slot` (below kInterfaceSlots) names the
@@ -87,25 +74,33 @@ private:
     bool has_pending_[kQueues] = {};
 };
 
-// A counted reference to a session's data for the length of a call.
+// A session's data for the length of a call: read from a handle (the call
+// counts as a reader of the handle's data pointer, which a close waits for),
+// or owned (one counted reference).
 class SessionRef {
 public:
     SessionRef() = default;
-    explicit SessionRef(SessionData* d) : d_(d) {}
     SessionRef(const SessionRef&) = delete;
     SessionRef& operator=(const SessionRef&) = delete;
-    ~SessionRef() {
-        if (d_) d_->Release();
-    }
+    ~SessionRef() { reset(nullptr); }
     SessionData* operator->() const { return d_; }
     SessionData* get() const { return d_; }
+    // Takes over one reference of `d`.
     void reset(SessionData* d) {
-        if (d_) d_->Release();
+        End();
         d_ = d;
+    }
+    // `d` as read from a handle by ivi::BeginDataRead, with its reader token.
+    void Read(SessionData* d, void* reader) {
+        End();
+        d_ = d;
+        reader_ = reader;
     }
 
 private:
+    void End();
     SessionData* d_ = nullptr;
+    void* reader_ = nullptr;  // set: d_ is read, not owned
 };
 
 }  // namespace qn::capi

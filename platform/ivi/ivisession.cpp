@@ -104,14 +104,20 @@ class ReaderScope {
     Slot& s_;
 };
 
-// Waits until no reader that may have seen an earlier data pointer is left.
+// Waits until no reader that may have seen an earlier data pointer is left
+// (a reader may be inside a long instrument operation: after a short spin
+// the wait sleeps).
 void WaitForReaders(Slot& s) {
-    while (s.readers.load(std::memory_order_seq_cst) != 0) std::this_thread::yield();
+    for (int spins = 0; s.readers.load(std::memory_order_seq_cst) != 0; ++spins) {
+        if (spins < 1000)
+            std::this_thread::yield();
+        else
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    }
 }
 
-// Reads the data pointer of `vi` and passes it to `retain` (when given and the
-// pointer is not null) before anyone replacing it can go on.
-ViStatus ReadData(ViSession vi, void** data, void (*retain)(void*)) {
+// Reads the data pointer of `vi`.
+ViStatus ReadData(ViSession vi, void** data) {
     *data = nullptr;
     Slot* s = FindReal(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
@@ -119,9 +125,7 @@ ViStatus ReadData(ViSession vi, void** data, void (*retain)(void*)) {
     // Counted first, checked second: a dispose or replace that has not seen
     // this reader has not happened yet.
     if (s->handle.load(std::memory_order_seq_cst) != vi) return IVISESSION_ERROR_INVALID_SESSION;
-    void* p = s->data.load(std::memory_order_seq_cst);
-    if (p && retain) retain(p);
-    *data = p;
+    *data = s->data.load(std::memory_order_seq_cst);
     return VI_SUCCESS;
 }
 
@@ -205,7 +209,7 @@ ViStatus IviSession_SetDataPtr(ViSession vi, void* dataPtr) {
 
 ViStatus IviSession_GetDataPtr(ViSession vi, void** dataPtr) {
     if (!dataPtr) return IVISESSION_ERROR_NULL_POINTER;
-    return ReadData(vi, dataPtr, nullptr);
+    return ReadData(vi, dataPtr);
 }
 
 ViStatus IviSession_Lock(ViSession vi, ViBoolean* callerHasLock) {
@@ -290,9 +294,27 @@ ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoole
     return Lock(vi, Clock::now() + timeout, callerHasLock);
 }
 
-ViStatus RetainDataPtr(ViSession vi, void** dataPtr, void (*retain)(void*)) {
-    if (!dataPtr) return IVISESSION_ERROR_NULL_POINTER;
-    return ReadData(vi, dataPtr, retain);
+ViStatus BeginDataRead(ViSession vi, void** dataPtr, void** reader) {
+    *dataPtr = nullptr;
+    *reader = nullptr;
+    Slot* s = FindReal(vi);
+    if (!s) return IVISESSION_ERROR_INVALID_SESSION;
+    s->readers.fetch_add(1, std::memory_order_seq_cst);
+    // Counted first, checked second, as in ReadData.
+    void* p = s->handle.load(std::memory_order_seq_cst) == vi
+                  ? s->data.load(std::memory_order_seq_cst)
+                  : nullptr;
+    if (!p) {
+        s->readers.fetch_sub(1, std::memory_order_release);
+        return IVISESSION_ERROR_INVALID_SESSION;
+    }
+    *dataPtr = p;
+    *reader = s;
+    return VI_SUCCESS;
+}
+
+void EndDataRead(void* reader) {
+    if (reader) static_cast<Slot*>(reader)->readers.fetch_sub(1, std::memory_order_release);
 }
 
 ViStatus ExchangeDataPtr(ViSession vi, void* dataPtr, void** previous) {

@@ -63,11 +63,14 @@ namespace qn::ivi {
  * (a zero timeout only tries). */
 ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoolean* callerHasLock);
 
-/* Reads the data pointer without taking any lock and, when it is not null,
- * calls retain(pointer) before a concurrent ExchangeDataPtr (or SetDataPtr)
- * can return: a reference taken there cannot be outrun by the replacer's
- * release. *dataPtr is null on failure. */
-ViStatus RetainDataPtr(ViSession vi, void** dataPtr, void (*retain)(void*));
+/* Reads the data pointer without taking any lock and counts the caller as
+ * its reader until EndDataRead(*reader): a concurrent ExchangeDataPtr,
+ * SetDataPtr or Dispose returns only after that, so the pointer stays valid
+ * for the reader without a reference of its own. A null data pointer (a
+ * session being closed) is IVISESSION_ERROR_INVALID_SESSION; on failure
+ * *dataPtr and *reader are null and nothing needs ending. */
+ViStatus BeginDataRead(ViSession vi, void** dataPtr, void** reader);
+void EndDataRead(void* reader);
 /* Replaces the data pointer and gives the previous one in *previous, once no
  * reader can still be holding it; the caller may then release it. */
 ViStatus ExchangeDataPtr(ViSession vi, void* dataPtr, void** previous);
