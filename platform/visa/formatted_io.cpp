@@ -485,9 +485,7 @@ HRESULT FormattedIO::ReadList(LONG type, BSTR listSeparator, VARIANT* pData) {
         HRESULT hr = Settle(ReadRest(OpDeadline(), &text));
         if (FAILED(hr)) return hr;
         std::string seps = listSeparator ? qn::com::BstrToUtf8(listSeparator) : std::string();
-        // push_back rather than assigning ",": g++ 12 at -O3 warns falsely
-        // (-Wrestrict) on that assignment.
-        if (seps.empty()) seps.push_back(',');
+        if (seps.empty()) seps = ",";
         while (!text.empty() && (text.back() == '\n' || IsBlank(text.back()))) text.pop_back();
         std::vector<std::string_view> fields;
         for (std::size_t start = 0; !text.empty();) {

@@ -251,13 +251,7 @@ std::optional<ResourceName> ParseResourceName(std::string_view text, std::string
         break;
     }
     if (err.empty()) err = "unrecognised resource string";
-    if (error) {
-        // Appended piece by piece: g++ 12 at -O3 warns falsely (-Wrestrict) on
-        // a string literal concatenated in front of a std::string.
-        std::string message(1, '\'');
-        message.append(text).append("': ").append(err);
-        *error = std::move(message);
-    }
+    if (error) *error = "'" + std::string(text) + "': " + err;
     return std::nullopt;
 }
 
