@@ -31,10 +31,16 @@ void SessionRef::End() {
     reader_ = nullptr;
 }
 
+// Read without a lock: entries below the published count are complete and
+// never change or go away while the session data lives.
 IUnknown* SessionData::FindItem(const IID& collection, std::string_view name) {
-    std::lock_guard<std::mutex> g(m_);
-    for (const CachedItem& c : items_)
-        if (*c.collection == collection && c.name == name) return c.item.get();
+    if (!items_cacheable_.load(std::memory_order_acquire)) return nullptr;
+    const std::size_t n = item_count_.load(std::memory_order_acquire);
+    for (std::size_t i = 0; i < n; ++i) {
+        const CachedItem& c = items_[i];
+        if ((c.collection == &collection || *c.collection == collection) && c.name == name)
+            return c.item.get();
+    }
     return nullptr;
 }
 
@@ -42,15 +48,15 @@ void SessionData::StoreItem(const IID& collection, std::string_view name, IUnkno
     std::lock_guard<std::mutex> g(m_);
     // A session has a few dozen items at most; the bound keeps a client that
     // names items in ever new spellings from growing the cache.
-    if (!items_cacheable_ || items_.size() >= 256) return;
-    items_.push_back({&collection, std::string(name), ComPtr<IUnknown>(item)});
+    const std::size_t n = item_count_.load(std::memory_order_relaxed);
+    if (!items_cacheable_.load(std::memory_order_relaxed) || n >= kMaxItems) return;
+    items_[n] = {&collection, std::string(name), ComPtr<IUnknown>(item)};
+    item_count_.store(n + 1, std::memory_order_release);
 }
 
-void SessionData::Expose() {
-    std::lock_guard<std::mutex> g(m_);
-    items_cacheable_ = false;
-    items_.clear();
-}
+// The items stay alive until the session data goes (a call may be using one);
+// they are just no longer found.
+void SessionData::Expose() { items_cacheable_.store(false, std::memory_order_release); }
 
 bool SessionData::TakePending(Queue q, std::string* text) {
     std::lock_guard<std::mutex> g(m_);

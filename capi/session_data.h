@@ -7,7 +7,6 @@
 #include <mutex>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "platform/com/unknown.h"
 
@@ -59,7 +58,7 @@ private:
     }
 
     struct CachedItem {
-        const IID* collection;
+        const IID* collection = nullptr;
         std::string name;
         ComPtr<IUnknown> item;
     };
@@ -68,8 +67,10 @@ private:
     ComPtr<IUnknown> driver_;
     std::mutex m_;
     std::atomic<IUnknown*> interfaces_[kInterfaceSlots] = {};  // each holds a reference
-    std::vector<CachedItem> items_;
-    bool items_cacheable_;
+    static constexpr std::size_t kMaxItems = 256;
+    CachedItem items_[kMaxItems];
+    std::atomic<std::size_t> item_count_{0};
+    std::atomic<bool> items_cacheable_;
     std::string pending_[kQueues];
     bool has_pending_[kQueues] = {};
 };

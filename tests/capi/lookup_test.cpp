@@ -7,6 +7,8 @@
 #include "Qn731XX.h"
 #include "capi/attribute_table.h"
 #include "capi/selector.h"
+#include "core/root.h"
+#include "platform/com/bstr.h"
 
 namespace {
 
@@ -64,6 +66,35 @@ TEST(AttributeLookup, EveryRowByItsIdAndNothingElse) {
         if (!ids.count(id)) {
             EXPECT_EQ(qn::capi::FindAttribute(id).row, nullptr) << id;
         }
+}
+
+// A session caches the channel items it resolves, but not once a client holds
+// the driver object: that client may initialize it again, which makes new
+// items with settings of their own.
+TEST(AttributeLookup, ItemsAreNotTakenFromTheCacheOnceTheObjectIsHandedOut) {
+    ViSession vi = 0;
+    ASSERT_EQ(Qn731XX_InitWithOptions(const_cast<ViChar*>(""), VI_FALSE, VI_FALSE,
+                                      "Simulate=true,DriverSetup=Model=QDS2014A", &vi),
+              VI_SUCCESS);
+    ViReal64 fresh = 0, range = 0;
+    ASSERT_EQ(Qn731XX_GetAttributeViReal64(vi, "Channel4", IVISCOPE_ATTR_VERTICAL_RANGE, &fresh),
+              VI_SUCCESS);
+    ASSERT_EQ(Qn731XX_SetAttributeViReal64(vi, "Channel4", IVISCOPE_ATTR_VERTICAL_RANGE, fresh * 2),
+              VI_SUCCESS);
+    void* native = nullptr;
+    ASSERT_EQ(Qn731XX_GetNativeIUnknownPtr(vi, &native), VI_SUCCESS);
+    ComPtr<IUnknown> unknown(static_cast<IUnknown*>(native), false);
+    ComPtr<IIviDriver> driver;
+    ASSERT_EQ(unknown.As(driver), S_OK);
+    ASSERT_EQ(driver->Close(), S_OK);
+    qn::com::Bstr resource(""), options("Simulate=true,DriverSetup=Model=QDS2014A");
+    ASSERT_EQ(driver->Initialize(resource.get(), VARIANT_FALSE, VARIANT_FALSE, options.get()), S_OK);
+    EXPECT_EQ(Qn731XX_GetAttributeViReal64(vi, "Channel4", IVISCOPE_ATTR_VERTICAL_RANGE, &range),
+              VI_SUCCESS);
+    EXPECT_EQ(range, fresh);
+    driver.reset();
+    unknown.reset();
+    EXPECT_EQ(Qn731XX_close(vi), VI_SUCCESS);
 }
 
 }  // namespace
