@@ -1,6 +1,6 @@
 // qn731xx system, screenshot, setup and scpi against an emulator on
 // loopback: a saved setup restores changed settings, the screenshot is a
-// bitmap, and bad input is refused.
+// bitmap, and files that are not setups are refused.
 #include <gtest/gtest.h>
 
 #include <cstdint>
