@@ -18,9 +18,7 @@ ComPtr<IClassFactory> Factory() {
 }
 
 // A pending error record of the thread is a live object of the COM layer too.
-void ClearThreadError() {
-    qn::com::TakeThreadError(nullptr);
-}
+void ClearThreadError() { qn::com::TakeThreadError(nullptr); }
 
 TEST(ClassObject, ServesOnlyTheDriverClass) {
     struct Case {
