@@ -66,6 +66,11 @@ void Wai(Instrument& inst, Call& call) {
     if (NoArgs(inst, call)) inst.WaitForCompletion();
 }
 
+// A bus trigger: an armed acquisition triggers at once (not armed: ignored).
+void Trg(Instrument& inst, Call& call) {
+    if (NoArgs(inst, call)) inst.BusTrigger();
+}
+
 void QueryTst(Instrument& inst, Call& call) {
     if (NoArgs(inst, call)) call.reply = "0";
 }
@@ -97,6 +102,7 @@ constexpr CommandSpec kCommon[] = {
     {"*STB", nullptr, QueryStb},
     {"*OPC", Opc, QueryOpc},
     {"*WAI", Wai, nullptr},
+    {"*TRG", Trg, nullptr},
     {"*TST", nullptr, QueryTst},
     {"*SAV", Sav, nullptr},
     {"*RCL", Rcl, nullptr},

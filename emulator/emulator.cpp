@@ -43,9 +43,6 @@ Emulator::~Emulator() {
     Stop();
 }
 
-void Emulator::EnableVxi11() {
-    vxi11_ = true;
-}
 
 void Emulator::EnablePortmapper(std::uint16_t port) {
     portmapper_ = port;
@@ -422,6 +419,16 @@ void Emulator::ClearWaveformData() {
 void Emulator::SetForcedEventStatusBits(std::uint8_t bits) {
     std::lock_guard lock(mutex_);
     faults_.forced_events = bits;
+}
+
+void Emulator::OverrunIoTimeouts(bool on) {
+    std::lock_guard lock(mutex_);
+    faults_.overrun_io_timeouts = on;
+}
+
+bool Emulator::overruns_io_timeouts() const {
+    std::lock_guard lock(mutex_);
+    return faults_.overrun_io_timeouts;
 }
 
 void Emulator::ClearFaults() {

@@ -35,6 +35,7 @@ class Instrument;
 class MessageFramer;
 struct HislipSession;
 struct HislipSessions;
+struct Vxi11Links;
 
 class Emulator {
   public:
@@ -87,6 +88,10 @@ class Emulator {
     void ServeWaveformData(std::string raw_bytes);  // sent verbatim for :WAV:DATA?
     void ClearWaveformData();
     void SetForcedEventStatusBits(std::uint8_t bits);  // ORed into *ESR before each message
+    // VXI-11 reads wait for their reply up to a minute whatever I/O timeout the client gave,
+    // as a device busy with a long operation does; only device_abort ends them sooner.
+    void OverrunIoTimeouts(bool on);
+    bool overruns_io_timeouts() const;
     void ClearFaults();
 
     // Services of the protocol servers (emulator_*.cpp).
@@ -120,6 +125,7 @@ class Emulator {
         int garble = 0;
         std::shared_ptr<const std::string> waveform_data;
         std::uint8_t forced_events = 0;
+        bool overrun_io_timeouts = false;
     };
     enum class Server { kRaw, kVxi11Core, kVxi11Abort, kPortmapper, kHislip };
     struct Listener {
@@ -142,6 +148,9 @@ class Emulator {
     void ServeHislip(int client);
     void ServeHislipSync(int client, HislipSession& session);
     void ServeHislipAsync(int client, HislipSession& session);
+    // An AsyncLock request (waits up to timeout_ms) or release of one session; the response code.
+    std::uint8_t ArbitrateLock(std::uint16_t session, std::uint8_t request,
+                               std::uint32_t timeout_ms);
     bool HandleMessage(const std::string& message);  // false: close the link
     std::shared_ptr<const std::string> ProduceReply();  // instrument_mutex_ held
     void LogLocked(const std::string& message);      // mutex_ held
@@ -152,6 +161,7 @@ class Emulator {
     std::uint16_t port_ = 0;
     std::uint16_t vxi11_port_ = 0, abort_port_ = 0, portmapper_port_ = 0, hislip_port_ = 0;
     std::shared_ptr<HislipSessions> hislip_sessions_;  // set by EnableHislip
+    std::shared_ptr<Vxi11Links> vxi11_links_;          // set by EnableVxi11
     bool vxi11_ = false;
     std::optional<std::uint16_t> portmapper_;
     std::chrono::milliseconds idle_{0};

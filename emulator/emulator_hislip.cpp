@@ -28,12 +28,17 @@ struct HislipSession {
     bool async_attached = false;
     bool sync_done = false;
     int async_fd = -1;  // shut down when the synchronous channel ends
+    std::uint16_t id = 0;
 };
 
+// The sessions, and the one holding the exclusive lock (0: none), which it keeps until it
+// releases it or its synchronous channel ends.
 struct HislipSessions {
     std::mutex m;
+    std::condition_variable lock_cv;
     std::map<std::uint16_t, std::shared_ptr<HislipSession>> by_id;
     std::uint16_t next_id = 1;
+    std::uint16_t lock_owner = 0;
 };
 
 namespace {
@@ -115,6 +120,26 @@ bool SendReply(const Emulator& emu, int fd, std::string_view reply, std::uint32_
 
 }  // namespace
 
+std::uint8_t Emulator::ArbitrateLock(std::uint16_t session, std::uint8_t request,
+                                     std::uint32_t timeout_ms) {
+    HislipSessions& sessions = *hislip_sessions_;
+    std::unique_lock lock(sessions.m);
+    if (request == kLockRelease) {
+        if (sessions.lock_owner != session) return kLockError;
+        sessions.lock_owner = 0;
+        sessions.lock_cv.notify_all();
+        return kLockSuccess;
+    }
+    const auto until = Clock::now() + std::chrono::milliseconds(std::min(timeout_ms, 60000u));
+    while (sessions.lock_owner != 0 && sessions.lock_owner != session) {
+        const auto now = Clock::now();
+        if (now >= until || stopping()) return kLockFailure;
+        sessions.lock_cv.wait_until(lock, std::min(until, now + std::chrono::milliseconds(50)));
+    }
+    sessions.lock_owner = session;
+    return kLockSuccess;
+}
+
 void Emulator::EnableHislip() {
     hislip_sessions_ = std::make_shared<HislipSessions>();
 }
@@ -146,6 +171,7 @@ void Emulator::ServeHislip(int client) {
                 id = sessions.next_id++;
             } while (id == 0 || sessions.by_id.count(id) != 0);
             sessions.by_id[id] = session;
+            session->id = id;
         }
         if (SendMessage(*this, client, kInitializeResponse, 0,
                         (std::uint32_t{kProtocolVersion} << 16) | id))
@@ -153,7 +179,9 @@ void Emulator::ServeHislip(int client) {
         {
             std::lock_guard lock(sessions.m);
             sessions.by_id.erase(id);
+            if (sessions.lock_owner == id) sessions.lock_owner = 0;
         }
+        sessions.lock_cv.notify_all();
         std::lock_guard lock(session->m);
         session->sync_done = true;
         if (session->async_fd >= 0) ::shutdown(session->async_fd, SHUT_RDWR);
@@ -239,14 +267,20 @@ void Emulator::ServeHislipSync(int client, HislipSession& session) {
                 }
                 if (!SendMessage(*this, client, kDeviceClearAcknowledge, 0, 0)) return;
                 break;
-            case kTrigger:
+            case kTrigger: {
                 if (!Skip(*this, client, h.length)) return;
+                // A bus trigger is the *TRG common command, run as a message of its own.
+                MessageFramer trigger;
+                trigger.Append("*TRG\n");
+                std::string ignored;
+                if (!RunMessages(trigger, &ignored)) return;
                 {
                     std::lock_guard lock(session.m);
                     session.last_processed = h.parameter;
                 }
                 session.cv.notify_all();
                 break;
+            }
             default:
                 if (!Skip(*this, client, h.length) ||
                     !SendMessage(*this, client, kError, kErrorUnrecognizedMessageType, 0,
@@ -311,7 +345,8 @@ void Emulator::ServeHislipAsync(int client, HislipSession& session) {
                 break;
             }
             case kAsyncLock:
-                sent = SendMessage(*this, client, kAsyncLockResponse, 1, 0);  // granted
+                sent = SendMessage(*this, client, kAsyncLockResponse,
+                                   ArbitrateLock(session.id, h.control, h.parameter), 0);
                 break;
             case kAsyncLockInfo:
                 sent = SendMessage(*this, client, kAsyncLockInfoResponse, 0, 0);

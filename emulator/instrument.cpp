@@ -177,6 +177,19 @@ void Instrument::Tick() {
     if (!running_ || continuous_ || Clock::now() < done_at_) return;
     // Without a trigger event (normal sweep) a single acquisition stays pending.
     if (!TriggerFires(settings_, model_, inputs_)) return;
+    CompleteSingle();
+}
+
+void Instrument::BusTrigger() {
+    if (!running_) return;  // nothing armed: the trigger is ignored
+    if (continuous_) {
+        Capture();
+        return;
+    }
+    CompleteSingle();
+}
+
+void Instrument::CompleteSingle() {
     Capture();
     StopAcquisition();
     if (opc_armed_) {

@@ -72,6 +72,7 @@ class Instrument {
     void ArmOperationComplete();
     void WaitForCompletion();  // *OPC?: returns when no single acquisition is running
     void Tick();               // completes an acquisition whose time has passed
+    void BusTrigger();         // *TRG: an armed acquisition triggers now
     const AcquiredRecord& record() const { return record_; }
     std::uint32_t acquisitions() const { return acquisitions_; }
 
@@ -103,6 +104,7 @@ class Instrument {
     using Clock = std::chrono::steady_clock;
     void ExecuteUnit(const ProgramUnit& unit, bool& stop);
     void Capture();
+    void CompleteSingle();  // captures, ends a single acquisition and completes *OPC
 
     ModelInfo model_;
     CommandTree tree_;

@@ -62,6 +62,16 @@ enum MessageType : std::uint8_t {
     kAsyncLockInfoResponse = 25,
 };
 
+// Control codes of AsyncLock (request or release) and AsyncLockResponse.
+enum LockCode : std::uint8_t {
+    kLockRelease = 0,
+    kLockRequest = 1,
+    kLockFailure = 0,        // response: not granted in time
+    kLockSuccess = 1,        // response: granted, or released
+    kLockSuccessShared = 2,  // response: a shared lock granted or released
+    kLockError = 3,          // response: a release without a lock, or a bad request
+};
+
 // Control codes of Error (non-fatal: the connection stays up).
 enum ErrorCode : std::uint8_t {
     kErrorUnidentified = 0,

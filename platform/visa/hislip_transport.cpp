@@ -22,6 +22,8 @@
 // - Payloads are never held whole: data goes straight into the caller's
 //   memory (through a small buffer when a termination character is looked
 //   for), and the text of an Error message is kept up to a small bound.
+// - A trigger is the Trigger message with the next message id; the
+//   exclusive lock is asked for and given back on the asynchronous channel.
 #include <poll.h>
 #include <sys/socket.h>
 
@@ -255,6 +257,9 @@ class HislipTransport final : public Transport {
                   std::size_t* written, std::string* error) override;
     HRESULT Clear(const Deadline& deadline, std::string* error) override;
     HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) override;
+    HRESULT Trigger(const Deadline& deadline, std::string* error) override;
+    HRESULT Lock(LONG lock_timeout_ms, const Deadline& deadline, std::string* error) override;
+    HRESULT Unlock(const Deadline& deadline, std::string* error) override;
     // The rest of the message being read is skipped before the next one.
     void DiscardInput() override { in_data_ = false; }
     void Close() override {
@@ -522,6 +527,53 @@ HRESULT HislipTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
     if (FAILED(hr)) return hr;
     *stb = h.control;
     return async_.Skip(deadline, error);
+}
+
+HRESULT HislipTransport::Trigger(const Deadline& deadline, std::string* error) {
+    if (!sync_.open()) return sync_.Lost(error);
+    in_data_ = false;  // the unread rest of a reply belongs to an earlier message
+    HRESULT hr = sync_.Send(kTrigger, rmt_delivered_ ? kRmtDelivered : 0, next_id_, {}, deadline,
+                            error);
+    if (FAILED(hr)) return hr;
+    rmt_delivered_ = false;
+    next_id_ += kMessageIdStep;
+    return S_OK;
+}
+
+// The exclusive lock: AsyncLock with the request bit, the time the server
+// may wait for it as the parameter and no lock string; the answer comes once
+// the server has the lock or gave up (control code 0: failed, 1: granted).
+HRESULT HislipTransport::Lock(LONG lock_timeout_ms, const Deadline& deadline,
+                              std::string* error) {
+    if (!async_.open()) return async_.Lost(error);
+    HRESULT hr = async_.Send(kAsyncLock, kLockRequest,
+                             lock_timeout_ms < 0 ? 0xFFFFFFFFu : std::uint32_t(lock_timeout_ms),
+                             {}, deadline, error);
+    Header h;
+    const Deadline reply_by =
+        deadline.infinite() ? deadline : Deadline::FromTimeout(deadline.PollMs() + 250);
+    if (SUCCEEDED(hr)) hr = NextAsync(kAsyncLockResponse, reply_by, &h, error);
+    if (SUCCEEDED(hr)) hr = async_.Skip(reply_by, error);
+    if (FAILED(hr)) return hr;
+    if (h.control == kLockSuccess) return S_OK;
+    *error = h.control == kLockFailure
+                 ? "device locked by another session of " + async_.peer()
+                 : "lock request refused by " + async_.peer() + " (code " +
+                       std::to_string(h.control) + ")";
+    return h.control == kLockFailure ? E_VISA_RSRC_LOCKED : E_VISA_IO;
+}
+
+HRESULT HislipTransport::Unlock(const Deadline& deadline, std::string* error) {
+    if (!async_.open()) return async_.Lost(error);
+    HRESULT hr =
+        async_.Send(kAsyncLock, kLockRelease, next_id_ - kMessageIdStep, {}, deadline, error);
+    Header h;
+    if (SUCCEEDED(hr)) hr = NextAsync(kAsyncLockResponse, deadline, &h, error);
+    if (SUCCEEDED(hr)) hr = async_.Skip(deadline, error);
+    if (FAILED(hr)) return hr;
+    if (h.control == kLockSuccess) return S_OK;
+    *error = "no lock held with " + async_.peer() + " (code " + std::to_string(h.control) + ")";
+    return E_VISA_SESSION_NOT_LOCKED;
 }
 
 // "hislip0" and the port of "hislip0,4881"; false for a bad port.

@@ -48,17 +48,20 @@ constexpr TransportKind kTransports[] = {
 
 class ResourceManager final : public qn::com::ComObject<ResourceManager, IResourceManager> {
   public:
-    HRESULT Open(BSTR resourceName, LONG /*accessMode*/, LONG openTimeout, BSTR /*optionString*/,
+    HRESULT Open(BSTR resourceName, LONG accessMode, LONG openTimeout, BSTR /*optionString*/,
                  IVisaSession** ppSession) override {
         if (!ppSession) return E_POINTER;
         *ppSession = nullptr;
+        if (accessMode & kSharedLock)
+            return Report(E_VISA_NOT_SUPPORTED, kManagerIid, "shared locks are not offered");
         return Guard(kManagerIid, [&] {
-            return OpenSession(qn::com::BstrToUtf8(resourceName), openTimeout, ppSession);
+            return OpenSession(qn::com::BstrToUtf8(resourceName), accessMode, openTimeout,
+                               ppSession);
         });
     }
 
   private:
-    static HRESULT OpenSession(const std::string& text, LONG openTimeout,
+    static HRESULT OpenSession(const std::string& text, LONG accessMode, LONG openTimeout,
                                IVisaSession** ppSession) {
         std::string error;
         std::optional<ResourceName> name = ParseResourceName(text, &error);
@@ -76,6 +79,15 @@ class ResourceManager final : public qn::com::ComObject<ResourceManager, IResour
             if (FAILED(hr)) return Report(hr, kManagerIid, text + ": " + error);
             auto session =
                 qn::com::MakeComObject<MessageSession>(std::move(*name), std::move(transport));
+            // The exclusive lock is waited for within the open timeout; a
+            // session that cannot have it is closed again (its link ended).
+            if (accessMode & kExclusiveLock) {
+                hr = session->LockExclusive(openTimeout, &error);
+                if (FAILED(hr)) {
+                    session->Close();
+                    return Report(hr, kManagerIid, text + ": lock: " + error);
+                }
+            }
             return session->QueryInterface(iid_of<IVisaSession>,
                                            reinterpret_cast<void**>(ppSession));
         }

@@ -163,9 +163,84 @@ HRESULT MessageSession::put_Timeout(LONG val) {
 
 HRESULT MessageSession::Close() {
     std::lock_guard<std::mutex> lock(io_);
-    if (transport_) transport_->Close();
+    if (transport_) transport_->Close();  // ends the link, and with it the device lock
     transport_.reset();
+    lock_depth_ = 0;
     return S_OK;
+}
+
+HRESULT MessageSession::LockExclusive(LONG lock_timeout_ms, std::string* error) {
+    if (lock_timeout_ms < kTimeoutInfinite) {
+        *error = "lock timeout " + std::to_string(lock_timeout_ms) +
+                 " ms: use 0 or more, or -1 for none";
+        return E_INVALIDARG;
+    }
+    std::lock_guard<std::mutex> lock(io_);
+    if (!transport_) {
+        *error = "the session is closed";
+        return E_VISA_INVALID_OBJECT;
+    }
+    if (lock_depth_ == 0) {
+        HRESULT hr =
+            transport_->Lock(lock_timeout_ms, Deadline::FromTimeout(lock_timeout_ms), error);
+        if (FAILED(hr)) return hr;
+    }
+    ++lock_depth_;
+    return S_OK;
+}
+
+HRESULT MessageSession::LockRsrc(LONG type, LONG lockTimeout, BSTR /*requestedKey*/,
+                                 BSTR* accessKey) {
+    if (accessKey) *accessKey = nullptr;
+    if (type == kSharedLock)
+        return Report(E_VISA_NOT_SUPPORTED, kIidMessage, "shared locks are not offered");
+    if (type != kExclusiveLock)
+        return Report(E_VISA_INVALID_LOCK_TYPE, kIidMessage,
+                      "lock type " + std::to_string(type) + ": use the exclusive lock (1)");
+    return Guard(kIidMessage, [&] {
+        std::string error;
+        HRESULT hr = LockExclusive(lockTimeout, &error);
+        if (FAILED(hr)) return Report(hr, kIidMessage, "lock: " + error);
+        if (accessKey) {
+            *accessKey = qn::com::Utf8ToBstr("");
+            if (!*accessKey) return E_OUTOFMEMORY;
+        }
+        return S_OK;
+    });
+}
+
+HRESULT MessageSession::UnlockRsrc() {
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        if (!transport_) return Closed();
+        if (lock_depth_ == 0)
+            return Report(E_VISA_SESSION_NOT_LOCKED, kIidMessage, "the session holds no lock");
+        if (--lock_depth_ > 0) return S_OK;
+        std::string error;
+        HRESULT hr = transport_->Unlock(CallDeadline(), &error);
+        return FAILED(hr) ? Report(hr, kIidMessage, "unlock: " + error) : hr;
+    });
+}
+
+HRESULT MessageSession::get_LockState(LONG* pVal) {
+    if (!pVal) return E_POINTER;
+    std::lock_guard<std::mutex> lock(io_);
+    *pVal = lock_depth_ > 0 ? kExclusiveLock : kNoLock;
+    return S_OK;
+}
+
+HRESULT MessageSession::AssertTrigger(SHORT protocol) {
+    if (protocol != kTriggerProtocolDefault)
+        return Report(E_VISA_INVALID_PROTOCOL, kIidMessage,
+                      "trigger protocol " + std::to_string(protocol) +
+                          ": only the default protocol (0) is offered");
+    return Guard(kIidMessage, [&] {
+        std::lock_guard<std::mutex> lock(io_);
+        if (!transport_) return Closed();
+        std::string error;
+        HRESULT hr = transport_->Trigger(CallDeadline(), &error);
+        return FAILED(hr) ? Report(hr, kIidMessage, "trigger: " + error) : hr;
+    });
 }
 
 HRESULT MessageSession::Clear() {

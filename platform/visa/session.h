@@ -32,6 +32,9 @@ class MessageSession final
     HRESULT get_Timeout(LONG* pVal) override;
     HRESULT put_Timeout(LONG val) override;
     HRESULT Close() override;
+    HRESULT LockRsrc(LONG type, LONG lockTimeout, BSTR requestedKey, BSTR* accessKey) override;
+    HRESULT UnlockRsrc() override;
+    HRESULT get_LockState(LONG* pVal) override;
 
     // IMessage
     HRESULT Clear() override;
@@ -46,6 +49,7 @@ class MessageSession final
     HRESULT put_TerminationCharacter(BYTE val) override;
     HRESULT get_TerminationCharacterEnabled(VARIANT_BOOL* pVal) override;
     HRESULT put_TerminationCharacterEnabled(VARIANT_BOOL val) override;
+    HRESULT AssertTrigger(SHORT protocol) override;
 
     // IMessageDirect
     HRESULT ReadInto(BYTE* buf, LONG count, DWORD flags, LONG* pActual, LONG* pEnd) override;
@@ -65,6 +69,10 @@ class MessageSession final
     HRESULT put_StopBits(SHORT val) override;
     HRESULT get_FlowControl(SHORT* pVal) override;
     HRESULT put_FlowControl(SHORT val) override;
+
+    // Takes (or nests) the device's exclusive lock, waiting up to
+    // lock_timeout_ms; *error says why it failed.
+    HRESULT LockExclusive(LONG lock_timeout_ms, std::string* error);
 
   private:
     // Reads or changes one field of the serial settings; a change is applied
@@ -92,6 +100,7 @@ class MessageSession final
     std::atomic<bool> term_enabled_{false};
     std::atomic<BYTE> term_char_{'\n'};
     SerialSettings serial_;  // guarded by io_
+    int lock_depth_ = 0;     // LockRsrc calls not yet given back; guarded by io_
 
     std::mutex op_m_;  // guards the open operation below
     std::thread::id op_thread_;

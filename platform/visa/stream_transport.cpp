@@ -210,4 +210,11 @@ HRESULT StreamTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
     return S_OK;
 }
 
+HRESULT StreamTransport::Trigger(const Deadline& deadline, std::string* error) {
+    static constexpr char kCommand[] = "*TRG\n";
+    std::size_t written = 0;
+    return Write(reinterpret_cast<const BYTE*>(kCommand), sizeof kCommand - 1, true, deadline,
+                 &written, error);
+}
+
 }  // namespace qn::visa

@@ -9,7 +9,8 @@
 // - Clear discards input received and not yet read and sends nothing (a
 //   "*CLS" would clear the instrument's status registers, which a device
 //   clear must not do);
-// - the status byte is read with the "*STB?" common query.
+// - the status byte is read with the "*STB?" common query, a trigger is the
+//   "*TRG" common command.
 // Every write first drops whatever input is waiting (a stray line, the late
 // rest of a reply after a timeout), so that it is not taken for the answer to
 // what is written now. A reply that arrives after that point cannot be told
@@ -43,6 +44,9 @@ class StreamTransport : public Transport {
         return S_OK;
     }
     HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) override;
+    // No bus trigger: the "*TRG" common command, which a message-based
+    // instrument takes as one.
+    HRESULT Trigger(const Deadline& deadline, std::string* error) override;
     void DiscardInput() override;
     void Close() override { fd_.reset(); }
 

@@ -51,6 +51,20 @@ class Transport {
     // Device clear as this bus can do it.
     virtual HRESULT Clear(const Deadline& deadline, std::string* error) = 0;
     virtual HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) = 0;
+    // The bus's trigger (a message-based bus without one sends "*TRG").
+    virtual HRESULT Trigger(const Deadline& deadline, std::string* error) = 0;
+    // Takes the device's exclusive lock, waiting up to lock_timeout_ms for
+    // another link to give it up (0: not at all, -1: no limit); the wait for
+    // the answer ends by deadline. Buses without a lock protocol refuse.
+    virtual HRESULT Lock(LONG /*lock_timeout_ms*/, const Deadline& /*deadline*/,
+                         std::string* error) {
+        *error = "this bus has no device lock";
+        return E_VISA_NOT_SUPPORTED;
+    }
+    virtual HRESULT Unlock(const Deadline& /*deadline*/, std::string* error) {
+        *error = "this bus has no device lock";
+        return E_VISA_NOT_SUPPORTED;
+    }
     // Drops input received and not yet read (after a timeout, so that a late
     // reply is not taken for the answer to the next query).
     virtual void DiscardInput() = 0;

@@ -4,6 +4,7 @@
 // run against a stand-in.
 #pragma once
 
+#include <cerrno>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -47,6 +48,8 @@ class UsbtmcDevice {
     virtual int Clear() = 0;
     // USB488 READ_STATUS_BYTE.
     virtual int ReadStatusByte(BYTE* stb) = 0;
+    // USB488 TRIGGER; a device without it answers EOPNOTSUPP.
+    virtual int Trigger() { return EOPNOTSUPP; }
 };
 
 // Opens the character device at path (the kernel driver's ioctls), or null

@@ -76,6 +76,7 @@ class KernelUsbtmcDevice final : public UsbtmcDevice {
         *stb = v;
         return err;
     }
+    int Trigger() override { return Result(::ioctl(fd_.get(), USBTMC488_IOCTL_TRIGGER)); }
 
   private:
     static int Result(int r) { return r == 0 ? 0 : errno; }
@@ -93,6 +94,7 @@ class UsbtmcTransport final : public Transport {
                   std::size_t* written, std::string* error) override;
     HRESULT Clear(const Deadline& deadline, std::string* error) override;
     HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) override;
+    HRESULT Trigger(const Deadline& deadline, std::string* error) override;
     void DiscardInput() override { head_ = tail_ = 0; }
     void Close() override { device_.reset(); }
     bool HasEnd() const override { return true; }
@@ -243,6 +245,18 @@ HRESULT UsbtmcTransport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std
     if (FAILED(hr)) return hr;
     int err = device_->ReadStatusByte(stb);
     return err ? Fail(err, "reading the status byte of", error) : S_OK;
+}
+
+HRESULT UsbtmcTransport::Trigger(const Deadline& deadline, std::string* error) {
+    if (!device_) return Closed(error);
+    HRESULT hr = TimeoutFor(deadline, error);
+    if (FAILED(hr)) return hr;
+    int err = device_->Trigger();
+    if (err == EOPNOTSUPP || err == ENOTTY) {
+        *error = label_ + " has no USB488 trigger";
+        return E_VISA_NOT_SUPPORTED;
+    }
+    return err ? Fail(err, "triggering", error) : S_OK;
 }
 
 }  // namespace

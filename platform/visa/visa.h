@@ -30,14 +30,19 @@ namespace qn::visa {
 // VISA-COM failures: facility ITF (0x8004) with the low word of the VISA
 // status code they stand for.
 constexpr HRESULT E_VISA_INVALID_OBJECT = HRESULT_FROM_BITS(0x8004000E);  // session closed
+constexpr HRESULT E_VISA_RSRC_LOCKED = HRESULT_FROM_BITS(0x8004000F);  // locked by another session
 constexpr HRESULT E_VISA_RESOURCE_NOT_FOUND = HRESULT_FROM_BITS(0x80040011);
 constexpr HRESULT E_VISA_INVALID_RESOURCE_NAME = HRESULT_FROM_BITS(0x80040012);
 constexpr HRESULT E_VISA_TIMEOUT = HRESULT_FROM_BITS(0x80040015);
 constexpr HRESULT E_VISA_ATTRIBUTE_STATE = HRESULT_FROM_BITS(0x8004001D);  // value refused
+constexpr HRESULT E_VISA_INVALID_LOCK_TYPE = HRESULT_FROM_BITS(0x80040020);
 constexpr HRESULT E_VISA_INVALID_FORMAT = HRESULT_FROM_BITS(0x8004002C);   // unreadable reply
 constexpr HRESULT E_VISA_IO = HRESULT_FROM_BITS(0x8004003E);
 constexpr HRESULT E_VISA_NOT_SUPPORTED = HRESULT_FROM_BITS(0x80040067);
 constexpr HRESULT E_VISA_USER_BUFFER = HRESULT_FROM_BITS(0x80040071);  // caller buffer too small
+constexpr HRESULT E_VISA_ABORT = HRESULT_FROM_BITS(0x80040072);  // operation aborted
+constexpr HRESULT E_VISA_INVALID_PROTOCOL = HRESULT_FROM_BITS(0x80040079);
+constexpr HRESULT E_VISA_SESSION_NOT_LOCKED = HRESULT_FROM_BITS(0x8004009C);
 constexpr HRESULT E_VISA_CONNECTION_LOST = HRESULT_FROM_BITS(0x800400A6);
 
 // Session timeout values (milliseconds).
@@ -57,9 +62,15 @@ enum HardwareInterfaceType : SHORT {
     kInterfaceUsb = 7,
 };
 
-// IResourceManager::Open access modes (only kNoLock has an effect today:
-// sessions of this process are not locked against each other).
+// IResourceManager::Open access modes and IVisaSession lock types. An
+// exclusive lock is the device's own (VXI-11 device_lock, HiSLIP AsyncLock):
+// it holds against every other link to the instrument, from this process or
+// any other. Shared locks are not offered (E_VISA_NOT_SUPPORTED); neither
+// are locks on buses without a lock protocol (sockets, serial lines, USB).
 enum AccessMode : LONG { kNoLock = 0, kExclusiveLock = 1, kSharedLock = 2, kLoadConfig = 4 };
+
+// IMessage::AssertTrigger protocols: only the bus's default trigger.
+enum TriggerProtocol : SHORT { kTriggerProtocolDefault = 0 };
 
 // Element types of the ASCII formatted operations.
 enum IEEEASCIIType : LONG {
@@ -118,6 +129,16 @@ struct IVisaSession : IUnknown {
     virtual HRESULT put_Timeout(LONG val) = 0;
     // Ends the connection; later I/O fails with E_VISA_INVALID_OBJECT.
     virtual HRESULT Close() = 0;
+    // Takes the exclusive lock of the device (type kExclusiveLock), waiting
+    // up to lockTimeout ms (0: only if it is free now) for another link to
+    // release it; E_VISA_RSRC_LOCKED when it stays taken. Locks nest: each
+    // LockRsrc needs its UnlockRsrc. requestedKey is for shared locks (not
+    // offered); *accessKey (may be null) receives an empty string.
+    virtual HRESULT LockRsrc(LONG type, LONG lockTimeout, BSTR requestedKey, BSTR* accessKey) = 0;
+    // Gives back one LockRsrc; E_VISA_SESSION_NOT_LOCKED when none is held.
+    virtual HRESULT UnlockRsrc() = 0;
+    // kNoLock or kExclusiveLock.
+    virtual HRESULT get_LockState(LONG* pVal) = 0;
 };
 
 // Message-based I/O of a session.
@@ -146,6 +167,11 @@ struct IMessage : IVisaSession {
     virtual HRESULT put_TerminationCharacter(BYTE val) = 0;
     virtual HRESULT get_TerminationCharacterEnabled(VARIANT_BOOL* pVal) = 0;
     virtual HRESULT put_TerminationCharacterEnabled(VARIANT_BOOL val) = 0;
+    // Triggers the device the way its bus does (kTriggerProtocolDefault
+    // only): VXI-11 device_trigger, the HiSLIP Trigger message, the USBTMC
+    // trigger request; a socket or serial line sends the "*TRG" common
+    // command.
+    virtual HRESULT AssertTrigger(SHORT protocol) = 0;
 };
 
 // Register-based I/O. Message-based sessions (sockets, LAN and USB
@@ -194,7 +220,10 @@ struct IResourceManager : IUnknown {
     QN_INTERFACE_ID("5b0c6a31-8d0e-4f7a-9c1e-3a6f2d8b7c05");
     // resourceName: see ParseResourceName (resource_name.h). openTimeout
     // bounds the connection set-up (ms; 0 or below, except -1 for no limit,
-    // gives kDefaultOpenTimeoutMs). optionString is accepted and ignored.
+    // gives kDefaultOpenTimeoutMs). accessMode kExclusiveLock opens the
+    // session with the device's exclusive lock, waiting up to openTimeout
+    // for it; kSharedLock is not offered. optionString is accepted and
+    // ignored.
     // Fails with E_VISA_INVALID_RESOURCE_NAME for a malformed string and
     // E_VISA_RESOURCE_NOT_FOUND when the resource cannot be reached or its
     // kind has no transport in this build.

@@ -14,6 +14,11 @@
 // - device_write is split at the device's maxRecvSize, END on the last
 //   piece; device_read ends at END, at the termination character when it is
 //   enabled, or at the count.
+// - Every operation waits for a lock another link holds as long as its own
+//   deadline allows, then fails with E_VISA_RSRC_LOCKED.
+// - A call the device does not answer by its deadline (plus a grace) is
+//   ended on the device through the abort channel, opened on first use at
+//   the port create_link named, so that the next call is served at once.
 #include <unistd.h>
 
 #include <algorithm>
@@ -40,8 +45,9 @@ constexpr std::size_t kMaxRecord = kMaxReadRequest + 1024;
 // How long after the deadline a reply is still awaited (the device reports
 // its own timeout at the deadline).
 constexpr auto kReplyGrace = std::chrono::milliseconds(250);
-// Setting up and tearing down a link.
+// Setting up and tearing down a link, and an abort through the abort channel.
 constexpr LONG kCloseTimeoutMs = 300;
+constexpr LONG kAbortTimeoutMs = 500;
 constexpr std::uint32_t kInfiniteIoTimeout = 0xFFFFFFFFu;
 
 std::uint32_t IoTimeout(const Deadline& d) {
@@ -49,22 +55,25 @@ std::uint32_t IoTimeout(const Deadline& d) {
     return ms < 0 ? kInfiniteIoTimeout : std::uint32_t(ms);
 }
 
-const char* DeviceErrorText(std::int32_t e) {
-    switch (e) {
-        case kSyntaxError: return "syntax error";
-        case kNotAccessible: return "device not accessible";
-        case kInvalidLinkId: return "invalid link identifier";
-        case kParameterError: return "parameter error";
-        case kNotSupported: return "operation not supported";
-        case kOutOfResources: return "out of resources";
-        case kLockedByAnother: return "device locked by another link";
-        case kNoLockHeld: return "no lock held by this link";
-        case kIoTimeout: return "I/O timeout";
-        case kIoError: return "I/O error";
-        case kAbort: return "aborted";
-        default: return "device error";
-    }
-}
+// What each device error code of a reply becomes.
+struct DeviceErrorInfo {
+    std::int32_t code;
+    HRESULT hr;
+    const char* text;
+};
+constexpr DeviceErrorInfo kDeviceErrors[] = {
+    {kSyntaxError, E_VISA_IO, "syntax error"},
+    {kNotAccessible, E_VISA_IO, "device not accessible"},
+    {kInvalidLinkId, E_VISA_CONNECTION_LOST, "invalid link identifier"},
+    {kParameterError, E_VISA_IO, "parameter error"},
+    {kNotSupported, E_VISA_NOT_SUPPORTED, "operation not supported"},
+    {kOutOfResources, E_VISA_IO, "out of resources"},
+    {kLockedByAnother, E_VISA_RSRC_LOCKED, "device locked by another link"},
+    {kNoLockHeld, E_VISA_SESSION_NOT_LOCKED, "no lock held by this link"},
+    {kIoTimeout, E_VISA_TIMEOUT, "I/O timeout"},
+    {kIoError, E_VISA_IO, "I/O error"},
+    {kAbort, E_VISA_ABORT, "aborted"},
+};
 
 // One RPC client connection: calls of one program and version.
 class RpcConnection {
@@ -150,8 +159,8 @@ Deadline WithGrace(const Deadline& d) {
 
 class Vxi11Transport final : public Transport {
   public:
-    Vxi11Transport(std::unique_ptr<RpcConnection> core, std::string peer)
-        : core_(std::move(core)), peer_(std::move(peer)) {}
+    Vxi11Transport(std::unique_ptr<RpcConnection> core, std::string host, std::string peer)
+        : core_(std::move(core)), host_(std::move(host)), peer_(std::move(peer)) {}
     ~Vxi11Transport() override { Close(); }
 
     HRESULT CreateLink(const std::string& device, const Deadline& deadline, std::string* error);
@@ -162,6 +171,9 @@ class Vxi11Transport final : public Transport {
                   std::size_t* written, std::string* error) override;
     HRESULT Clear(const Deadline& deadline, std::string* error) override;
     HRESULT ReadStatusByte(const Deadline& deadline, BYTE* stb, std::string* error) override;
+    HRESULT Trigger(const Deadline& deadline, std::string* error) override;
+    HRESULT Lock(LONG lock_timeout_ms, const Deadline& deadline, std::string* error) override;
+    HRESULT Unlock(const Deadline& deadline, std::string* error) override;
     // Each read is a request: nothing arrives unasked.
     void DiscardInput() override {}
     void Close() override;
@@ -172,12 +184,18 @@ class Vxi11Transport final : public Transport {
     HRESULT DeviceCall(std::uint32_t procedure, const std::string& args, const Deadline& deadline,
                        rpc::XdrReader* results, std::string* error);
     std::string GenericParms(const Deadline& deadline) const;
+    // Ends the operation in progress on the device through the abort
+    // channel (opened on first use); the text says how that went.
+    std::string Abort();
 
     std::unique_ptr<RpcConnection> core_;
+    std::unique_ptr<RpcConnection> abort_;  // the abort channel once opened
+    std::string host_;
     std::string peer_;
     std::string record_;
     std::int32_t lid_ = -1;
     std::uint32_t max_recv_ = 1024;
+    std::uint16_t abort_port_ = 0;  // 0: the device offers no abort channel
 };
 
 HRESULT Vxi11Transport::DeviceCall(std::uint32_t procedure, const std::string& args,
@@ -186,7 +204,12 @@ HRESULT Vxi11Transport::DeviceCall(std::uint32_t procedure, const std::string& a
     std::string_view res;
     HRESULT hr = core_->Call(procedure, args, WithGrace(deadline), &record_, &res, error);
     if (FAILED(hr)) {
-        if (hr == E_VISA_TIMEOUT) *error = "timeout waiting for " + peer_;
+        // The device overran its own I/O timeout: the operation is ended
+        // there so that the next call is served (its late reply is dropped
+        // by its xid).
+        if (hr == E_VISA_TIMEOUT)
+            *error = "timeout waiting for " + peer_ +
+                     (procedure == kDestroyLink ? std::string() : "; " + Abort());
         return hr;
     }
     *results = rpc::XdrReader(res);
@@ -197,18 +220,50 @@ HRESULT Vxi11Transport::DeviceCall(std::uint32_t procedure, const std::string& a
         return E_VISA_IO;
     }
     if (dev_error == kNoError) return S_OK;
-    *error = std::string(DeviceErrorText(dev_error)) + " (VXI-11 error " +
-             std::to_string(dev_error) + ") from " + peer_;
-    return dev_error == kIoTimeout ? E_VISA_TIMEOUT : E_VISA_IO;
+    DeviceErrorInfo info{dev_error, E_VISA_IO, "device error"};
+    for (const DeviceErrorInfo& e : kDeviceErrors)
+        if (e.code == dev_error) info = e;
+    *error = std::string(info.text) + " (VXI-11 error " + std::to_string(dev_error) + ") from " +
+             peer_;
+    return info.hr;
 }
 
+// Every operation waits for a lock held by another link as long as it may
+// wait at all (waitlock, the time left as the lock timeout), then fails
+// with "device locked by another link".
 std::string Vxi11Transport::GenericParms(const Deadline& deadline) const {
     rpc::XdrWriter w;
     w.I32(lid_);
-    w.U32(0);  // flags
+    w.U32(kFlagWaitLock);
     w.U32(IoTimeout(deadline));  // lock timeout
     w.U32(IoTimeout(deadline));  // I/O timeout
     return std::move(w.data());
+}
+
+std::string Vxi11Transport::Abort() {
+    if (abort_port_ == 0) return "the device has no abort channel";
+    std::string error;
+    const Deadline deadline = Deadline::FromTimeout(kAbortTimeoutMs);
+    if (!abort_) {
+        FdHolder fd;
+        if (FAILED(ConnectTcp(host_, abort_port_, deadline, &fd, &error)))
+            return "abort channel: " + error;
+        abort_ = std::make_unique<RpcConnection>(
+            fd.release(), host_ + ":" + std::to_string(abort_port_), kAbortProgram, kVersion);
+    }
+    rpc::XdrWriter w;
+    w.I32(lid_);
+    std::string record;
+    std::string_view results;
+    if (FAILED(abort_->Call(kDeviceAbort, w.data(), deadline, &record, &results, &error))) {
+        abort_.reset();  // opened again for the next abort
+        return "abort channel: " + error;
+    }
+    rpc::XdrReader r(results);
+    std::int32_t dev_error = 0;
+    if (!r.I32(&dev_error)) return "abort channel: short reply";
+    return dev_error == kNoError ? "the operation was aborted"
+                                 : "abort refused (VXI-11 error " + std::to_string(dev_error) + ")";
 }
 
 HRESULT Vxi11Transport::CreateLink(const std::string& device, const Deadline& deadline,
@@ -226,6 +281,7 @@ HRESULT Vxi11Transport::CreateLink(const std::string& device, const Deadline& de
         *error = "short create_link reply from " + peer_;
         return E_VISA_IO;
     }
+    abort_port_ = abort_port <= 65535 ? std::uint16_t(abort_port) : 0;
     // A device that takes less than a byte per call could not be written to.
     max_recv_ = std::clamp<std::uint32_t>(max_recv_, 1, kMaxReadRequest);
     return S_OK;
@@ -243,7 +299,7 @@ HRESULT Vxi11Transport::Write(const BYTE* data, std::size_t size, bool send_end,
         w.I32(lid_);
         w.U32(IoTimeout(deadline));
         w.U32(IoTimeout(deadline));
-        w.U32(last && send_end ? kFlagEnd : 0);
+        w.U32(kFlagWaitLock | (last && send_end ? kFlagEnd : 0));
         w.Opaque({reinterpret_cast<const char*>(data) + *written, piece});
         rpc::XdrReader r("");
         HRESULT hr = DeviceCall(kDeviceWrite, w.data(), deadline, &r, error);
@@ -280,7 +336,7 @@ HRESULT Vxi11Transport::Read(const ReadRequest& req, const Deadline& deadline, R
         w.U32(want);
         w.U32(IoTimeout(deadline));
         w.U32(IoTimeout(deadline));
-        w.U32(req.term_char_enabled ? kFlagTermCharSet : 0);
+        w.U32(kFlagWaitLock | (req.term_char_enabled ? kFlagTermCharSet : 0));
         w.U32(req.term_char);
         rpc::XdrReader r("");
         HRESULT hr = DeviceCall(kDeviceRead, w.data(), deadline, &r, error);
@@ -329,6 +385,27 @@ HRESULT Vxi11Transport::ReadStatusByte(const Deadline& deadline, BYTE* stb, std:
     return S_OK;
 }
 
+HRESULT Vxi11Transport::Trigger(const Deadline& deadline, std::string* error) {
+    rpc::XdrReader r("");
+    return DeviceCall(kDeviceTrigger, GenericParms(deadline), deadline, &r, error);
+}
+
+HRESULT Vxi11Transport::Lock(LONG lock_timeout_ms, const Deadline& deadline, std::string* error) {
+    rpc::XdrWriter w;
+    w.I32(lid_);
+    w.U32(lock_timeout_ms == 0 ? 0 : kFlagWaitLock);
+    w.U32(lock_timeout_ms < 0 ? kInfiniteIoTimeout : std::uint32_t(lock_timeout_ms));
+    rpc::XdrReader r("");
+    return DeviceCall(kDeviceLock, w.data(), deadline, &r, error);
+}
+
+HRESULT Vxi11Transport::Unlock(const Deadline& deadline, std::string* error) {
+    rpc::XdrWriter w;
+    w.I32(lid_);
+    rpc::XdrReader r("");
+    return DeviceCall(kDeviceUnlock, w.data(), deadline, &r, error);
+}
+
 void Vxi11Transport::Close() {
     if (!core_) return;
     if (lid_ >= 0) {
@@ -340,6 +417,7 @@ void Vxi11Transport::Close() {
         lid_ = -1;
     }
     core_.reset();
+    abort_.reset();
 }
 
 // The core channel's port from the portmapper of host.
@@ -381,7 +459,8 @@ HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
     if (FAILED(hr)) return hr;
     const std::string peer = name.host + ":" + std::to_string(port);
     auto transport = std::make_unique<Vxi11Transport>(
-        std::make_unique<RpcConnection>(fd.release(), peer, kCoreProgram, kVersion), peer);
+        std::make_unique<RpcConnection>(fd.release(), peer, kCoreProgram, kVersion), name.host,
+        peer);
     hr = transport->CreateLink(name.device_name, deadline, error);
     if (FAILED(hr)) {
         *error = "create_link '" + name.device_name + "': " + *error;

@@ -85,6 +85,10 @@ private:
             return *v = VARIANT_TRUE, S_OK;
         }
         HRESULT put_TerminationCharacterEnabled(VARIANT_BOOL) override { return S_OK; }
+        HRESULT AssertTrigger(SHORT) override { return E_NOTIMPL; }
+        HRESULT LockRsrc(LONG, LONG, BSTR, BSTR*) override { return E_NOTIMPL; }
+        HRESULT UnlockRsrc() override { return E_NOTIMPL; }
+        HRESULT get_LockState(LONG*) override { return E_NOTIMPL; }
 
     private:
         ScriptedFormattedProvider& owner_;

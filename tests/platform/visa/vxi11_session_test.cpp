@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <functional>
+#include <mutex>
 #include <thread>
 
 #include "emulator/emulator.h"
@@ -251,6 +252,189 @@ TEST(Vxi11Hostile, LateReplyIsNotTakenForTheNextOne) {
     EXPECT_EQ(ReadText(msg.get(), &reply), E_VISA_TIMEOUT);
     ASSERT_EQ(ReadText(msg.get(), &reply), S_OK) << ThreadErrorText();
     EXPECT_EQ(reply, "NEW\n");
+}
+
+}  // namespace
+}  // namespace qn::visa::test
+
+namespace qn::visa::test {
+namespace {
+
+// A read the device would let wait far past the session timeout is ended
+// through the abort channel: the next queries on the same session are
+// served at once, each with its own reply.
+TEST_F(Vxi11OnEmulator, AReadTheDeviceOverrunsIsAborted) {
+    ComPtr<IMessage> msg = OpenVxi11(emu_.vxi11_port(), 300);
+    ASSERT_TRUE(msg);
+    emu_.OverrunIoTimeouts(true);
+    emu_.SuppressReplies(1);
+    ASSERT_EQ(Write(msg.get(), "*TST?\n"), S_OK);
+    std::string reply;
+    EXPECT_EQ(ReadText(msg.get(), &reply), E_VISA_TIMEOUT);
+    EXPECT_NE(ThreadErrorText().find("aborted"), std::string::npos);
+    for (const char* query : {"*IDN?\n", "*TST?\n", "*ESE?\n"}) {
+        ASSERT_EQ(Write(msg.get(), query), S_OK) << ThreadErrorText();
+        ASSERT_EQ(ReadText(msg.get(), &reply), S_OK) << ThreadErrorText();
+        EXPECT_EQ(reply == "0\n", std::string(query) != "*IDN?\n") << query << reply;
+    }
+}
+
+// What the client sends for the new calls, word for word: the lock's
+// waitlock flag and timeout, the link id, the abort program and procedure.
+TEST(Vxi11Records, LockTriggerAndAbortArguments) {
+    struct Seen {
+        std::uint32_t program = 0, procedure = 0;
+        std::string args;
+    };
+    std::vector<Seen> seen;
+    std::mutex m;
+    RpcPeer abort_peer([&](const rpc::CallHeader& call, std::string_view args) {
+        std::lock_guard lock(m);
+        seen.push_back({call.program, call.procedure, std::string(args)});
+        return RpcPeer::Reply(call.xid, RpcPeer::Words({0}));
+    });
+    RpcPeer core([&](const rpc::CallHeader& call, std::string_view args) -> std::string {
+        if (call.procedure == vxi11::kCreateLink)
+            return RpcPeer::Reply(call.xid, RpcPeer::Words({0, 7, abort_peer.port(), 1024}));
+        std::lock_guard lock(m);
+        seen.push_back({call.program, call.procedure, std::string(args)});
+        if (call.procedure == vxi11::kDeviceRead) return {};  // never answered: aborted
+        return RpcPeer::Reply(call.xid, RpcPeer::Words({0}));
+    });
+    ComPtr<IMessage> msg = OpenVxi11(core.port(), 100);
+    ASSERT_TRUE(msg);
+    ASSERT_EQ(msg->LockRsrc(kExclusiveLock, 0, nullptr, nullptr), S_OK);
+    ASSERT_EQ(msg->UnlockRsrc(), S_OK);
+    ASSERT_EQ(msg->LockRsrc(kExclusiveLock, 300, nullptr, nullptr), S_OK);
+    ASSERT_EQ(msg->UnlockRsrc(), S_OK);
+    ASSERT_EQ(msg->LockRsrc(kExclusiveLock, -1, nullptr, nullptr), S_OK);
+    ASSERT_EQ(msg->AssertTrigger(kTriggerProtocolDefault), S_OK);
+    std::string reply;
+    EXPECT_EQ(ReadText(msg.get(), &reply), E_VISA_TIMEOUT);
+    msg.reset();
+    std::lock_guard lock(m);
+    ASSERT_GE(seen.size(), 8u);
+    const std::uint32_t core_program = vxi11::kCoreProgram, abort = vxi11::kAbortProgram;
+    const Seen expected[] = {
+        {core_program, vxi11::kDeviceLock, RpcPeer::Words({7, 0, 0})},
+        {core_program, vxi11::kDeviceUnlock, RpcPeer::Words({7})},
+        {core_program, vxi11::kDeviceLock, RpcPeer::Words({7, 1, 300})},
+        {core_program, vxi11::kDeviceUnlock, RpcPeer::Words({7})},
+        {core_program, vxi11::kDeviceLock, RpcPeer::Words({7, 1, 0xFFFFFFFFu})},
+    };
+    for (std::size_t i = 0; i < std::size(expected); ++i) {
+        SCOPED_TRACE(i);
+        EXPECT_EQ(seen[i].procedure, expected[i].procedure);
+        EXPECT_EQ(seen[i].args, expected[i].args);
+    }
+    // device_trigger: link, waitlock, then lock and I/O timeouts within the session's.
+    rpc::XdrReader r(seen[5].args);
+    std::uint32_t lid = 0, flags = 0, lock_timeout = 0, io_timeout = 0;
+    ASSERT_TRUE(r.U32(&lid) && r.U32(&flags) && r.U32(&lock_timeout) && r.U32(&io_timeout));
+    EXPECT_EQ(seen[5].procedure, std::uint32_t(vxi11::kDeviceTrigger));
+    EXPECT_EQ(lid, 7u);
+    EXPECT_EQ(flags, vxi11::kFlagWaitLock);
+    EXPECT_TRUE(lock_timeout <= 100 && io_timeout <= 100 && r.left() == 0);
+    EXPECT_EQ(seen[6].procedure, std::uint32_t(vxi11::kDeviceRead));
+    EXPECT_EQ(seen[7].program, abort);
+    EXPECT_EQ(seen[7].procedure, std::uint32_t(vxi11::kDeviceAbort));
+    EXPECT_EQ(seen[7].args, RpcPeer::Words({7}));
+}
+
+// Each device error code of a reply becomes its VISA status, with its
+// reason in the error text; an unanswered or garbled reply ends the call
+// within the timeout.
+TEST(Vxi11Hostile, DeviceErrorsAndBadRepliesOfTriggerAndLock) {
+    struct Case {
+        std::string reply_words;  // the results, or "" for no reply
+        bool stale;               // the reply carries another call's xid
+        HRESULT expected;
+        const char* text;
+    };
+    auto error = [](std::uint32_t code) { return RpcPeer::Words({code}); };
+    const Case cases[] = {
+        {error(1), false, E_VISA_IO, "syntax error"},
+        {error(3), false, E_VISA_IO, "device not accessible"},
+        {error(4), false, E_VISA_CONNECTION_LOST, "invalid link identifier"},
+        {error(5), false, E_VISA_IO, "parameter error"},
+        {error(8), false, E_VISA_NOT_SUPPORTED, "operation not supported"},
+        {error(9), false, E_VISA_IO, "out of resources"},
+        {error(11), false, E_VISA_RSRC_LOCKED, "device locked by another link"},
+        {error(12), false, E_VISA_SESSION_NOT_LOCKED, "no lock held by this link"},
+        {error(15), false, E_VISA_TIMEOUT, "I/O timeout"},
+        {error(17), false, E_VISA_IO, "I/O error"},
+        {error(23), false, E_VISA_ABORT, "aborted"},
+        {error(99), false, E_VISA_IO, "device error (VXI-11 error 99)"},
+        {"", false, E_VISA_IO, "short reply"},
+        {error(0), true, E_VISA_TIMEOUT, "timeout"},
+        {"", true, E_VISA_TIMEOUT, "no abort channel"},  // nothing comes back at all
+    };
+    for (const Case& c : cases) {
+        for (std::uint32_t procedure : {vxi11::kDeviceTrigger, vxi11::kDeviceLock}) {
+            SCOPED_TRACE(std::string(c.text) + " procedure " + std::to_string(procedure));
+            const bool silent = c.stale && c.reply_words.empty();
+            RpcPeer peer([&](const rpc::CallHeader& call, std::string_view) -> std::string {
+                if (call.procedure == vxi11::kCreateLink) return RpcPeer::LinkReply(call.xid);
+                if (call.procedure != procedure) return RpcPeer::Reply(call.xid, error(0));
+                if (silent) return {};
+                return RpcPeer::Reply(c.stale ? call.xid - 1 : call.xid, c.reply_words);
+            });
+            ComPtr<IMessage> msg = OpenVxi11(peer.port(), 100);
+            ASSERT_TRUE(msg);
+            const HRESULT hr = procedure == vxi11::kDeviceTrigger
+                                   ? msg->AssertTrigger(kTriggerProtocolDefault)
+                                   : msg->LockRsrc(kExclusiveLock, 100, nullptr, nullptr);
+            EXPECT_EQ(hr, c.expected);
+            EXPECT_NE(ThreadErrorText().find(c.text), std::string::npos);
+            LONG state = kExclusiveLock;
+            msg->get_LockState(&state);
+            EXPECT_EQ(state, kNoLock);  // a failed lock is not held
+        }
+    }
+}
+
+// An abort channel that fails in any way leaves the read's timeout as it
+// was, within its bound, and the session usable for later calls.
+TEST(Vxi11Hostile, BrokenAbortChannels) {
+    struct Case {
+        const char* what;
+        std::function<std::string(std::uint32_t xid)> abort_reply;
+        const char* text;
+    };
+    const Case cases[] = {
+        {"no answer", [](std::uint32_t) { return std::string(); }, "abort channel: "},
+        {"stale answer",
+         [](std::uint32_t xid) { return RpcPeer::Reply(xid - 1, RpcPeer::Words({0})); },
+         "abort channel: "},
+        {"short answer", [](std::uint32_t xid) { return RpcPeer::Reply(xid, ""); },
+         "abort channel: short reply"},
+        {"refused", [](std::uint32_t xid) { return RpcPeer::Reply(xid, RpcPeer::Words({4})); },
+         "abort refused (VXI-11 error 4)"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.what);
+        RpcPeer abort_peer([&](const rpc::CallHeader& call, std::string_view) {
+            return c.abort_reply(call.xid);
+        });
+        int reads = 0;
+        RpcPeer core([&](const rpc::CallHeader& call, std::string_view) -> std::string {
+            if (call.procedure == vxi11::kCreateLink)
+                return RpcPeer::Reply(call.xid, RpcPeer::Words({0, 1, abort_peer.port(), 1024}));
+            if (call.procedure == vxi11::kDeviceRead && ++reads == 1) return {};
+            rpc::XdrWriter w;
+            w.U32(0);
+            w.U32(vxi11::kReasonEnd);
+            w.Opaque("OK\n");
+            return RpcPeer::Reply(call.xid, w.data());
+        });
+        ComPtr<IMessage> msg = OpenVxi11(core.port(), 100);
+        ASSERT_TRUE(msg);
+        std::string reply;
+        EXPECT_EQ(ReadText(msg.get(), &reply), E_VISA_TIMEOUT);
+        EXPECT_NE(ThreadErrorText().find(c.text), std::string::npos);
+        ASSERT_EQ(ReadText(msg.get(), &reply), S_OK) << ThreadErrorText();
+        EXPECT_EQ(reply, "OK\n");
+    }
 }
 
 }  // namespace
