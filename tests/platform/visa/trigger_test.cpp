@@ -79,7 +79,9 @@ TEST(AssertTrigger, UsbtmcUsesTheDriversTriggerRequest) {
             *ParseResourceName("USB0::0x1AB1::0x04CE::DS1ZA1::INSTR"),
             MakeUsbtmcTransport(std::make_unique<TriggerDevice>(result), "/dev/usbtmc9"));
         EXPECT_EQ(session->AssertTrigger(kTriggerProtocolDefault), expected) << result;
-        if (result != 0) EXPECT_NE(ThreadErrorText().find("/dev/usbtmc9"), std::string::npos);
+        if (result != 0) {
+            EXPECT_NE(ThreadErrorText().find("/dev/usbtmc9"), std::string::npos);
+        }
     }
 }
 
