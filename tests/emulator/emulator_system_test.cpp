@@ -83,8 +83,11 @@ TEST(EmulatorSystem, DecodedSetupsAreBoundedAndComplete) {
     ASSERT_TRUE(back);
     EXPECT_EQ(back->channels[3].label, "a\nb\\c");
     EXPECT_EQ(back->markers.y2, -0.30000000000000004);
-    std::string padded = EncodeSetup(changed);
-    padded += std::string(kMaxSetupBytes, 'x') + "=1\n";
+    // Unknown lines are ignored: a setup of exactly the largest size decodes, one byte more not.
+    std::string padded = EncodeSetup(changed) + "pad=";
+    padded += std::string(kMaxSetupBytes - padded.size() - 1, 'x') + "\n";
+    EXPECT_TRUE(DecodeSetup(padded, model));
+    padded.insert(padded.size() - 1, "x");
     EXPECT_FALSE(DecodeSetup(padded, model));
     std::string nan = EncodeSetup(changed);
     nan.replace(nan.find("marker.x1=0"), 11, "marker.x1=nan");
