@@ -390,10 +390,11 @@ TEST(Vxi11Hostile, BrokenAbortChannels) {
         {[](std::uint32_t xid) { return RpcPeer::Reply(xid, RpcPeer::Words({4})); },
          "abort refused (VXI-11 error 4)"},
     };
-    for (const auto& [abort_reply, text] : cases) {
+    for (const auto& c : cases) {
+        const char* text = c.second;
         SCOPED_TRACE(text);
         RpcPeer abort_peer(
-            [&](const rpc::CallHeader& call, std::string_view) { return abort_reply(call.xid); });
+            [&](const rpc::CallHeader& call, std::string_view) { return c.first(call.xid); });
         int reads = 0;
         RpcPeer core([&](const rpc::CallHeader& call, std::string_view) -> std::string {
             if (call.procedure == vxi11::kCreateLink)
