@@ -19,8 +19,7 @@ TEST_F(ChannelTraffic, ImpedanceIsOneMegohmOrFiftyOhmWhereFitted) {
     const Case cases[] = {
         {"73141D", 50.0, ":CHAN1:IMP FIFT\n"}, {"73141D", 1e6, ":CHAN1:IMP ONEM\n"},
         {"73141D", 49.999, nullptr},           {"73141D", 1e6 + 1e-6, nullptr},
-        {"73122A", 50.0, nullptr},             {"73122A", 49.999, nullptr},
-        {"73122A", 1e6, ":CHAN1:IMP ONEM\n"},
+        {"73122A", 50.0, nullptr},             {"73122A", 1e6, ":CHAN1:IMP ONEM\n"},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(std::to_string(c.ohms) + " on " + c.model);

@@ -249,8 +249,12 @@ TEST_F(MeasurementTraffic, TheGivenTimeoutHoldsForTheQueryAndIsRestoredOnEveryPa
     EXPECT_EQ(io->timeouts, (std::vector<LONG>{1234, 1234, 1234}));
 }
 
-TEST_F(MeasurementTraffic, SimulatedResultsAreZero) {
+TEST_F(MeasurementTraffic, SimulatedResultsAreZeroAndNamesAreTheSame) {
     driver_ = SimulatedDriver("73142D");
+    com::Bstr name;
+    EXPECT_EQ(Meas("UserChannel1")->FunctionName(Quorlen731XXMeasurementTimeOfEdge, name.Out()),
+              S_OK);
+    EXPECT_EQ(name.utf8(), "X Of Edge");
     double v = 5;
     EXPECT_EQ(Meas("UserChannel1")->FetchWaveformMeasurement(Quorlen731XXMeasurementDelay, &v),
               S_OK);
