@@ -87,7 +87,7 @@ TEST_F(AcquisitionTraffic, HiResIsAveragingOverOneAcquisition) {
 
     io_->Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "1\n");
     EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_Type), Quorlen731XXAcquisitionTypeHiRes);
-    io_->Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "8\n");
+    io_->Expect("ACQ:TYPE?\n", "AVER\n").Expect(":ACQ:COUN?\n", "2\n");  // the least Average
     EXPECT_EQ(Got(Acq(), &IQuorlen731XXAcquisition::get_Type),
               Quorlen731XXAcquisitionTypeAverage);
 
