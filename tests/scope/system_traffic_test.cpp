@@ -80,6 +80,7 @@ TEST_F(SystemTraffic, SingleCommandMembersSendTheirCommands) {
         {":MARK:Y1P -2.34567890123457e-09", [&] { return m->put_Y1Position(-2.3456789012345678e-9); }},
         {":MARK:Y2P 0.987654321098765", [&] { return m->put_Y2Position(0.98765432109876543); }},
         {":EXT:UNIT AMP", [&] { return e->put_Units(Quorlen731XXUnitsAmps); }},
+        {":EXT:UNIT VOLT", [&] { return e->put_Units(Quorlen731XXUnitsVolts); }},
         {":EXT:PROB 12.3456789012346", [&] { return e->put_ProbeAttenuation(12.345678901234567); }},
     };
     for (const auto& [sent, call] : cases) {
