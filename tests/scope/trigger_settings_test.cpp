@@ -299,6 +299,7 @@ TEST_F(TriggerSettings, TvRepliesAreNormalisedBeforeTheLookup) {
     } cases[] = {
         {"TRIG:TV:MODE?", "LFI2", 5},  {"TRIG:TV:MODE?", "LINEF1", 5},
         {"TRIG:TV:MODE?", "FIE2", 2},  {"TRIG:TV:MODE?", "AFI", 3},
+        {"TRIG:TV:MODE?", "FIE1", 1},  {"TRIG:TV:MODE?", "LFI1", 5},
         {"TRIG:TV:MODE?", "ALIN", 4},  {"TRIG:TV:MODE?", "LALT", 6},
         {"TRIG:TV:MODE?", "LVER", 7},  {"TRIG:TV:MODE?", "VERT", 8},
         {"TRIG:TV:MODE?", "LINEF3", 0}, {"TRIG:TV:STAN?", "NTS", 1},
