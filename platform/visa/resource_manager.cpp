@@ -36,11 +36,14 @@ struct TransportKind {
     std::string_view resource_class;
     bool (*matches)(const ResourceName&);
     Opener open;
+    // Opens holding the device lock, where the bus can do that in one step
+    // (null: the lock is taken once the session is open).
+    Opener open_locked = nullptr;
 };
 
 constexpr TransportKind kTransports[] = {
     {kInterfaceTcpip, "SOCKET", Any, OpenSocketTransport},
-    {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport},
+    {kInterfaceTcpip, "INSTR", IsVxi11, OpenVxi11Transport, OpenVxi11TransportLocked},
     {kInterfaceTcpip, "INSTR", IsHislip, OpenHislipTransport},
     {kInterfaceAsrl, "INSTR", Any, OpenSerialTransport},
     {kInterfaceUsb, "INSTR", Any, OpenUsbtmcTransport},
@@ -75,13 +78,16 @@ class ResourceManager final : public qn::com::ComObject<ResourceManager, IResour
                 kind.resource_class != name->resource_class || !kind.matches(*name))
                 continue;
             std::unique_ptr<Transport> transport;
-            HRESULT hr = kind.open(*name, openTimeout, &transport, &error);
+            const bool lock = (accessMode & kExclusiveLock) != 0;
+            const bool locked = lock && kind.open_locked;
+            HRESULT hr = (locked ? kind.open_locked : kind.open)(*name, openTimeout, &transport,
+                                                                 &error);
             if (FAILED(hr)) return Report(hr, kManagerIid, text + ": " + error);
-            auto session =
-                qn::com::MakeComObject<MessageSession>(std::move(*name), std::move(transport));
+            auto session = qn::com::MakeComObject<MessageSession>(std::move(*name),
+                                                                  std::move(transport), locked);
             // The exclusive lock is waited for within the open timeout; a
             // session that cannot have it is closed again (its link ended).
-            if (accessMode & kExclusiveLock) {
+            if (lock && !locked) {
                 hr = session->LockExclusive(openTimeout, &error);
                 if (FAILED(hr)) {
                     session->Close();

@@ -19,8 +19,9 @@ VARIANT_BOOL Bool(bool b) {
 
 }  // namespace
 
-MessageSession::MessageSession(ResourceName name, std::unique_ptr<Transport> transport)
-    : name_(std::move(name)), transport_(std::move(transport)) {}
+MessageSession::MessageSession(ResourceName name, std::unique_ptr<Transport> transport,
+                               bool locked)
+    : name_(std::move(name)), transport_(std::move(transport)), lock_depth_(locked ? 1 : 0) {}
 
 HRESULT MessageSession::QueryInterface(REFIID riid, void** ppv) {
     if (riid == iid_of<ISerial> && name_.interface_type != kInterfaceAsrl) {

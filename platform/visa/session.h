@@ -19,7 +19,8 @@ class MessageSession final
     : public qn::com::ComObject<MessageSession, IMessage, qn::com::As<IVisaSession, IMessage>,
                                 IMessageDirect, ISerial> {
   public:
-    MessageSession(ResourceName name, std::unique_ptr<Transport> transport);
+    // locked: the transport was opened holding the device lock (one LockRsrc).
+    MessageSession(ResourceName name, std::unique_ptr<Transport> transport, bool locked = false);
 
     // ISerial only for serial resources.
     HRESULT QueryInterface(REFIID riid, void** ppv) override;

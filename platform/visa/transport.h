@@ -88,6 +88,11 @@ HRESULT OpenSocketTransport(const ResourceName& name, LONG open_timeout_ms,
 // resource names its port.
 HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
                            std::unique_ptr<Transport>* out, std::string* error);
+// The same, the link made holding the device's exclusive lock (create_link
+// with lockDevice, waiting up to the open timeout for it; E_VISA_RSRC_LOCKED
+// when another link keeps it).
+HRESULT OpenVxi11TransportLocked(const ResourceName& name, LONG open_timeout_ms,
+                                 std::unique_ptr<Transport>* out, std::string* error);
 
 // The HiSLIP transport (hislip_transport.cpp): both channels of a TCPIP
 // INSTR resource whose device name is hislip<n>; the port is the one after a

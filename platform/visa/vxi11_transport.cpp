@@ -163,7 +163,10 @@ class Vxi11Transport final : public Transport {
         : core_(std::move(core)), host_(std::move(host)), peer_(std::move(peer)) {}
     ~Vxi11Transport() override { Close(); }
 
-    HRESULT CreateLink(const std::string& device, const Deadline& deadline, std::string* error);
+    // With lock_timeout_ms >= -1 the link is made holding the device lock,
+    // waiting that long for it (-2: no lock).
+    HRESULT CreateLink(const std::string& device, LONG lock_timeout_ms, const Deadline& deadline,
+                       std::string* error);
 
     HRESULT Read(const ReadRequest& req, const Deadline& deadline, ReadResult* result,
                  std::string* error) override;
@@ -266,12 +269,13 @@ std::string Vxi11Transport::Abort() {
                                  : "abort refused (VXI-11 error " + std::to_string(dev_error) + ")";
 }
 
-HRESULT Vxi11Transport::CreateLink(const std::string& device, const Deadline& deadline,
-                                   std::string* error) {
+HRESULT Vxi11Transport::CreateLink(const std::string& device, LONG lock_timeout_ms,
+                                   const Deadline& deadline, std::string* error) {
     rpc::XdrWriter w;
     w.I32(std::int32_t(::getpid() & 0x7fffffff));  // client id
-    w.Bool(false);                                  // no lock
-    w.U32(0);                                       // lock timeout
+    w.Bool(lock_timeout_ms >= kTimeoutInfinite);     // lockDevice
+    w.U32(lock_timeout_ms < 0 ? (lock_timeout_ms == kTimeoutInfinite ? kInfiniteIoTimeout : 0)
+                              : std::uint32_t(lock_timeout_ms));
     w.Opaque(device);
     rpc::XdrReader r("");
     HRESULT hr = DeviceCall(kCreateLink, w.data(), deadline, &r, error);
@@ -448,8 +452,12 @@ HRESULT PortFromPortmapper(const std::string& host, const Deadline& deadline, st
 
 }  // namespace
 
-HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
-                           std::unique_ptr<Transport>* out, std::string* error) {
+namespace {
+
+constexpr LONG kNoLinkLock = -2;
+
+HRESULT OpenVxi11(const ResourceName& name, LONG open_timeout_ms, LONG lock_timeout_ms,
+                  std::unique_ptr<Transport>* out, std::string* error) {
     const Deadline deadline = Deadline::FromTimeout(open_timeout_ms);
     std::uint16_t port = name.port;
     HRESULT hr = port ? S_OK : PortFromPortmapper(name.host, deadline, &port, error);
@@ -461,13 +469,25 @@ HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
     auto transport = std::make_unique<Vxi11Transport>(
         std::make_unique<RpcConnection>(fd.release(), peer, kCoreProgram, kVersion), name.host,
         peer);
-    hr = transport->CreateLink(name.device_name, deadline, error);
+    hr = transport->CreateLink(name.device_name, lock_timeout_ms, deadline, error);
     if (FAILED(hr)) {
         *error = "create_link '" + name.device_name + "': " + *error;
-        return E_VISA_RESOURCE_NOT_FOUND;
+        return hr == E_VISA_RSRC_LOCKED ? hr : E_VISA_RESOURCE_NOT_FOUND;
     }
     *out = std::move(transport);
     return S_OK;
+}
+
+}  // namespace
+
+HRESULT OpenVxi11Transport(const ResourceName& name, LONG open_timeout_ms,
+                           std::unique_ptr<Transport>* out, std::string* error) {
+    return OpenVxi11(name, open_timeout_ms, kNoLinkLock, out, error);
+}
+
+HRESULT OpenVxi11TransportLocked(const ResourceName& name, LONG open_timeout_ms,
+                                 std::unique_ptr<Transport>* out, std::string* error) {
+    return OpenVxi11(name, open_timeout_ms, open_timeout_ms, out, error);
 }
 
 }  // namespace qn::visa
