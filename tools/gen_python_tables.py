@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Writes python/quorlen731xx/_tables.py from the driver's own tables.
+"""Writes python/quorlen731xx/_tables.py, and the attribute table of docs/c-api.md, from the driver's own tables.
 
 Sources, all in this repository:
   include/Qn731XX.h              attribute IDs and status codes of the C API
@@ -8,9 +8,9 @@ Sources, all in this repository:
   include/IviDriver.h            type of the inherent properties (getter signatures)
   include/Quorlen731XXEnums.h    every enumeration with its values
 
-An attribute whose property the driver does not have yet is left out. Run with
---check to compare the committed file with what would be written (exit 1 when
-it is stale).
+An attribute whose property the driver does not have yet is left out (its
+row in the document is left as it is). Run with --check to compare the
+committed files with what would be written (exit 1 when one is stale).
 """
 import argparse
 import glob
@@ -20,6 +20,10 @@ import sys
 
 ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
 OUT = os.path.join(ROOT, "python", "quorlen731xx", "_tables.py")
+DOC = os.path.join(ROOT, "docs", "c-api.md")
+# The channel-name column of the document's attribute table, by scope.
+DOC_NAMES = {"session": "", "channel": "Channel<n>", "user_channel": "UserChannel<n>",
+             "digital_channel": "UserDigitalChannel<n>"}
 
 SCOPES = {"kSession": "session", "kChannel": "channel", "kUserChannel": "user_channel",
           "kDigitalChannel": "digital_channel"}
@@ -184,25 +188,45 @@ def render(attributes, enums, statuses):
     return "\n".join(out)
 
 
+def render_doc(attributes, text):
+    """The document with each attribute's table row written from `attributes`."""
+    by_id = {a[1]: a for a in attributes}
+
+    def row(m):
+        a = by_id.get(int(m.group(1)))
+        if a is None:
+            return m.group(0)
+        access = "read/write" if a[6] else "read-only"
+        return f"| {a[1]} | `{a[0]}` | `{a[2]}` | {a[4]} | {access} | {DOC_NAMES[a[3]]} |"
+
+    return re.sub(r"^\| (\d{7}) \|.*$", row, text, flags=re.M)
+
+
 def main():
     ap = argparse.ArgumentParser(description=__doc__.splitlines()[0])
     ap.add_argument("--check", action="store_true", help="fail when the file is stale")
     ap.add_argument("--output", default=OUT)
     args = ap.parse_args()
-    text = render(*build())
+    attributes, enums, statuses = build()
+    with open(DOC, encoding="utf-8") as f:
+        doc = f.read()
+    outputs = [(args.output, render(attributes, enums, statuses)), (DOC, render_doc(attributes, doc))]
     if args.check:
-        try:
-            with open(args.output, encoding="utf-8") as f:
-                current = f.read()
-        except OSError:
-            current = None
-        if current != text:
-            print(f"{os.path.relpath(args.output, ROOT)} is stale: run "
-                  "python3 tools/gen_python_tables.py and commit the result", file=sys.stderr)
-            return 1
-        return 0
-    with open(args.output, "w", encoding="utf-8") as f:
-        f.write(text)
+        stale = 0
+        for path, text in outputs:
+            try:
+                with open(path, encoding="utf-8") as f:
+                    current = f.read()
+            except OSError:
+                current = None
+            if current != text:
+                print(f"{os.path.relpath(path, ROOT)} is stale: run "
+                      "python3 tools/gen_python_tables.py and commit the result", file=sys.stderr)
+                stale = 1
+        return stale
+    for path, text in outputs:
+        with open(path, "w", encoding="utf-8") as f:
+            f.write(text)
     return 0
 
 

@@ -40,6 +40,7 @@ def test_generated_tables_are_current():
     import os
     import subprocess
     import sys
+    # The Python tables and the attribute table of docs/c-api.md.
     tool = os.path.join(os.path.dirname(__file__), "..", "..", "tools", "gen_python_tables.py")
     result = subprocess.run([sys.executable, tool, "--check"], capture_output=True, text=True)
     assert result.returncode == 0, result.stderr
