@@ -54,6 +54,12 @@ ViStatus CallOnItem(ViSession vi, ViConstString selector, Member&& member) {
 template <class Coll>
 ViStatus CachedItemOf(ViSession vi, SessionData& session, ViConstString selector,
                       ComPtr<IUnknown>* hold, IUnknown** item) {
+    // A selector that is exactly the name of a cached item is well formed:
+    // the common case is found without parsing it.
+    if (IUnknown* cached = selector ? session.FindItem(iid_of<Coll>, selector) : nullptr) {
+        *item = cached;
+        return VI_SUCCESS;
+    }
     std::string_view name;
     ViStatus status = FirstSelectorName(vi, selector, &name);
     if (status != VI_SUCCESS) return status;

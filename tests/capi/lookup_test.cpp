@@ -81,6 +81,15 @@ TEST(AttributeLookup, ItemsAreNotTakenFromTheCacheOnceTheObjectIsHandedOut) {
               VI_SUCCESS);
     ASSERT_EQ(Qn731XX_SetAttributeViReal64(vi, "Channel4", IVISCOPE_ATTR_VERTICAL_RANGE, fresh * 2),
               VI_SUCCESS);
+    // A cached name found before parsing never lets a longer selector through.
+    for (const char* bad : {"Channel4:x", "Channel4,", "Channel4[1]"})
+        EXPECT_EQ(Qn731XX_GetAttributeViReal64(vi, bad, IVISCOPE_ATTR_VERTICAL_RANGE, &range),
+                  IVI_ERROR_BADLY_FORMED_SELECTOR) << bad;
+    for (const char* good : {" Channel4", "Channel4 ,Channel1"}) {
+        EXPECT_EQ(Qn731XX_GetAttributeViReal64(vi, good, IVISCOPE_ATTR_VERTICAL_RANGE, &range),
+                  VI_SUCCESS) << good;
+        EXPECT_EQ(range, fresh * 2);
+    }
     void* native = nullptr;
     ASSERT_EQ(Qn731XX_GetNativeIUnknownPtr(vi, &native), VI_SUCCESS);
     ComPtr<IUnknown> unknown(static_cast<IUnknown*>(native), false);
