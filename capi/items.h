@@ -56,7 +56,8 @@ ViStatus CachedItemOf(ViSession vi, SessionData& session, ViConstString selector
                       ComPtr<IUnknown>* hold, IUnknown** item) {
     // A selector that is exactly the name of a cached item is well formed:
     // the common case is found without parsing it.
-    if (IUnknown* cached = selector ? session.FindItem(iid_of<Coll>, selector) : nullptr) {
+    const std::string_view raw = selector ? selector : "";
+    if (IUnknown* cached = session.FindItem(iid_of<Coll>, raw)) {
         *item = cached;
         return VI_SUCCESS;
     }

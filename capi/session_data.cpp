@@ -1,7 +1,5 @@
 #include "capi/session_data.h"
 
-#include <cstring>
-
 #include "platform/ivi/ivisession.h"
 
 namespace qn::capi {
@@ -35,26 +33,15 @@ void SessionRef::End() {
 
 // Read without a lock: entries below the published count are complete and
 // never change or go away while the session data lives.
-template <class Same>
-IUnknown* SessionData::Find(const IID& collection, Same&& same) const {
+IUnknown* SessionData::FindItem(const IID& collection, std::string_view name) {
     if (!items_cacheable_.load(std::memory_order_acquire)) return nullptr;
     const std::size_t n = item_count_.load(std::memory_order_acquire);
     for (std::size_t i = 0; i < n; ++i) {
         const CachedItem& c = items_[i];
-        if ((c.collection == &collection || *c.collection == collection) && same(c.name))
+        if ((c.collection == &collection || *c.collection == collection) && c.name == name)
             return c.item.get();
     }
     return nullptr;
-}
-
-IUnknown* SessionData::FindItem(const IID& collection, std::string_view name) {
-    return Find(collection, [name](const std::string& cached) { return cached == name; });
-}
-
-IUnknown* SessionData::FindItem(const IID& collection, const char* name) {
-    return Find(collection, [name](const std::string& cached) {
-        return std::strncmp(cached.c_str(), name, cached.size() + 1) == 0;
-    });
 }
 
 void SessionData::StoreItem(const IID& collection, std::string_view name, IUnknown* item) {

@@ -38,8 +38,6 @@ public:
 
     // A channel item cached under (collection, name), or null.
     IUnknown* FindItem(const IID& collection, std::string_view name);
-    // The same for a name given as a C string, compared whole.
-    IUnknown* FindItem(const IID& collection, const char* name);
     void StoreItem(const IID& collection, std::string_view name, IUnknown* item);
     // A client got hold of the driver object: stop caching items.
     void Expose();
@@ -58,9 +56,6 @@ private:
         for (std::atomic<IUnknown*>& itf : interfaces_)
             if (IUnknown* p = itf.load()) p->Release();
     }
-
-    template <class Same>
-    IUnknown* Find(const IID& collection, Same&& same) const;
 
     struct CachedItem {
         const IID* collection = nullptr;

@@ -92,17 +92,20 @@ class SessionTable {
 // A real session (not handle 0), or null.
 Slot* FindReal(ViSession vi) { return vi == 0 ? nullptr : SessionTable::Instance().Find(vi); }
 
-// Counts a reader of the data pointer for its lifetime.
-class ReaderScope {
-  public:
-    explicit ReaderScope(Slot& s) : s_(s) { s_.readers.fetch_add(1, std::memory_order_seq_cst); }
-    ~ReaderScope() { s_.readers.fetch_sub(1, std::memory_order_release); }
-    ReaderScope(const ReaderScope&) = delete;
-    ReaderScope& operator=(const ReaderScope&) = delete;
+// Counts the caller as a reader of the data pointer of live session `vi`;
+// null (nothing counted) when `vi` is not live. Counted first, checked
+// second: a dispose or replace that has not seen this reader has not happened
+// yet, and one that has waits for LeaveReader.
+Slot* EnterReader(ViSession vi) {
+    Slot* s = FindReal(vi);
+    if (!s) return nullptr;
+    s->readers.fetch_add(1, std::memory_order_seq_cst);
+    if (s->handle.load(std::memory_order_seq_cst) == vi) return s;
+    s->readers.fetch_sub(1, std::memory_order_release);
+    return nullptr;
+}
 
-  private:
-    Slot& s_;
-};
+void LeaveReader(Slot* s) { s->readers.fetch_sub(1, std::memory_order_release); }
 
 // Waits until no reader that may have seen an earlier data pointer is left
 // (a reader may be inside a long instrument operation: after a short spin
@@ -119,13 +122,10 @@ void WaitForReaders(Slot& s) {
 // Reads the data pointer of `vi`.
 ViStatus ReadData(ViSession vi, void** data) {
     *data = nullptr;
-    Slot* s = FindReal(vi);
+    Slot* s = EnterReader(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    ReaderScope reading(*s);
-    // Counted first, checked second: a dispose or replace that has not seen
-    // this reader has not happened yet.
-    if (s->handle.load(std::memory_order_seq_cst) != vi) return IVISESSION_ERROR_INVALID_SESSION;
     *data = s->data.load(std::memory_order_seq_cst);
+    LeaveReader(s);
     return VI_SUCCESS;
 }
 
@@ -297,15 +297,11 @@ ViStatus LockSessionFor(ViSession vi, std::chrono::milliseconds timeout, ViBoole
 ViStatus BeginDataRead(ViSession vi, void** dataPtr, void** reader) {
     *dataPtr = nullptr;
     *reader = nullptr;
-    Slot* s = FindReal(vi);
+    Slot* s = EnterReader(vi);
     if (!s) return IVISESSION_ERROR_INVALID_SESSION;
-    s->readers.fetch_add(1, std::memory_order_seq_cst);
-    // Counted first, checked second, as in ReadData.
-    void* p = s->handle.load(std::memory_order_seq_cst) == vi
-                  ? s->data.load(std::memory_order_seq_cst)
-                  : nullptr;
-    if (!p) {
-        s->readers.fetch_sub(1, std::memory_order_release);
+    void* p = s->data.load(std::memory_order_seq_cst);
+    if (!p) {  // being closed
+        LeaveReader(s);
         return IVISESSION_ERROR_INVALID_SESSION;
     }
     *dataPtr = p;
@@ -314,7 +310,7 @@ ViStatus BeginDataRead(ViSession vi, void** dataPtr, void** reader) {
 }
 
 void EndDataRead(void* reader) {
-    if (reader) static_cast<Slot*>(reader)->readers.fetch_sub(1, std::memory_order_release);
+    if (reader) LeaveReader(static_cast<Slot*>(reader));
 }
 
 ViStatus ExchangeDataPtr(ViSession vi, void* dataPtr, void** previous) {
